@@ -1,0 +1,220 @@
+// Construction of the conversion table block: standards, picture adjustments, rounding halves and
+// clamp biases are all folded in here, so that a pixel costs table reads and additions only.
+#include "colour/conversion_tables.h"
+
+#include "platform/tessel/tessel.h"
+
+namespace kestrel {
+namespace {
+
+constexpr int32_t kHalf = 32768;              // 0.5 in Q16
+constexpr int32_t kChromaCentre = 128 << 16;  // in Q16
+constexpr int32_t kVideoLumaFoot = 16 << 16;  // in Q16
+
+// Adjustments below zero act at half strength: -128 gives a gain of 0, 128 one of 3.
+int32_t HalvedBelowZero(int32_t parameter) {
+  return parameter < 0 ? parameter >> 1 : parameter;
+}
+
+// value x multiplier / 256, rounded half away from zero.
+int64_t ScaleBy256th(int64_t value, int32_t multiplier) {
+  const int64_t magnitude =
+      (value < 0 ? -value : value) * (multiplier < 0 ? -multiplier : multiplier);
+  const int64_t scaled = (magnitude + 128) >> 8;
+  return (value < 0) != (multiplier < 0) ? -scaled : scaled;
+}
+
+uint8_t ClampToByte(int64_t value) {
+  return uint8_t(value < 0 ? 0 : value > 255 ? 255 : value);
+}
+
+uint32_t LowHalf(int32_t value) {
+  return uint32_t(value) & 0xFFFFu;
+}
+
+void* AllocateTable(EngineContext* c, uint32_t size) {
+  c->table = MMemAlloc(nullptr, size);
+  if (c->table != nullptr) c->tableSize = size;
+  return c->table;
+}
+
+// How a channel of `bits` bits reads the clamp tables: its narrowing, where value 0 lies in the
+// table, and the greatest value. 16-bit pixels have tables of their own; in them every width but
+// six uses the five-bit table's base.
+void DescribeClamp(bool is16Bit, uint32_t bits, YuvToRgbSums* sums, int channel) {
+  const bool narrow = is16Bit && bits < 8;
+  sums->narrowing[channel] = narrow ? 8 - bits : 0;
+  sums->indexBase[channel] = !narrow ? 512 : bits == 6 ? 288 : 64;
+  sums->maximum[channel] = narrow ? (1 << bits) - 1 : 255;
+}
+
+void WriteClampTables(bool is16Bit, uint8_t* block) {
+  if (is16Bit) {
+    for (int k = 0; k < 160; ++k) block[k] = uint8_t(k < 64 ? 0 : k > 95 ? 31 : k - 64);
+    for (int k = 0; k < 320; ++k) block[160 + k] = uint8_t(k < 128 ? 0 : k > 191 ? 63 : k - 128);
+  } else {
+    for (int k = 0; k < 1280; ++k) block[k] = ClampToByte(k - 512);
+  }
+}
+
+// Whether every colour stays inside the clamp tables, so that no sum wraps and none reads beyond
+// them. Each sum is monotonic in each input: its extremes are at the corners.
+bool StaysInsideClampTables(const YuvToRgbSums& s, bool is16Bit) {
+  const int32_t gains[3][3] = {
+      {s.yGain, s.vToR, 0}, {s.yGain, s.vToG, s.uToG}, {s.yGain, s.uToB, 0}};
+  for (int channel = 0; channel < 3; ++channel) {
+    int64_t low = s.offset[channel];
+    int64_t high = s.offset[channel];
+    for (const int32_t gain : gains[channel]) (gain < 0 ? low : high) += int64_t(gain) * 255;
+    // Truncations of the chroma words take up to 1/8 level, carries of their low halves add up to
+    // one; a carried remainder adds less than one step of the narrowest field.
+    low -= 1 << 14;
+    high += 9 << 16;
+    // Where the channel's table begins and ends, in levels before narrowing. Fields of unusual
+    // width have none.
+    int64_t first = 0;
+    int64_t last = 1280;
+    if (is16Bit) {
+      const uint32_t narrowing = s.narrowing[channel];
+      if (narrowing != 3 && narrowing != 2) return false;
+      first = narrowing == 2 ? 160 << 2 : 0;
+      last = narrowing == 2 ? 480 << 2 : 160 << 3;
+    }
+    if (low < first * 65536 || high >= last * 65536) return false;
+  }
+  return true;
+}
+
+void BuildYuvToRgb(EngineContext* c) {
+  const MPPPARAM& p = c->params;
+  if (c->srcFormat.code == CODE_GRAY8) c->params.contrast = c->params.saturation = 0;
+  const YuvToRgbCoeffs& row = YuvToRgbRow(c->srcFormat.colourStandard);
+  const bool is16Bit = c->dstFormat.colourStandard == 16;
+  YuvToRgbSums& s = c->rgbSums;
+  s.yGain = AdjustGain(row.y, p.contrast, p.saturation, 0);
+  s.vToR = AdjustGain(row.vToR, p.contrast, p.saturation, 1);
+  s.uToG = AdjustGain(-row.uToG, p.contrast, p.saturation, 1);
+  s.vToG = AdjustGain(-row.vToG, p.contrast, p.saturation, 1);
+  s.uToB = AdjustGain(row.uToB, p.contrast, p.saturation, 1);
+
+  // G's rounding half goes in before the contrast pivot, R's and B's after it: with contrast this
+  // moves G by a fraction, and every picture adjusted so far has it.
+  const int32_t brightness = p.brightness * row.y;
+  s.offset[0] = AdjustOffset(brightness - row.rBias, p.contrast, p.saturation, row.vToR) + kHalf;
+  s.offset[1] =
+      AdjustOffset(brightness + row.gBias + kHalf, p.contrast, p.saturation, -row.uToG - row.vToG);
+  s.offset[2] = AdjustOffset(brightness - row.bBias, p.contrast, p.saturation, row.uToB) + kHalf;
+  for (int channel = 0; channel < 3; ++channel) {
+    DescribeClamp(is16Bit, c->dstChannelSize[channel], &s, channel);
+    s.offset[channel] += s.indexBase[channel] << (s.narrowing[channel] + 16);
+  }
+  s.insideClampTable = StaysInsideClampTables(s, is16Bit);
+
+  const uint32_t size = is16Bit ? kRgb16BlockSize : kRgbBlockSize;
+  if (AllocateTable(c, size) == nullptr) return;
+  c->tableOffsets[0] = (size - 2 * kChannelTableSize) / 4;
+  c->tableOffsets[1] = (size - kChannelTableSize) / 4;
+  c->tableOffsets[2] = (size - 3 * kChannelTableSize) / 4;
+  WriteClampTables(is16Bit, static_cast<uint8_t*>(c->table));
+  uint32_t* words = static_cast<uint32_t*>(c->table);
+  for (int32_t i = 0; i < 256; ++i) {
+    words[c->tableOffsets[2] + i] = uint32_t(i * s.yGain) << 4;
+    words[c->tableOffsets[0] + i] =
+        LowHalf((i * s.uToG) >> 12) | LowHalf((s.offset[2] + i * s.uToB) >> 12) << 16;
+    words[c->tableOffsets[1] + i] =
+        LowHalf((s.offset[1] + i * s.vToG) >> 12) | LowHalf((s.offset[0] + i * s.vToR) >> 12) << 16;
+  }
+}
+
+void BuildRgbToYuv(EngineContext* c) {
+  const RgbToYuvCoeffs& row = RgbToYuvRow(c->dstFormat.colourStandard);
+  if (AllocateTable(c, kYuvBlockSize) == nullptr) return;
+  const int32_t foot = (c->dstFormat.colourStandard & CS_VIDEO_RANGE) != 0 ? kVideoLumaFoot : 0;
+  int32_t(*table)[256] = static_cast<int32_t(*)[256]>(c->table);
+  for (int32_t i = 0; i < 256; ++i) {
+    table[0][i] = foot + i * row.rToY;
+    table[1][i] = i * row.gToY;
+    table[2][i] = i * row.bToY;
+    table[3][i] = -i * row.rToU;
+    table[4][i] = -i * row.gToU;
+    table[5][i] = kChromaCentre + i * row.rToV;  // bToU is the same number in every row
+    table[6][i] = -i * row.gToV;
+    table[7][i] = -i * row.bToV;
+  }
+}
+
+struct LevelMap {
+  int32_t lumaGain, lumaOffset, chromaGain, chromaOffset;
+};
+
+LevelMap ChooseLevelMap(EngineContext* c) {
+  uint32_t& src = c->srcFormat.colourStandard;
+  uint32_t& dst = c->dstFormat.colourStandard;
+  const int32_t brightness = c->params.brightness * 65536;
+  if ((src & CS_FULL_RANGE) != 0 && (dst & CS_VIDEO_RANGE) != 0) {
+    return {56066, brightness + kVideoLumaFoot, 57344, 1048576};
+  }
+  if ((src & CS_VIDEO_RANGE) != 0 && (dst & CS_FULL_RANGE) != 0) {
+    // The luma foot is added, not removed: 16 becomes 37. Stored pictures depend on it.
+    return {76608, brightness + 1225728, 74901, -1198372};
+  }
+  // Equal ranges are handled as video range from here on, also by the kernels that ask.
+  src = (src & ~3u) | CS_VIDEO_RANGE;
+  dst = (dst & ~3u) | CS_VIDEO_RANGE;
+  return {65536, brightness, 65536, 0};
+}
+
+void BuildLevelTable(EngineContext* c) {
+  const MPPPARAM& p = c->params;
+  const LevelMap map = ChooseLevelMap(c);
+  const int32_t lumaGain = AdjustGain(map.lumaGain, p.contrast, p.saturation, 0);
+  const int32_t lumaOffset = AdjustOffset(map.lumaOffset, p.contrast, p.saturation, 0);
+  const int32_t chromaGain = AdjustGain(map.chromaGain, p.contrast, p.saturation, 1);
+  const int32_t chromaOffset =
+      AdjustOffset(map.chromaOffset, p.contrast, p.saturation, map.chromaGain);
+  if (AllocateTable(c, kLevelBlockSize) == nullptr) return;
+  uint8_t* levels = static_cast<uint8_t*>(c->table);
+  for (int64_t i = 0; i < 256; ++i) {
+    levels[i] = ClampToByte((lumaOffset + kHalf + i * lumaGain) >> 16);
+    levels[256 + i] = ClampToByte((chromaOffset + kHalf + i * chromaGain) >> 16);
+  }
+}
+
+}  // namespace
+}  // namespace kestrel
+
+using namespace kestrel;
+
+extern "C" {
+
+int32_t ScaleByGain(int32_t value, int32_t parameter) {
+  return int32_t(ScaleBy256th(value, 4 * (HalvedBelowZero(parameter) + 64)));
+}
+
+int32_t AdjustGain(int32_t coefficient, int32_t contrast, int32_t saturation, uint32_t isChroma) {
+  if (isChroma != 0) coefficient = ScaleByGain(coefficient, saturation);
+  return ScaleByGain(coefficient, contrast);
+}
+
+int32_t AdjustOffset(int32_t offset, int32_t contrast, int32_t saturation, int32_t coefficient) {
+  const int64_t centred = offset - int64_t(2) * HalvedBelowZero(saturation) * coefficient;
+  return int32_t(centred + ScaleBy256th(centred - kChromaCentre, 4 * HalvedBelowZero(contrast)));
+}
+
+void BuildConversionTables(EngineContext* context) {
+  switch (context->pathKind) {
+    case PATH_YUV_TO_YUV:
+      if (context->needsLevelTable != 0) BuildLevelTable(context);
+      break;
+    case PATH_YUV_TO_RGB:
+      BuildYuvToRgb(context);
+      break;
+    case PATH_RGB_TO_YUV:
+      BuildRgbToYuv(context);
+      break;
+    default:
+      break;
+  }
+}
+
+}  // extern "C"

@@ -1,0 +1,12 @@
+// Grey family.
+#include "engine/postprocess.h"
+
+extern "C" {
+
+// Declines: it has no kernels yet.
+uint32_t Gray2Gray_C_FAST(const MRECT*, const int32_t*, const int32_t*, uint8_t* const*,
+                          const uint8_t* const*, const EngineContext*) {
+  return KESTREL_UNSUPPORTED;
+}
+
+}  // extern "C"

@@ -1,0 +1,12 @@
+// Vector kernels for the common camera conversions.
+#include "engine/postprocess.h"
+
+extern "C" {
+
+// Declines: it has no kernels yet.
+uint32_t NEC_ALL(const MRECT*, const int32_t*, const int32_t*, uint8_t* const*,
+                 const uint8_t* const*, const EngineContext*) {
+  return KESTREL_UNSUPPORTED;
+}
+
+}  // extern "C"

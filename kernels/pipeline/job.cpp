@@ -1,0 +1,44 @@
+#include "kernels/pipeline/job.h"
+
+namespace kestrel {
+namespace {
+
+bool HasPlanes(const PlaneLayout& layout, const uint8_t* const* planes) {
+  if (layout.planeCount != 3) return planes[0] != nullptr;
+  return planes[0] != nullptr && planes[1] != nullptr && planes[2] != nullptr;
+}
+
+bool NeedsTable(const EngineContext& c) {
+  return c.pathKind == PATH_YUV_TO_RGB || c.pathKind == PATH_RGB_TO_YUV ||
+         (c.pathKind == PATH_YUV_TO_YUV && c.needsLevelTable != 0);
+}
+
+}  // namespace
+
+bool IsDrawable(const Job& job) {
+  const EngineContext& c = job.engine;
+  return job.rect.left < job.rect.right && job.rect.top < job.rect.bottom && c.srcReadRight > 0 &&
+         c.srcReadBottom > 0 && HasPlanes(c.dstLayout, job.dstStarts) &&
+         HasPlanes(c.srcLayout, job.srcPlanes) && (c.table != nullptr || !NeedsTable(c));
+}
+
+PixelFormat DescribePixels(const FormatDesc& format, const uint32_t* sizes,
+                           const uint32_t* positions) {
+  PixelFormat pixels;
+  pixels.bytes = int32_t(format.colourStandard / 8);
+  pixels.wholeBytes = true;
+  int32_t positionSum = 0;
+  for (int i = 0; i < 3; ++i) {
+    pixels.size[i] = sizes[i];
+    pixels.position[i] = positions[i];
+    positionSum += int32_t(positions[i]);
+    if (sizes[i] != 8 || positions[i] % 8 != 0) pixels.wholeBytes = false;
+  }
+  // The byte left over by channels of 8 bits. Other layouts get what the same sum says, or none.
+  const int32_t alphaByte = (48 - positionSum) / 8;
+  const bool inside = pixels.bytes == 4 && alphaByte >= 0 && alphaByte < 4;
+  pixels.alphaByte = inside ? alphaByte : -1;
+  return pixels;
+}
+
+}  // namespace kestrel

@@ -1,0 +1,173 @@
+#include "kernels/pipeline/source.h"
+
+#include <string.h>
+
+namespace kestrel {
+namespace {
+
+bool HasSwappedLuma(uint32_t code) {
+  return code >= CODE_YVYU_SWAPPED_LUMA && code <= CODE_VYUY_SWAPPED_LUMA;
+}
+
+}  // namespace
+
+void SampleColumns::Finish(int count) {
+  n = count;
+  contiguous = true;
+  for (int i = 1; i < n && contiguous; ++i) contiguous = offset[i] - offset[i - 1] == step;
+}
+
+Source::Source(const Job& job)
+    : job_(job),
+      rows_(job.rows()),
+      columnPositions_(job.engine),
+      rowPositions_(job.engine),
+      pixels_(DescribePixels(job.engine.srcFormat, job.engine.srcChannelSize,
+                             job.engine.srcChannelPos)),
+      palette_(job.engine.srcFormat.palette),
+      swappedLuma_(HasSwappedLuma(job.engine.srcFormat.code)) {
+  const PlaneLayout& layout = job.engine.srcLayout;
+  // Indexed pixels are addressed by column: several share a byte.
+  const bool isRgb = layout.code == CODE_RGB;
+  first_.step = second_.step = palette_ != nullptr ? 1 : isRgb ? pixels_.bytes : layout.step[0];
+  chroma_.step = layout.step[1];
+  if (layout.code == CODE_GRAY8) {
+    memset(u_, 128, sizeof(u_));
+    memset(v_, 128, sizeof(v_));
+  }
+}
+
+void Source::SelectColumns(int32_t x, int n) {
+  interpolates_ = false;
+  const int32_t exchange = swappedLuma_ ? 1 : 0;
+  for (int i = 0; i < n; ++i) {
+    const Taps taps = columnPositions_.At(x + i);
+    first_.Set(i, taps.first ^ exchange);
+    second_.Set(i, taps.second ^ exchange);
+    weights_[i] = taps.weight;
+    if (taps.weight != 0) interpolates_ = true;
+  }
+  first_.Finish(n);
+  second_.Finish(n);
+  lines_[0].row = lines_[1].row = -1;
+}
+
+void Source::SelectChroma(const int32_t* columns, int n) {
+  const int32_t factor = int32_t(job_.engine.srcSubsample[1]);
+  for (int i = 0; i < n; ++i) chroma_.Set(i, columnPositions_.At(columns[i]).first / factor);
+  chroma_.Finish(n);
+}
+
+const uint8_t* Source::ReadSamples(uint8_t* buffer, const uint8_t* row,
+                                   const SampleColumns& columns) {
+  if (!columns.contiguous) {
+    rows_.gather(buffer, row, columns.offset, columns.n);
+    return buffer;
+  }
+  const uint8_t* start = row + columns.offset[0];
+  if (columns.step == 1) return start;
+  rows_.readStrided(buffer, start, columns.step, columns.n);
+  return buffer;
+}
+
+void Source::ReadPixels(uint8_t* const rgb[3], const uint8_t* row, const SampleColumns& columns) {
+  if (palette_ != nullptr) {
+    rows_.unpackIndexed(rgb, row, columns.offset, job_.engine.srcFormat.colourStandard, palette_,
+                        columns.n);
+  } else if (columns.contiguous) {
+    rows_.unpackRgb(rgb, row + columns.offset[0], pixels_, columns.n);
+  } else {
+    rows_.gatherPixels(packed_, row, columns.offset, pixels_.bytes, columns.n);
+    rows_.unpackRgb(rgb, packed_, pixels_, columns.n);
+  }
+}
+
+void Source::FillLumaLine(Line* line, int32_t row) {
+  const uint8_t* start = RowStart(0, row);
+  line->channel[0] = ReadSamples(line->samples[0], start, first_);
+  if (!interpolates_) return;
+  const uint8_t* second = ReadSamples(scratch_[0], start, second_);
+  rows_.blendColumns(line->samples[0], line->channel[0], second, weights_, first_.n);
+  line->channel[0] = line->samples[0];
+}
+
+void Source::FillRgbLine(Line* line, int32_t row) {
+  const uint8_t* start = RowStart(0, row);
+  uint8_t* const rgb[3] = {line->samples[0], line->samples[1], line->samples[2]};
+  ReadPixels(rgb, start, first_);
+  for (int c = 0; c < 3; ++c) line->channel[c] = rgb[c];
+  line->alpha = nullptr;
+  if (pixels_.alphaByte >= 0) {
+    // Alpha is never interpolated.
+    const uint8_t* pixels = start + first_.offset[0];
+    if (!first_.contiguous) {
+      rows_.gatherPixels(packed_, start, first_.offset, pixels_.bytes, first_.n);
+      pixels = packed_;
+    }
+    rows_.unpackAlpha(line->samples[3], pixels, pixels_, first_.n);
+    line->alpha = line->samples[3];
+  }
+  if (!interpolates_) return;
+  uint8_t* const second[3] = {scratch_[0], scratch_[1], scratch_[2]};
+  ReadPixels(second, start, second_);
+  for (int c = 0; c < 3; ++c) rows_.blendColumns(rgb[c], rgb[c], second[c], weights_, first_.n);
+}
+
+Source::Line* Source::FetchLine(int32_t row, const Line* keep, Fill fill) {
+  for (Line& line : lines_) {
+    if (line.row == row) return &line;
+  }
+  Line* line = keep == &lines_[0] ? &lines_[1] : &lines_[0];
+  (this->*fill)(line, row);
+  line->row = row;
+  return line;
+}
+
+void Source::FetchLines(int32_t r, Fill fill, Line** first, Line** second, uint16_t* weight) {
+  const Taps taps = rowPositions_.At(r, 1);
+  *weight = taps.first == taps.second ? uint16_t{0} : taps.weight;
+  if (*weight == 0) {
+    *first = *second = FetchLine(taps.first, nullptr, fill);
+    return;
+  }
+  // A line that the second tap is about to reuse must survive fetching the first.
+  const Line* reused = nullptr;
+  for (const Line& line : lines_) {
+    if (line.row == taps.second) reused = &line;
+  }
+  *first = FetchLine(taps.first, reused, fill);
+  *second = FetchLine(taps.second, *first, fill);
+}
+
+const uint8_t* Source::Luma(int32_t r) {
+  Line *first, *second;
+  uint16_t weight;
+  FetchLines(r, &Source::FillLumaLine, &first, &second, &weight);
+  if (weight == 0) return first->channel[0];
+  rows_.blendRows(blended_[0], first->channel[0], second->channel[0], weight, first_.n);
+  return blended_[0];
+}
+
+void Source::Chroma(int32_t r, const uint8_t** u, const uint8_t** v) {
+  *u = u_;
+  *v = v_;
+  if (job_.engine.srcLayout.code == CODE_GRAY8) return;
+  const int32_t row = rowPositions_.At(r, job_.engine.srcSubsample[4]).first;
+  *u = ReadSamples(u_, RowStart(1, row), chroma_);
+  *v = ReadSamples(v_, RowStart(2, row), chroma_);
+}
+
+RgbRun Source::Rgb(int32_t r) {
+  Line *first, *second;
+  uint16_t weight;
+  FetchLines(r, &Source::FillRgbLine, &first, &second, &weight);
+  RgbRun run = {{first->channel[0], first->channel[1], first->channel[2]}, first->alpha};
+  if (weight == 0) return run;
+  for (int c = 0; c < 3; ++c) {
+    rows_.blendRows(blended_[c], first->channel[c], second->channel[c], weight, first_.n);
+    run.channel[c] = blended_[c];
+  }
+  return run;
+}
+
+}  // namespace kestrel

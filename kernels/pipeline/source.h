@@ -1,0 +1,84 @@
+// Reading: the pixels of one strip of a row, resampled, as one byte per channel.
+#ifndef KESTREL_KERNELS_PIPELINE_SOURCE_H
+#define KESTREL_KERNELS_PIPELINE_SOURCE_H
+
+#include "kernels/pipeline/job.h"
+#include "kernels/pipeline/positions.h"
+
+namespace kestrel {
+
+// Where one component of each strip column lies in a source row. Computed once per strip, used for
+// all its rows.
+struct SampleColumns {
+  int n = 0;
+  ptrdiff_t step = 1;       // bytes between neighbouring samples of the row
+  bool contiguous = false;  // offsets rise by exactly `step`
+  int32_t offset[kStrip];   // bytes from the start of the row
+
+  void Set(int i, int64_t sample) { offset[i] = int32_t(sample * step); }
+  void Finish(int count);
+};
+
+// A run of channel values; points into the strip's buffers or straight into the source.
+struct RgbRun {
+  const uint8_t* channel[3];
+  const uint8_t* alpha;  // null unless the source has an alpha byte
+};
+
+class Source {
+ public:
+  explicit Source(const Job& job);
+
+  // Selects loop columns [x, x + n), n <= kStrip, for Luma and Rgb.
+  void SelectColumns(int32_t x, int n);
+  // Selects the loop columns whose chroma is wanted.
+  void SelectChroma(const int32_t* columns, int n);
+
+  // Runs for loop row r: valid until the next call of the same function.
+  const uint8_t* Luma(int32_t r);
+  void Chroma(int32_t r, const uint8_t** u, const uint8_t** v);
+  RgbRun Rgb(int32_t r);
+
+ private:
+  // The two source lines, already filtered horizontally, that rows are blended from. An enlarged
+  // picture uses each line for several rows.
+  struct Line {
+    int32_t row;
+    const uint8_t* channel[3];  // into `samples`, or into the source
+    const uint8_t* alpha;
+    uint8_t samples[4][kStrip];
+  };
+
+  const uint8_t* RowStart(int plane, int32_t row) const {
+    return job_.srcPlanes[plane] + ptrdiff_t(job_.srcPitches[plane]) * row;
+  }
+  const uint8_t* ReadSamples(uint8_t* buffer, const uint8_t* row, const SampleColumns& columns);
+  void ReadPixels(uint8_t* const rgb[3], const uint8_t* row, const SampleColumns& columns);
+  void FillLumaLine(Line* line, int32_t row);
+  void FillRgbLine(Line* line, int32_t row);
+  using Fill = void (Source::*)(Line*, int32_t);
+  Line* FetchLine(int32_t row, const Line* keep, Fill fill);
+  // Both lines of a loop row, or the same one twice when only the first counts.
+  void FetchLines(int32_t r, Fill fill, Line** first, Line** second, uint16_t* weight);
+
+  const Job& job_;
+  const RowOps& rows_;
+  ColumnPositions columnPositions_;
+  RowPositions rowPositions_;
+  PixelFormat pixels_;
+  const uint8_t* palette_;
+  bool swappedLuma_;
+  bool interpolates_ = false;  // some column of the strip has a weight
+
+  SampleColumns first_, second_, chroma_;
+  uint16_t weights_[kStrip];
+  Line lines_[2];
+  uint8_t scratch_[3][kStrip];  // second taps
+  uint8_t packed_[4 * kStrip];  // gathered pixels
+  uint8_t blended_[3][kStrip];
+  uint8_t u_[kStrip], v_[kStrip];
+};
+
+}  // namespace kestrel
+
+#endif

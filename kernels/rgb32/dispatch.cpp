@@ -1,0 +1,24 @@
+// 32-bit RGB family.
+#include "engine/postprocess.h"
+
+extern "C" {
+
+// Declines: it has no kernels yet.
+uint32_t YUV_RGB32_C_FAST(const MRECT*, const int32_t*, const int32_t*, uint8_t* const*,
+                          const uint8_t* const*, const EngineContext*) {
+  return KESTREL_UNSUPPORTED;
+}
+
+// Declines: it has no kernels yet.
+uint32_t YUYV_RGB32_FAST(const MRECT*, const int32_t*, const int32_t*, uint8_t* const*,
+                         const uint8_t* const*, const EngineContext*) {
+  return KESTREL_UNSUPPORTED;
+}
+
+// Declines: it has no kernels yet.
+uint32_t ANY_ANY_C_FAST_RGB32(const MRECT*, const int32_t*, const int32_t*, uint8_t* const*,
+                              const uint8_t* const*, const EngineContext*) {
+  return KESTREL_UNSUPPORTED;
+}
+
+}  // extern "C"

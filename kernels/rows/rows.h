@@ -1,0 +1,114 @@
+// Row operations: plain functions on a run of n samples or pixels. They know nothing of engines,
+// images or rectangles, never touch a byte beyond the runs they are given, and every instruction
+// set's version gives the same bytes. Source and destination runs do not overlap, except that the
+// destination of an operation on bytes may be one of its sources.
+#ifndef KESTREL_KERNELS_ROWS_ROWS_H
+#define KESTREL_KERNELS_ROWS_ROWS_H
+
+#include <stddef.h>
+#include <stdint.h>
+
+namespace kestrel {
+
+// A packed RGB pixel: little-endian word of 1..4 bytes with a field for each of R, G, B.
+struct PixelFormat {
+  int32_t bytes;
+  uint32_t size[3];  // bits of the field, 0..16
+  uint32_t position[3];
+  int32_t alphaByte;  // byte of the pixel that holds alpha; -1 when there is none
+  bool wholeBytes;    // each field is one whole byte of the pixel
+};
+
+// How 8-bit (or already narrowed) channel values become fields: shifted right, or left if negative.
+struct FieldShifts {
+  int32_t right[3];
+};
+
+// YUV to RGB by table reads. index = sum >> 20; channel = clamp[index >> narrowing].
+struct YuvToRgbTable {
+  const uint8_t* clamp;
+  const uint32_t* y;
+  const uint32_t* u;
+  const uint32_t* v;
+  uint32_t narrowing[3];
+};
+
+// The same by multiplication, in sums that cannot wrap, saturating:
+// channel = min(max((index >> narrowing) - base, 0), maximum).
+struct YuvToRgbWide {
+  int32_t yGain, vToR, vToG, uToG, uToB;
+  int32_t offset[3];
+  uint32_t narrowing[3];
+  int32_t base[3];
+  int32_t maximum[3];
+};
+
+// Error carry of 16-bit RGB: the bits that narrowing drops are added to the next pixel's index.
+struct Carry {
+  int32_t mask[3];
+  int32_t remainder[3];
+};
+
+// RGB to YUV: eight tables of 256 words; channel = (sum of three) >> 16.
+using RgbToYuvTables = const int32_t (*)[256];
+
+}  // namespace kestrel
+
+// One per instruction set. Global because engine contexts, plain C records, point at one.
+struct KestrelRowOps {
+  // dst[i] = src[i * step], step 1..4.
+  void (*readStrided)(uint8_t* dst, const uint8_t* src, ptrdiff_t step, int n);
+  // dst[i] = src[offsets[i]].
+  void (*gather)(uint8_t* dst, const uint8_t* src, const int32_t* offsets, int n);
+  // Pixels of `bytes` bytes at src + offsets[i], packed together.
+  void (*gatherPixels)(uint8_t* dst, const uint8_t* src, const int32_t* offsets, int bytes, int n);
+  // a + floor((b - a) * weight / 65536): a weight for each column, or one for the whole row.
+  void (*blendColumns)(uint8_t* dst, const uint8_t* a, const uint8_t* b, const uint16_t* weights,
+                       int n);
+  void (*blendRows)(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t weight, int n);
+
+  // Packed pixels to channels of 8 bits: the top bits of each field, zero-filled below.
+  void (*unpackRgb)(uint8_t* const rgb[3], const uint8_t* src, const kestrel::PixelFormat& format,
+                    int n);
+  // Byte `alphaByte` of each pixel.
+  void (*unpackAlpha)(uint8_t* alpha, const uint8_t* src, const kestrel::PixelFormat& format,
+                      int n);
+  // Palette colours of the pixels at `columns`; bits per pixel 1, 4 or 8, leftmost in the top bits.
+  void (*unpackIndexed)(uint8_t* const rgb[3], const uint8_t* row, const int32_t* columns,
+                        uint32_t bits, const uint8_t* palette, int n);
+
+  void (*yuvToRgb)(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u, const uint8_t* v,
+                   const kestrel::YuvToRgbTable& table, int n);
+  void (*yuvToRgbWide)(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u, const uint8_t* v,
+                       const kestrel::YuvToRgbWide& sums, int n);
+  void (*yuvToRgbCarry)(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u, const uint8_t* v,
+                        const kestrel::YuvToRgbWide& sums, kestrel::Carry* carry, int n);
+  void (*rgbToLuma)(uint8_t* luma, const uint8_t* const rgb[3], kestrel::RgbToYuvTables tables,
+                    int n);
+  void (*rgbToChroma)(uint8_t* u, uint8_t* v, const uint8_t* const rgb[3],
+                      kestrel::RgbToYuvTables tables, int n);
+  // dst[i] = map[src[i]].
+  void (*mapLevels)(uint8_t* dst, const uint8_t* src, const uint8_t* map, int n);
+
+  // Channels to packed pixels.
+  void (*packRgb)(uint8_t* dst, const uint8_t* const rgb[3], const kestrel::PixelFormat& format,
+                  const kestrel::FieldShifts& shifts, int n);
+  // Writes byte `alphaByte` of each packed pixel: from a run, or one value.
+  void (*putAlpha)(uint8_t* pixels, const uint8_t* alpha, const kestrel::PixelFormat& format,
+                   int n);
+  void (*fillAlpha)(uint8_t* pixels, uint8_t alpha, const kestrel::PixelFormat& format, int n);
+
+  // dst[i * step] = src[i]: bytes, and packed pixels whose own bytes stay ascending.
+  void (*writeStrided)(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int n);
+  void (*writePixels)(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int bytes, int n);
+};
+
+namespace kestrel {
+
+using RowOps = KestrelRowOps;
+
+extern const RowOps kScalarRows;
+
+}  // namespace kestrel
+
+#endif

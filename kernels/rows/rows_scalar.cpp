@@ -1,0 +1,298 @@
+// The reference version of every row operation.
+#include <string.h>
+
+#include "engine/engine_internal.h"
+#include "kernels/rows/rows.h"
+
+namespace kestrel {
+namespace {
+
+void ReadStrided(uint8_t* dst, const uint8_t* src, ptrdiff_t step, int n) {
+  if (step == 1) {
+    memcpy(dst, src, size_t(n));
+    return;
+  }
+  for (int i = 0; i < n; ++i) dst[i] = src[i * step];
+}
+
+void Gather(uint8_t* dst, const uint8_t* src, const int32_t* offsets, int n) {
+  for (int i = 0; i < n; ++i) dst[i] = src[offsets[i]];
+}
+
+template <int kBytes>
+void GatherUnits(uint8_t* dst, const uint8_t* src, const int32_t* offsets, int n) {
+  for (int i = 0; i < n; ++i) memcpy(dst + i * kBytes, src + offsets[i], kBytes);
+}
+
+void GatherPixels(uint8_t* dst, const uint8_t* src, const int32_t* offsets, int bytes, int n) {
+  switch (bytes) {
+    case 1:
+      return GatherUnits<1>(dst, src, offsets, n);
+    case 2:
+      return GatherUnits<2>(dst, src, offsets, n);
+    case 3:
+      return GatherUnits<3>(dst, src, offsets, n);
+    default:
+      return GatherUnits<4>(dst, src, offsets, n);
+  }
+}
+
+// The result lies between a and b: always a byte.
+uint8_t Blend(int32_t a, int32_t b, int32_t weight) {
+  return uint8_t((a * 65536 + weight * (b - a)) >> 16);
+}
+
+void BlendColumns(uint8_t* dst, const uint8_t* a, const uint8_t* b, const uint16_t* weights,
+                  int n) {
+  for (int i = 0; i < n; ++i) dst[i] = Blend(a[i], b[i], weights[i]);
+}
+
+void BlendRows(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t weight, int n) {
+  for (int i = 0; i < n; ++i) dst[i] = Blend(a[i], b[i], int32_t(weight));
+}
+
+template <int kBytes>
+uint32_t LoadPixel(const uint8_t* p) {
+  uint32_t pixel = 0;
+  for (int i = 0; i < kBytes; ++i) pixel |= uint32_t(p[i]) << (8 * i);
+  return pixel;
+}
+
+template <int kBytes>
+void StorePixel(uint8_t* p, uint32_t pixel) {
+  for (int i = 0; i < kBytes; ++i) p[i] = uint8_t(pixel >> (8 * i));
+}
+
+uint8_t TopBits(uint32_t pixel, uint32_t position, uint32_t size) {
+  return size == 0 ? uint8_t{0} : uint8_t(((pixel >> position) << (32 - size)) >> 24);
+}
+
+template <int kBytes>
+void UnpackFields(uint8_t* const rgb[3], const uint8_t* src, const PixelFormat& format, int n) {
+  for (int i = 0; i < n; ++i) {
+    const uint32_t pixel = LoadPixel<kBytes>(src + i * kBytes);
+    for (int c = 0; c < 3; ++c) rgb[c][i] = TopBits(pixel, format.position[c], format.size[c]);
+  }
+}
+
+template <int kBytes>
+void UnpackBytes(uint8_t* const rgb[3], const uint8_t* src, const PixelFormat& format, int n) {
+  const uint8_t* const red = src + format.position[0] / 8;
+  const uint8_t* const green = src + format.position[1] / 8;
+  const uint8_t* const blue = src + format.position[2] / 8;
+  for (int i = 0; i < n; ++i) {
+    rgb[0][i] = red[i * kBytes];
+    rgb[1][i] = green[i * kBytes];
+    rgb[2][i] = blue[i * kBytes];
+  }
+}
+
+void UnpackRgb(uint8_t* const rgb[3], const uint8_t* src, const PixelFormat& format, int n) {
+  switch (format.bytes) {
+    case 0:  // indexed pixels without a palette have no channels
+      for (int c = 0; c < 3; ++c) memset(rgb[c], 0, size_t(n));
+      return;
+    case 1:
+      return UnpackFields<1>(rgb, src, format, n);
+    case 2:
+      return UnpackFields<2>(rgb, src, format, n);
+    case 3:
+      return format.wholeBytes ? UnpackBytes<3>(rgb, src, format, n)
+                               : UnpackFields<3>(rgb, src, format, n);
+    default:
+      return format.wholeBytes ? UnpackBytes<4>(rgb, src, format, n)
+                               : UnpackFields<4>(rgb, src, format, n);
+  }
+}
+
+void UnpackAlpha(uint8_t* alpha, const uint8_t* src, const PixelFormat& format, int n) {
+  for (int i = 0; i < n; ++i) alpha[i] = src[i * format.bytes + format.alphaByte];
+}
+
+void UnpackIndexed(uint8_t* const rgb[3], const uint8_t* row, const int32_t* columns, uint32_t bits,
+                   const uint8_t* palette, int n) {
+  const uint32_t perByte = 8 / bits;
+  const uint32_t mask = (1u << bits) - 1;
+  for (int i = 0; i < n; ++i) {
+    const uint32_t column = uint32_t(columns[i]);
+    const uint32_t shift = bits * (perByte - 1 - column % perByte);
+    const uint8_t* entry = palette + 4 * ((uint32_t(row[column / perByte]) >> shift) & mask);
+    for (int c = 0; c < 3; ++c) rgb[c][i] = entry[2 - c];
+  }
+}
+
+void YuvToRgb(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u, const uint8_t* v,
+              const YuvToRgbTable& table, int n) {
+  uint8_t* const red = rgb[0];
+  uint8_t* const green = rgb[1];
+  uint8_t* const blue = rgb[2];
+  const uint32_t shiftR = 20 + table.narrowing[0];
+  const uint32_t shiftG = 20 + table.narrowing[1];
+  const uint32_t shiftB = 20 + table.narrowing[2];
+  for (int i = 0; i < n; ++i) {
+    const uint32_t ty = table.y[y[i]];
+    const uint32_t tu = table.u[u[i]];
+    const uint32_t tv = table.v[v[i]];
+    // Carries out of the low halves are part of the arithmetic.
+    red[i] = table.clamp[(tv + ty) >> shiftR];
+    green[i] = table.clamp[(ty + ((tu + tv) << 16)) >> shiftG];
+    blue[i] = table.clamp[(tu + ty) >> shiftB];
+  }
+}
+
+// Clamp-table indices of one colour, before narrowing. The chroma words keep their truncation to
+// 1/16 level and the low halves that the table form carries into R and B.
+struct Indices {
+  int32_t channel[3];
+};
+
+Indices WideIndices(const YuvToRgbWide& s, int32_t y, int32_t u, int32_t v) {
+  const int64_t luma = int64_t(y) * s.yGain * 16;
+  const int64_t vRed = (s.offset[0] + v * s.vToR) >> 12;
+  const int64_t vGreen = (s.offset[1] + v * s.vToG) >> 12;
+  const int64_t uBlue = (s.offset[2] + u * s.uToB) >> 12;
+  const int64_t uGreen = (u * s.uToG) >> 12;
+  return {{int32_t((vRed * 65536 + (vGreen & 0xFFFF) + luma) >> 20),
+           int32_t((luma + (uGreen + vGreen) * 65536) >> 20),
+           int32_t((uBlue * 65536 + (uGreen & 0xFFFF) + luma) >> 20)}};
+}
+
+uint8_t Narrow(const YuvToRgbWide& s, int channel, int32_t index) {
+  const int32_t value = (index >> s.narrowing[channel]) - s.base[channel];
+  return uint8_t(value < 0 ? 0 : value > s.maximum[channel] ? s.maximum[channel] : value);
+}
+
+void YuvToRgbByWideSums(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u, const uint8_t* v,
+                        const YuvToRgbWide& sums, int n) {
+  for (int i = 0; i < n; ++i) {
+    const Indices index = WideIndices(sums, y[i], u[i], v[i]);
+    for (int c = 0; c < 3; ++c) rgb[c][i] = Narrow(sums, c, index.channel[c]);
+  }
+}
+
+void YuvToRgbCarry(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u, const uint8_t* v,
+                   const YuvToRgbWide& sums, Carry* carry, int n) {
+  for (int i = 0; i < n; ++i) {
+    const Indices indices = WideIndices(sums, y[i], u[i], v[i]);
+    for (int c = 0; c < 3; ++c) {
+      const int32_t index = indices.channel[c] + carry->remainder[c];
+      rgb[c][i] = Narrow(sums, c, index);
+      carry->remainder[c] = index & carry->mask[c];
+    }
+  }
+}
+
+void RgbToLuma(uint8_t* luma, const uint8_t* const rgb[3], RgbToYuvTables tables, int n) {
+  const uint8_t* const red = rgb[0];
+  const uint8_t* const green = rgb[1];
+  const uint8_t* const blue = rgb[2];
+  for (int i = 0; i < n; ++i) {
+    luma[i] = uint8_t((tables[0][red[i]] + tables[1][green[i]] + tables[2][blue[i]]) >> 16);
+  }
+}
+
+void RgbToChroma(uint8_t* u, uint8_t* v, const uint8_t* const rgb[3], RgbToYuvTables tables,
+                 int n) {
+  const uint8_t* const red = rgb[0];
+  const uint8_t* const green = rgb[1];
+  const uint8_t* const blue = rgb[2];
+  for (int i = 0; i < n; ++i) {
+    u[i] = uint8_t((tables[3][red[i]] + tables[4][green[i]] + tables[5][blue[i]]) >> 16);
+    v[i] = uint8_t((tables[5][red[i]] + tables[6][green[i]] + tables[7][blue[i]]) >> 16);
+  }
+}
+
+void MapLevels(uint8_t* dst, const uint8_t* src, const uint8_t* map, int n) {
+  for (int i = 0; i < n; ++i) dst[i] = map[src[i]];
+}
+
+template <int kBytes>
+void PackFields(uint8_t* dst, const uint8_t* const rgb[3], const PixelFormat& format,
+                const FieldShifts& shifts, int n) {
+  for (int i = 0; i < n; ++i) {
+    uint32_t pixel = 0;
+    for (int c = 0; c < 3; ++c) {
+      const uint32_t value = rgb[c][i];
+      const int32_t right = shifts.right[c];
+      pixel |= (right >= 0 ? value >> right : value << -right) << format.position[c];
+    }
+    StorePixel<kBytes>(dst + i * kBytes, pixel);
+  }
+}
+
+template <int kBytes>
+void PackBytes(uint8_t* dst, const uint8_t* const rgb[3], const PixelFormat& format, int n) {
+  const uint8_t* const red = rgb[0];
+  const uint8_t* const green = rgb[1];
+  const uint8_t* const blue = rgb[2];
+  for (int i = 0; i < n; ++i) {
+    StorePixel<kBytes>(dst + i * kBytes, uint32_t(red[i]) << format.position[0] |
+                                             uint32_t(green[i]) << format.position[1] |
+                                             uint32_t(blue[i]) << format.position[2]);
+  }
+}
+
+void PackRgb(uint8_t* dst, const uint8_t* const rgb[3], const PixelFormat& format,
+             const FieldShifts& shifts, int n) {
+  switch (format.bytes) {
+    case 1:
+      return PackFields<1>(dst, rgb, format, shifts, n);
+    case 2:
+      return PackFields<2>(dst, rgb, format, shifts, n);
+    case 3:
+      return format.wholeBytes ? PackBytes<3>(dst, rgb, format, n)
+                               : PackFields<3>(dst, rgb, format, shifts, n);
+    default:
+      return format.wholeBytes ? PackBytes<4>(dst, rgb, format, n)
+                               : PackFields<4>(dst, rgb, format, shifts, n);
+  }
+}
+
+void PutAlpha(uint8_t* pixels, const uint8_t* alpha, const PixelFormat& format, int n) {
+  for (int i = 0; i < n; ++i) pixels[i * format.bytes + format.alphaByte] = alpha[i];
+}
+
+void FillAlpha(uint8_t* pixels, uint8_t alpha, const PixelFormat& format, int n) {
+  for (int i = 0; i < n; ++i) pixels[i * format.bytes + format.alphaByte] = alpha;
+}
+
+void WriteStrided(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int n) {
+  if (step == 1) {
+    memcpy(dst, src, size_t(n));
+    return;
+  }
+  for (int i = 0; i < n; ++i) dst[i * step] = src[i];
+}
+
+template <int kBytes>
+void WriteUnits(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int n) {
+  for (int i = 0; i < n; ++i) memcpy(dst + i * step, src + i * kBytes, kBytes);
+}
+
+void WritePixels(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int bytes, int n) {
+  switch (bytes) {
+    case 1:
+      return WriteUnits<1>(dst, step, src, n);
+    case 2:
+      return WriteUnits<2>(dst, step, src, n);
+    case 3:
+      return WriteUnits<3>(dst, step, src, n);
+    default:
+      return WriteUnits<4>(dst, step, src, n);
+  }
+}
+
+}  // namespace
+
+const RowOps kScalarRows = {
+    ReadStrided,   Gather,      GatherPixels,  BlendColumns, BlendRows,
+    UnpackRgb,     UnpackAlpha, UnpackIndexed, YuvToRgb,     YuvToRgbByWideSums,
+    YuvToRgbCarry, RgbToLuma,   RgbToChroma,   MapLevels,    PackRgb,
+    PutAlpha,      FillAlpha,   WriteStrided,  WritePixels,
+};
+
+const RowOps* SelectRowOps() {
+  return &kScalarRows;
+}
+
+}  // namespace kestrel
