@@ -207,7 +207,9 @@ uint32_t MPProcessRect(PassEngine* engine, uint8_t* const* dstPlanes, const MREC
   MPBindPlanes(&engine->srcLayout, srcPlanes, srcPitches);
   MPBindPlanes(&engine->dstLayout, dstPlanes, dstPitches);
   if (!IsWithinLimits(*engine, rect)) return KESTREL_BAD_ARGUMENT;
-  if (rect.left >= rect.right) return KESTREL_OK;
+  // A crop rounded to blocks can leave nothing of a small source.
+  const bool nothingToRead = engine->srcRegionWidth <= 0 || engine->srcRegionHeight <= 0;
+  if (rect.left >= rect.right || nothingToRead) return KESTREL_OK;
 
   // The last dispatched bottom starts at 0, not at the rectangle's top: a rectangle that ends at or
   // above row 0 draws nothing.

@@ -24,6 +24,10 @@ Destination::Destination(const Job& job)
       exchange_(!ExchangesLuma(job.engine.dstLayout.code) ? LumaExchange::kNone
                 : job.engine.swapXY != 0                  ? LumaExchange::kRows
                                                           : LumaExchange::kColumns) {
+  if (pixels_.alphaByte >= 0 && engine_.pathKind == PATH_YUV_TO_RGB) {
+    const int shift = 8 * pixels_.alphaByte;
+    alphaFill_ = {~(0xFFu << shift), engine_.alpha << shift};
+  }
   for (int i = 0; i < 3; ++i) planes_[i] = Plane(i);
   for (int c = 0; c < 3; ++c) {
     const int32_t bits = int32_t(pixels_.size[c]);
@@ -150,13 +154,9 @@ void Destination::PutRgb(int32_t r, const uint8_t* const rgb[3], const uint8_t* 
   uint8_t* const start = plane.At(int64_t(x_) + firstPixel_ - job_.rect.left, row);
   const bool direct = plane.columnStep == pixels_.bytes;
   uint8_t* const pixels = direct ? start : packed_;
-  rows_.packRgb(pixels, first, pixels_, narrowed ? narrowedShifts_ : fullShifts_, n);
-  if (pixels_.alphaByte >= 0) {
-    if (engine_.pathKind == PATH_YUV_TO_RGB) {
-      rows_.fillAlpha(pixels, uint8_t(engine_.alpha), pixels_, n);
-    } else if (alpha != nullptr) {
-      rows_.putAlpha(pixels, alpha + firstPixel_, pixels_, n);
-    }
+  rows_.packRgb(pixels, first, pixels_, narrowed ? narrowedShifts_ : fullShifts_, alphaFill_, n);
+  if (alpha != nullptr && pixels_.alphaByte >= 0) {
+    rows_.putAlpha(pixels, alpha + firstPixel_, pixels_, n);
   }
   if (!direct) rows_.writePixels(start, plane.columnStep, packed_, pixels_.bytes, n);
 }

@@ -48,7 +48,8 @@ class Destination {
   void PutLuma(int32_t r, const uint8_t* luma);
   void PutChroma(int32_t r, const uint8_t* u, const uint8_t* v);
 
-  // RGB. `narrowed`: the channels are as wide as their fields already.
+  // RGB. `narrowed`: the channels are as wide as their fields already. `alpha` is null unless the
+  // source has one.
   void PutRgb(int32_t r, const uint8_t* const rgb[3], const uint8_t* alpha, bool narrowed);
 
  private:
@@ -64,6 +65,7 @@ class Destination {
   DestinationPlane planes_[3];
   PixelFormat pixels_;
   FieldShifts narrowedShifts_, fullShifts_;
+  AlphaFill alphaFill_ = {~0u, 0};  // the engine's alpha, for sources that have none
   bool hasChroma_;
   bool writesPixels_;
   LumaExchange exchange_;

@@ -24,6 +24,12 @@ struct FieldShifts {
   int32_t right[3];
 };
 
+// A constant alpha: pixel = (fields & keep) | bits.
+struct AlphaFill {
+  uint32_t keep;
+  uint32_t bits;
+};
+
 // YUV to RGB by table reads. index = sum >> 20; channel = clamp[index >> narrowing].
 struct YuvToRgbTable {
   const uint8_t* clamp;
@@ -92,11 +98,10 @@ struct KestrelRowOps {
 
   // Channels to packed pixels.
   void (*packRgb)(uint8_t* dst, const uint8_t* const rgb[3], const kestrel::PixelFormat& format,
-                  const kestrel::FieldShifts& shifts, int n);
-  // Writes byte `alphaByte` of each packed pixel: from a run, or one value.
+                  const kestrel::FieldShifts& shifts, kestrel::AlphaFill alpha, int n);
+  // Overwrites byte `alphaByte` of each packed pixel.
   void (*putAlpha)(uint8_t* pixels, const uint8_t* alpha, const kestrel::PixelFormat& format,
                    int n);
-  void (*fillAlpha)(uint8_t* pixels, uint8_t alpha, const kestrel::PixelFormat& format, int n);
 
   // dst[i * step] = src[i]: bytes, and packed pixels whose own bytes stay ascending.
   void (*writeStrided)(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int n);

@@ -4,6 +4,8 @@
 #include "engine/engine_internal.h"
 #include "kernels/rows/rows.h"
 
+static_assert(__BYTE_ORDER__ == __ORDER_LITTLE_ENDIAN__, "packed pixels are stored as words");
+
 namespace kestrel {
 namespace {
 
@@ -51,16 +53,17 @@ void BlendRows(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t weight
   for (int i = 0; i < n; ++i) dst[i] = Blend(a[i], b[i], int32_t(weight));
 }
 
+// Pixels are little-endian words, as every CPU this library is built for is.
 template <int kBytes>
 uint32_t LoadPixel(const uint8_t* p) {
   uint32_t pixel = 0;
-  for (int i = 0; i < kBytes; ++i) pixel |= uint32_t(p[i]) << (8 * i);
+  memcpy(&pixel, p, kBytes);
   return pixel;
 }
 
 template <int kBytes>
 void StorePixel(uint8_t* p, uint32_t pixel) {
-  for (int i = 0; i < kBytes; ++i) p[i] = uint8_t(pixel >> (8 * i));
+  memcpy(p, &pixel, kBytes);
 }
 
 uint8_t TopBits(uint32_t pixel, uint32_t position, uint32_t size) {
@@ -123,20 +126,19 @@ void UnpackIndexed(uint8_t* const rgb[3], const uint8_t* row, const int32_t* col
 
 void YuvToRgb(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u, const uint8_t* v,
               const YuvToRgbTable& table, int n) {
+  // Copies, because a stored byte could be anything's as far as the compiler knows.
   uint8_t* const red = rgb[0];
   uint8_t* const green = rgb[1];
   uint8_t* const blue = rgb[2];
-  const uint32_t shiftR = 20 + table.narrowing[0];
-  const uint32_t shiftG = 20 + table.narrowing[1];
-  const uint32_t shiftB = 20 + table.narrowing[2];
+  const YuvToRgbTable t = table;
   for (int i = 0; i < n; ++i) {
-    const uint32_t ty = table.y[y[i]];
-    const uint32_t tu = table.u[u[i]];
-    const uint32_t tv = table.v[v[i]];
+    const uint32_t ty = t.y[y[i]];
+    const uint32_t tu = t.u[u[i]];
+    const uint32_t tv = t.v[v[i]];
     // Carries out of the low halves are part of the arithmetic.
-    red[i] = table.clamp[(tv + ty) >> shiftR];
-    green[i] = table.clamp[(ty + ((tu + tv) << 16)) >> shiftG];
-    blue[i] = table.clamp[(tu + ty) >> shiftB];
+    red[i] = t.clamp[(tv + ty) >> (20 + t.narrowing[0])];
+    green[i] = t.clamp[(ty + ((tu + tv) << 16)) >> (20 + t.narrowing[1])];
+    blue[i] = t.clamp[(tu + ty) >> (20 + t.narrowing[2])];
   }
 }
 
@@ -208,7 +210,7 @@ void MapLevels(uint8_t* dst, const uint8_t* src, const uint8_t* map, int n) {
 
 template <int kBytes>
 void PackFields(uint8_t* dst, const uint8_t* const rgb[3], const PixelFormat& format,
-                const FieldShifts& shifts, int n) {
+                const FieldShifts& shifts, AlphaFill alpha, int n) {
   for (int i = 0; i < n; ++i) {
     uint32_t pixel = 0;
     for (int c = 0; c < 3; ++c) {
@@ -216,44 +218,44 @@ void PackFields(uint8_t* dst, const uint8_t* const rgb[3], const PixelFormat& fo
       const int32_t right = shifts.right[c];
       pixel |= (right >= 0 ? value >> right : value << -right) << format.position[c];
     }
-    StorePixel<kBytes>(dst + i * kBytes, pixel);
+    StorePixel<kBytes>(dst + i * kBytes, (pixel & alpha.keep) | alpha.bits);
   }
 }
 
 template <int kBytes>
-void PackBytes(uint8_t* dst, const uint8_t* const rgb[3], const PixelFormat& format, int n) {
+void PackBytes(uint8_t* dst, const uint8_t* const rgb[3], const PixelFormat& format,
+               AlphaFill alpha, int n) {
   const uint8_t* const red = rgb[0];
   const uint8_t* const green = rgb[1];
   const uint8_t* const blue = rgb[2];
+  const uint32_t toRed = format.position[0];
+  const uint32_t toGreen = format.position[1];
+  const uint32_t toBlue = format.position[2];
   for (int i = 0; i < n; ++i) {
-    StorePixel<kBytes>(dst + i * kBytes, uint32_t(red[i]) << format.position[0] |
-                                             uint32_t(green[i]) << format.position[1] |
-                                             uint32_t(blue[i]) << format.position[2]);
+    const uint32_t pixel =
+        uint32_t(red[i]) << toRed | uint32_t(green[i]) << toGreen | uint32_t(blue[i]) << toBlue;
+    StorePixel<kBytes>(dst + i * kBytes, (pixel & alpha.keep) | alpha.bits);
   }
 }
 
 void PackRgb(uint8_t* dst, const uint8_t* const rgb[3], const PixelFormat& format,
-             const FieldShifts& shifts, int n) {
+             const FieldShifts& shifts, AlphaFill alpha, int n) {
   switch (format.bytes) {
     case 1:
-      return PackFields<1>(dst, rgb, format, shifts, n);
+      return PackFields<1>(dst, rgb, format, shifts, alpha, n);
     case 2:
-      return PackFields<2>(dst, rgb, format, shifts, n);
+      return PackFields<2>(dst, rgb, format, shifts, alpha, n);
     case 3:
-      return format.wholeBytes ? PackBytes<3>(dst, rgb, format, n)
-                               : PackFields<3>(dst, rgb, format, shifts, n);
+      return format.wholeBytes ? PackBytes<3>(dst, rgb, format, alpha, n)
+                               : PackFields<3>(dst, rgb, format, shifts, alpha, n);
     default:
-      return format.wholeBytes ? PackBytes<4>(dst, rgb, format, n)
-                               : PackFields<4>(dst, rgb, format, shifts, n);
+      return format.wholeBytes ? PackBytes<4>(dst, rgb, format, alpha, n)
+                               : PackFields<4>(dst, rgb, format, shifts, alpha, n);
   }
 }
 
 void PutAlpha(uint8_t* pixels, const uint8_t* alpha, const PixelFormat& format, int n) {
   for (int i = 0; i < n; ++i) pixels[i * format.bytes + format.alphaByte] = alpha[i];
-}
-
-void FillAlpha(uint8_t* pixels, uint8_t alpha, const PixelFormat& format, int n) {
-  for (int i = 0; i < n; ++i) pixels[i * format.bytes + format.alphaByte] = alpha;
 }
 
 void WriteStrided(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int n) {
@@ -285,10 +287,9 @@ void WritePixels(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int bytes, in
 }  // namespace
 
 const RowOps kScalarRows = {
-    ReadStrided,   Gather,      GatherPixels,  BlendColumns, BlendRows,
-    UnpackRgb,     UnpackAlpha, UnpackIndexed, YuvToRgb,     YuvToRgbByWideSums,
-    YuvToRgbCarry, RgbToLuma,   RgbToChroma,   MapLevels,    PackRgb,
-    PutAlpha,      FillAlpha,   WriteStrided,  WritePixels,
+    ReadStrided, Gather,        GatherPixels, BlendColumns,       BlendRows,     UnpackRgb,
+    UnpackAlpha, UnpackIndexed, YuvToRgb,     YuvToRgbByWideSums, YuvToRgbCarry, RgbToLuma,
+    RgbToChroma, MapLevels,     PackRgb,      PutAlpha,           WriteStrided,  WritePixels,
 };
 
 const RowOps* SelectRowOps() {
