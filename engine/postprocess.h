@@ -14,7 +14,9 @@
  * and rectangle; the handle owns all that creation allocated. Memory is taken at creation only.
  *
  * Threads: there is no global state. Separate handles are independent; one handle serves one thread
- * at a time. Sources, palettes and parameter records may be shared read-only.
+ * at a time. Sources and palettes may be shared read-only; format and parameter records may not be
+ * shared by threads that create engines at once, because creation rewrites and restores words of
+ * them.
  *
  * Arrays of planes and pitches hold three entries: 0 Y or RGB, 1 U, 2 V; unused entries are null
  * and 0. The V-first planar codes (FORMAT_YV12 ...) take V in entry 1 and U in entry 2. Semi-planar

@@ -283,8 +283,11 @@ uint32_t MBitmapAlloc(MBITMAP* bitmap) {
     if (given[0] != 0 && given[1] != 0 && given[2] != 0) {
       pitches = {{given[0], given[1], given[2]}};
     }
-  } else if (given[0] != 0) {
-    pitches.of[0] = given[0];
+  } else {
+    // Also pitches 1 and 2, which one-plane formats have no use for, stay as they were given.
+    for (int i = 0; i < 3; ++i) {
+      if (given[i] != 0) pitches.of[i] = given[i];
+    }
   }
   for (const int64_t pitch : pitches.of) {
     if (pitch < 0 || pitch > INT32_MAX) return KESTREL_OUT_OF_MEMORY;
