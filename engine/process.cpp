@@ -105,6 +105,7 @@ struct PlaneArrays {
 // The inner block of a tiled run goes to a block kernel's engine, the strips around it to the pass
 // 1 engine, which takes any rectangle.
 void RunTiled(const MPPHandle& handle, const MRECT& outer, const PlaneArrays& arrays) {
+  if (IsEmpty(outer)) return;
   PassEngine* const ragged = handle.pass[0];
   const PassEngine& blocks = *handle.pass[2];
   const bool mirrorKeepsGrid = (blocks.mirrorX == 0 && blocks.mirrorY == 0) ||

@@ -1,0 +1,303 @@
+// Random conversions through the public interface, every byte compared with the plain model.
+#include <algorithm>
+#include <csignal>
+#include <cstdint>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <initializer_list>
+#include <memory>
+#include <string>
+
+#include "engine/postprocess.h"
+#include "tests/differential/case.h"
+#include "tests/reference/reference.h"
+#include "tests/support/guarded_buffer.h"
+
+namespace differential {
+namespace {
+
+using testing_support::GuardedBuffer;
+
+constexpr size_t kCapacity = size_t{1} << 20;
+constexpr ptrdiff_t kMargin = 64;  // bytes around a block that must stay as they were
+
+// What a crash handler can still say.
+volatile std::sig_atomic_t crashInModel = 0;
+uint64_t currentSeed = 0;
+uint64_t currentNumber = 0;
+
+extern "C" void ReportCrash(int signalNumber) {
+  char line[160];
+  const int length = std::snprintf(line, sizeof(line),
+                                   "signal %d in the %s; reproduce with: differential --seed %llu "
+                                   "--first %llu --cases 1 --verbose\n",
+                                   signalNumber, crashInModel ? "model" : "library",
+                                   static_cast<unsigned long long>(currentSeed),
+                                   static_cast<unsigned long long>(currentNumber));
+  std::fwrite(line, 1, size_t(length), stderr);
+  std::signal(signalNumber, SIG_DFL);  // the faulting instruction runs again and ends the program
+}
+
+void FillContent(Random* random, Content content, uint8_t* bytes, size_t count) {
+  constexpr uint8_t kExtremes[] = {0, 0, 255, 255, 16, 128, 235, 240};
+  if (content == Content::kNoise) {
+    random->Fill(bytes, count);
+  } else if (content == Content::kExtremes) {
+    random->Fill(bytes, count);
+    for (size_t i = 0; i < count; ++i) {
+      bytes[i] = kExtremes[bytes[i] & 7];
+    }
+  } else {
+    const uint32_t slope = uint32_t(random->Between(1, 9));
+    const uint32_t start = uint32_t(random->Between(0, 255));
+    for (size_t i = 0; i < count; ++i) {
+      bytes[i] = uint8_t(start + i * slope / 3);
+    }
+  }
+}
+
+// A block between guard pages and the bytes around it that are watched.
+struct PlacedBlock {
+  uint8_t* first;  // lowest address
+  uint8_t* top;    // address of the top row
+  uint8_t* watched;
+  size_t watchedSize;
+};
+
+PlacedBlock Place(GuardedBuffer* buffer, const Side& side, int index) {
+  const Block& block = side.blocks.block[index];
+  const Placement& placement = side.placement[index];
+  const int32_t pitch = side.pitches[index];
+  const size_t size = SizeOf(block, pitch);
+  PlacedBlock placed;
+  placed.first = buffer->Place(size, placement.edge, placement.alignment, placement.remainder);
+  placed.top = pitch < 0 ? placed.first + ptrdiff_t(-pitch) * (block.rows - 1) : placed.first;
+  placed.watched = placed.first - std::min(kMargin, placed.first - buffer->begin());
+  const uint8_t* const end = placed.first + size;
+  placed.watchedSize =
+      size_t(end - placed.watched) + size_t(std::min(kMargin, buffer->end() - end));
+  return placed;
+}
+
+template <typename Byte>
+void SetPlanes(const Side& side, const PlacedBlock* placed, Byte** planes, int32_t* pitches) {
+  Byte* tops[3] = {nullptr, nullptr, nullptr};
+  for (int i = 0; i < side.blocks.count; ++i) {
+    tops[i] = placed[i].top;
+  }
+  SlotsOf<Byte>(side.format, tops, planes);
+  if (side.nullSlot >= 0) {
+    planes[side.nullSlot] = nullptr;
+  }
+  std::copy(side.pitches, side.pitches + 3, pitches);
+}
+
+std::string Bytes(const uint8_t* bytes, ptrdiff_t count) {
+  std::string text;
+  char hex[4];
+  for (ptrdiff_t i = 0; i < count; ++i) {
+    std::snprintf(hex, sizeof(hex), " %02x", bytes[i]);
+    text += hex;
+  }
+  return text;
+}
+
+class Bench {
+ public:
+  Bench() : palette_(1024) {
+    for (int i = 0; i < 3; ++i) {
+      source_[i] = std::make_unique<GuardedBuffer>(kCapacity);
+      product_[i] = std::make_unique<GuardedBuffer>(kCapacity);
+      model_[i] = std::make_unique<GuardedBuffer>(kCapacity);
+    }
+  }
+
+  // Empty when model and product agree, otherwise what differs.
+  std::string Run(const Case& drawn) {
+    Random random(drawn.seed ^ 0x5bd1e995, drawn.number);
+    PlacedBlock source[3], product[3], model[3];
+    for (int i = 0; i < drawn.src.blocks.count; ++i) {
+      source[i] = Place(source_[i].get(), drawn.src, i);
+      FillContent(&random, drawn.content, source[i].watched, source[i].watchedSize);
+    }
+    for (int i = 0; i < drawn.dst.blocks.count; ++i) {
+      product[i] = Place(product_[i].get(), drawn.dst, i);
+      model[i] = Place(model_[i].get(), drawn.dst, i);
+      random.Fill(product[i].watched, product[i].watchedSize);
+      std::memcpy(model[i].watched, product[i].watched, product[i].watchedSize);
+    }
+
+    reference::Job job{};
+    job.dst = drawn.dst.record;
+    job.src = drawn.src.record;
+    if (job.src.palette) {
+      const size_t size = size_t{4} << drawn.src.format.bitsPerPixel;
+      uint8_t* const palette = palette_.Place(size, GuardedBuffer::Edge::kEnd);
+      random.Fill(palette, size);
+      job.src.palette = palette;
+    }
+    job.params = drawn.params;
+    job.hasRect = drawn.hasRect;
+    job.rect = drawn.rect;
+    SetPlanes(drawn.src, source, job.srcPlanes, job.srcPitches);
+    SetPlanes(drawn.dst, model, job.dstPlanes, job.dstPitches);
+    crashInModel = 1;
+    const uint32_t expectedCode = reference::Convert(job);
+    crashInModel = 0;
+    for (int i = 0; i < drawn.dst.blocks.count; ++i) {
+      if (std::memcmp(model[i].watched, product[i].watched, product[i].watchedSize) != 0) {
+        ++drew_;
+        break;
+      }
+    }
+
+    uint8_t* productPlanes[3];
+    SetPlanes(drawn.dst, product, productPlanes, job.dstPitches);
+    bool recordsKept = false;
+    const uint32_t code = RunProduct(job, productPlanes, &recordsKept);
+    if (code != expectedCode) {
+      return "code " + std::to_string(code) + ", expected " + std::to_string(expectedCode);
+    }
+    if (!recordsKept) {
+      return "the records of the caller have changed";
+    }
+    refused_ += code != KESTREL_OK;
+    return Compare(drawn, product, model);
+  }
+
+  uint64_t refused() const { return refused_; }
+  uint64_t drew() const { return drew_; }
+
+ private:
+  static uint32_t RunProduct(const reference::Job& job, uint8_t* const* planes, bool* recordsKept) {
+    MPPFORMAT dst = job.dst;
+    MPPFORMAT src = job.src;
+    MPPPARAM params = job.params;
+    MPPHandle* handle = nullptr;
+    uint32_t code = MPPCreate(&dst, &src, &params, &handle);
+    *recordsKept = dst.format == job.dst.format && src.format == job.src.format &&
+                   std::memcmp(&params, &job.params, sizeof(params)) == 0;
+    if (code == KESTREL_OK) {
+      code = MPProcess(handle, planes, job.hasRect ? &job.rect : nullptr, job.dstPitches,
+                       job.srcPlanes, job.srcPitches);
+      MPPDestroy(handle);
+    }
+    return code;
+  }
+
+  static std::string Compare(const Case& drawn, const PlacedBlock* product,
+                             const PlacedBlock* model) {
+    for (int i = 0; i < drawn.dst.blocks.count; ++i) {
+      const uint8_t* const got = product[i].watched;
+      const uint8_t* const expected = model[i].watched;
+      const size_t size = product[i].watchedSize;
+      if (std::memcmp(got, expected, size) == 0) {
+        continue;
+      }
+      const ptrdiff_t at = std::mismatch(got, got + size, expected).first - got;
+      const ptrdiff_t offset = (got + at) - product[i].first;
+      const ptrdiff_t pitch = std::abs(drawn.dst.pitches[i]);
+      const ptrdiff_t count = std::min<ptrdiff_t>(16, ptrdiff_t(size) - at);
+      return "block " + std::to_string(i) + ", byte " + std::to_string(offset) + " (line " +
+             std::to_string(offset / pitch) + " in memory, byte " + std::to_string(offset % pitch) +
+             ")\n    got     " + Bytes(got + at, count) + "\n    expected" +
+             Bytes(expected + at, count);
+    }
+    return std::string();
+  }
+
+  std::unique_ptr<GuardedBuffer> source_[3], product_[3], model_[3];
+  GuardedBuffer palette_;
+  uint64_t refused_ = 0;
+  uint64_t drew_ = 0;
+};
+
+struct Options {
+  uint64_t cases = 2000;
+  uint64_t seed = 1;
+  uint64_t first = 0;
+  uint64_t failures = 1;
+  bool verbose = false;
+};
+
+int Usage() {
+  std::fprintf(stderr,
+               "usage: differential [--cases N] [--seed S] [--first K] [--failures F] [--verbose]\n"
+               "Runs the cases K..K+N-1 of seed S and stops after F failures.\n");
+  return 2;
+}
+
+bool ParseOptions(int argc, char** argv, Options* options) {
+  for (int i = 1; i < argc; ++i) {
+    const std::string name = argv[i];
+    if (name == "--verbose") {
+      options->verbose = true;
+      continue;
+    }
+    uint64_t* const target = name == "--cases"      ? &options->cases
+                             : name == "--seed"     ? &options->seed
+                             : name == "--first"    ? &options->first
+                             : name == "--failures" ? &options->failures
+                                                    : nullptr;
+    if (!target || i + 1 == argc) {
+      return false;
+    }
+    char* end = nullptr;
+    *target = std::strtoull(argv[++i], &end, 10);
+    if (*end != '\0' || end == argv[i]) {
+      return false;
+    }
+  }
+  return true;
+}
+
+int RunCases(const Options& options) {
+  for (int signalNumber : {SIGSEGV, SIGBUS, SIGFPE, SIGILL, SIGABRT}) {
+    std::signal(signalNumber, ReportCrash);
+  }
+  Bench bench;
+  uint64_t failures = 0;
+  currentSeed = options.seed;
+  for (uint64_t i = 0; i < options.cases && failures < options.failures; ++i) {
+    currentNumber = options.first + i;
+    const Case drawn = DrawCase(options.seed, currentNumber);
+    if (options.verbose) {
+      std::fprintf(stderr, "%s", Describe(drawn).c_str());
+    }
+    const std::string difference = bench.Run(drawn);
+    if (!difference.empty()) {
+      ++failures;
+      std::printf(
+          "MISMATCH in %s  %s\n  reproduce with: differential --seed %llu --first %llu --cases 1\n",
+          Describe(drawn).c_str(), difference.c_str(),
+          static_cast<unsigned long long>(options.seed),
+          static_cast<unsigned long long>(currentNumber));
+      std::fflush(stdout);  // the next case may crash
+    }
+  }
+  if (failures != 0) {
+    return 1;
+  }
+  std::printf("%llu cases of seed %llu: %llu wrote pixels, %llu were refused, all bytes equal\n",
+              static_cast<unsigned long long>(options.cases),
+              static_cast<unsigned long long>(options.seed),
+              static_cast<unsigned long long>(bench.drew()),
+              static_cast<unsigned long long>(bench.refused()));
+  if (options.cases >= 1000 && bench.drew() < options.cases / 2) {
+    std::printf("too few of the cases wrote anything: they no longer test what they should\n");
+    return 1;
+  }
+  return 0;
+}
+
+}  // namespace
+}  // namespace differential
+
+int main(int argc, char** argv) {
+  differential::Options options;
+  if (!differential::ParseOptions(argc, argv, &options)) {
+    return differential::Usage();
+  }
+  return differential::RunCases(options);
+}
