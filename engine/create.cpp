@@ -334,9 +334,12 @@ uint32_t Decide(const MPPFORMAT& dst, const MPPFORMAT& src, const MPPPARAM& para
   }
   SetPath(c);
   SetBlockMode(c);
-  if (c->stepX == 0 || c->stepY == 0) return KESTREL_BAD_ARGUMENT;
+  if (dst.width < 0 || dst.height < 0 || src.width < 0 || src.height < 0) {
+    return KESTREL_BAD_ARGUMENT;
+  }
   ApplyAspectPolicy(params.aspectMode, c->blockMode, &geometry.x, &geometry.y);
   CopySteps(geometry, c);
+  if (c->stepX == 0 || c->stepY == 0) return KESTREL_BAD_ARGUMENT;
   c->srcOriginX = SaturateToInt32(geometry.x.srcOrigin);
   c->srcOriginY = SaturateToInt32(geometry.y.srcOrigin);
   c->dstOriginX = SaturateToInt32(geometry.x.dstOrigin);

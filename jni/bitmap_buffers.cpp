@@ -128,20 +128,27 @@ Pitches ComputePitches(const BufferLayout& layout, int64_t width) {
   }
 }
 
-// Bytes of the block that holds all planes. A semi-planar image has one chroma plane.
-int64_t BlockSize(const BufferLayout& layout, const Pitches& pitches, int64_t height) {
-  const int64_t rows = layout.roundsUp() ? RoundUpTo16(height) : height;
-  int64_t size = rows * pitches.of[0];
+// Bytes of the block that holds all planes; more than INT32_MAX when there can be no such block. A
+// semi-planar image has one chroma plane.
+uint64_t BlockSize(const BufferLayout& layout, const Pitches& pitches, int64_t height) {
+  for (const int64_t pitch : pitches.of) {
+    if (pitch < 0 || pitch > INT32_MAX) return UINT64_MAX;
+  }
+  // The sum of three products of 31-bit numbers fits 64 bits.
+  const uint64_t rows = uint64_t(layout.roundsUp() ? RoundUpTo16(height) : height);
+  uint64_t size = rows * uint64_t(pitches.of[0]);
   if (layout.hasChroma()) {
-    const int64_t chromaRows = rows / layout.vertical;
-    size += chromaRows * pitches.of[1];
-    if (layout.kind == BufferLayout::kPlanar) size += chromaRows * pitches.of[2];
+    const uint64_t chromaRows = rows / layout.vertical;
+    size += chromaRows * uint64_t(pitches.of[1]);
+    if (layout.kind == BufferLayout::kPlanar) size += chromaRows * uint64_t(pitches.of[2]);
   }
   return size;
 }
 
+// An address that may lie beyond the block: a one-plane format with pitches 1 and 2 gets them
+// placed like planes, and nothing uses them.
 uint8_t* Offset(uint8_t* block, int64_t bytes) {
-  return block + ptrdiff_t(bytes);
+  return reinterpret_cast<uint8_t*>(reinterpret_cast<uintptr_t>(block) + uintptr_t(bytes));
 }
 
 void PlacePlanes(const BufferLayout& layout, int64_t height, MBITMAP* bitmap) {
@@ -267,7 +274,7 @@ uint32_t getBufferLength(uint32_t format, int32_t width, int32_t height) {
   const BufferLayout layout = CommonLayout(format);
   if (width < 1 || height < 1 || layout.kind == BufferLayout::kNone) return 0;
   const Pitches pitches = ComputePitches(layout, width);
-  const int64_t size = BlockSize(layout, pitches, height);
+  const uint64_t size = BlockSize(layout, pitches, height);
   return size > INT32_MAX ? 0 : uint32_t(size);
 }
 
@@ -289,10 +296,7 @@ uint32_t MBitmapAlloc(MBITMAP* bitmap) {
       if (given[i] != 0) pitches.of[i] = given[i];
     }
   }
-  for (const int64_t pitch : pitches.of) {
-    if (pitch < 0 || pitch > INT32_MAX) return KESTREL_OUT_OF_MEMORY;
-  }
-  const int64_t size = BlockSize(layout, pitches, bitmap->height);
+  const uint64_t size = BlockSize(layout, pitches, bitmap->height);
   if (size > INT32_MAX) return KESTREL_OUT_OF_MEMORY;
   uint8_t* block = static_cast<uint8_t*>(MMemAlloc(nullptr, uint32_t(size)));
   if (block == nullptr) return KESTREL_OUT_OF_MEMORY;
