@@ -1,5 +1,5 @@
 // The family chain: the first dispatcher that answers 0 has done the job.
-#include "engine/postprocess.h"
+#include "engine/engine_internal.h"
 
 namespace {
 
@@ -22,6 +22,9 @@ extern "C" uint32_t ANY_ANY_Bilinear_No_Table(const MRECT* rect, const int32_t* 
                                               const int32_t* srcPitches, uint8_t* const* dstPlanes,
                                               const uint8_t* const* srcPlanes,
                                               const EngineContext* context) {
+  if (!kestrel::IsComplete(rect, dstPitches, srcPitches, dstPlanes, srcPlanes, context)) {
+    return KESTREL_BAD_ARGUMENT;
+  }
   for (KernelFn* family : kFamilies) {
     if (family(rect, dstPitches, srcPitches, dstPlanes, srcPlanes, context) == KESTREL_OK) {
       return KESTREL_OK;

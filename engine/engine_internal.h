@@ -43,6 +43,14 @@ constexpr int64_t kMaxPlaneSpan = INT32_MAX;
 // Implemented by kernels/rows/: the row operations for this CPU.
 const ::KestrelRowOps* SelectRowOps();
 
+// Whether a kernel call has all six arguments.
+inline bool IsComplete(const MRECT* rect, const int32_t* dstPitches, const int32_t* srcPitches,
+                       uint8_t* const* dstPlanes, const uint8_t* const* srcPlanes,
+                       const EngineContext* context) {
+  return rect != nullptr && dstPitches != nullptr && srcPitches != nullptr &&
+         dstPlanes != nullptr && srcPlanes != nullptr && context != nullptr;
+}
+
 inline int32_t SaturateToInt32(int64_t value) {
   return value > INT32_MAX ? INT32_MAX : value < INT32_MIN ? INT32_MIN : int32_t(value);
 }

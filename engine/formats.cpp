@@ -316,6 +316,7 @@ uint32_t MPParseFormat(FormatDesc* desc, const MPPFORMAT* record) {
 }
 
 uint32_t MPGetPlaneLayout(FormatDesc* desc, PlaneLayout* layout) {
+  if (desc == nullptr || layout == nullptr) return 0;
   if (NormaliseRgb(desc)) {
     layout->code = CODE_RGB;
     layout->bitsPerPixel = desc->colourStandard;
@@ -337,6 +338,7 @@ uint32_t MPGetPlaneLayout(FormatDesc* desc, PlaneLayout* layout) {
 }
 
 uint32_t MPGetSubsampling(const FormatDesc* desc, PlaneLayout* layout, uint32_t* factors) {
+  if (desc == nullptr || layout == nullptr || factors == nullptr) return KESTREL_BAD_ARGUMENT;
   if (desc->code == CODE_RGB) {
     layout->step[0] = layout->step[1] = layout->step[2] = int32_t((desc->colourStandard + 7) / 8);
     layout->planeCount = 1;

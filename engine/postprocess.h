@@ -84,7 +84,8 @@ KESTREL_API uint32_t MPProcess(MPPHandle* handle, uint8_t* const* dstPlanes, con
  * The same for destination addresses that point at the pixel (originRect->left, originRect->top)
  * instead of the image origin. The whole pixel's size, (bits per pixel / 8), is taken as the
  * column step of every plane, also of chroma planes with two-byte samples; callers rely on it.
- * Also KESTREL_BAD_ARGUMENT for a null originRect or one with a negative left or top.
+ * Also KESTREL_BAD_ARGUMENT for a null originRect or one whose left or top is negative or beyond
+ * 16777216.
  */
 KESTREL_API uint32_t MPProcessEx(MPPHandle* handle, uint8_t* const* dstPlanes,
                                  const MRECT* originRect, const MRECT* dstRect,
@@ -101,13 +102,17 @@ KESTREL_API uint32_t MPPAlign(MPPHandle* handle, MRECT* dstRect, MRECT* srcRect)
 
 /*
  * The chain of kernel families: offers the job to each dispatcher in a fixed order and to the
- * generic converter last. Arguments are those of the kernel contract. Returns KESTREL_OK.
+ * generic converter last. Arguments are those of the kernel contract. Returns KESTREL_OK, or
+ * KESTREL_BAD_ARGUMENT for a null argument.
  */
 KESTREL_API KernelFn ANY_ANY_Bilinear_No_Table;
 
 /* ---- Format and rectangle helpers ----------------------------------------------------------- */
 
-/* Decodes a public code. Returns KESTREL_OK, or KESTREL_UNSUPPORTED for an unknown code; the
+/* Null arguments to the helpers below do nothing and give KESTREL_BAD_ARGUMENT, or 0 bits per
+ * pixel.
+ *
+ * Decodes a public code. Returns KESTREL_OK, or KESTREL_UNSUPPORTED for an unknown code; the
  * descriptor may be partly written then. */
 KESTREL_API uint32_t MPParseFormat(FormatDesc* desc, const MPPFORMAT* record);
 
@@ -149,7 +154,7 @@ KESTREL_API KernelFn YUYV_RGB32_FAST;
 KESTREL_API KernelFn ANY_ANY_C_FAST_RGB32;
 KESTREL_API KernelFn Gray2Gray_C_FAST;
 
-/* Converts any job; never declines. */
+/* Converts any job; never declines. KESTREL_BAD_ARGUMENT for a null argument. */
 KESTREL_API KernelFn ANY_ANY_C_SLOW;
 
 KESTREL_END_C

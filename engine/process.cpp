@@ -36,7 +36,8 @@ bool CanAddress(const PlaneLayout& binding, int64_t lastRow) {
   for (int i = 0; i < planes; ++i) {
     const int64_t pitch = binding.pitch[i];
     const int64_t magnitude = pitch < 0 ? -pitch : pitch;
-    if (magnitude > kMaxPlaneSpan || magnitude * lastRow > kMaxPlaneSpan) return false;
+    // At least one byte of the last row belongs to the plane as well.
+    if (magnitude > INT32_MAX || magnitude * lastRow >= kMaxPlaneSpan) return false;
   }
   return true;
 }
@@ -210,7 +211,7 @@ uint32_t MPProcessRect(PassEngine* engine, uint8_t* const* dstPlanes, const MREC
   if (!IsWithinLimits(*engine, rect)) return KESTREL_BAD_ARGUMENT;
   // A crop rounded to blocks can leave nothing of a small source.
   const bool nothingToRead = engine->srcRegionWidth <= 0 || engine->srcRegionHeight <= 0;
-  if (rect.left >= rect.right || nothingToRead) return KESTREL_OK;
+  if (IsEmpty(rect) || nothingToRead) return KESTREL_OK;
 
   // The last dispatched bottom starts at 0, not at the rectangle's top: a rectangle that ends at or
   // above row 0 draws nothing.
@@ -247,7 +248,8 @@ uint32_t MPProcessEx(MPPHandle* handle, uint8_t* const* dstPlanes, const MRECT* 
                      const MRECT* dstRect, const int32_t* dstPitches,
                      const uint8_t* const* srcPlanes, const int32_t* srcPitches) {
   if (handle == nullptr || originRect == nullptr || dstPlanes == nullptr || dstPitches == nullptr ||
-      originRect->left < 0 || originRect->top < 0) {
+      originRect->left < 0 || originRect->top < 0 || originRect->left > kMaxCoordinate ||
+      originRect->top > kMaxCoordinate) {
     return KESTREL_BAD_ARGUMENT;
   }
   const PassEngine& engine = *handle->pass[0];
