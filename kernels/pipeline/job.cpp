@@ -13,13 +13,19 @@ bool NeedsTable(const EngineContext& c) {
          (c.pathKind == PATH_YUV_TO_YUV && c.needsLevelTable != 0);
 }
 
+// Indexed pixels smaller than a byte are never written.
+bool HasPixels(const FormatDesc& destination) {
+  return destination.code != CODE_RGB || destination.colourStandard >= 8;
+}
+
 }  // namespace
 
 bool IsDrawable(const Job& job) {
   const EngineContext& c = job.engine;
-  return job.rect.left < job.rect.right && job.rect.top < job.rect.bottom && c.srcReadRight > 0 &&
-         c.srcReadBottom > 0 && HasPlanes(c.dstLayout, job.dstStarts) &&
-         HasPlanes(c.srcLayout, job.srcPlanes) && (c.table != nullptr || !NeedsTable(c));
+  return HasPixels(c.dstFormat) && job.rect.left < job.rect.right &&
+         job.rect.top < job.rect.bottom && c.srcReadRight > 0 && c.srcReadBottom > 0 &&
+         HasPlanes(c.dstLayout, job.dstStarts) && HasPlanes(c.srcLayout, job.srcPlanes) &&
+         (c.table != nullptr || !NeedsTable(c));
 }
 
 PixelFormat DescribePixels(const FormatDesc& format, const uint32_t* sizes,
