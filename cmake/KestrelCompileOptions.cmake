@@ -9,7 +9,7 @@ function(kestrel_compile_options target)
   endif()
   if(KESTREL_SANITIZE)
     target_compile_options(${target} PRIVATE -fsanitize=${KESTREL_SANITIZE}
-      -fno-sanitize-recover=all -fno-omit-frame-pointer -g)
+      -fno-sanitize-recover=all -fno-omit-frame-pointer -g1)
     target_link_options(${target} PUBLIC -fsanitize=${KESTREL_SANITIZE})
     if(CMAKE_CXX_COMPILER_ID MATCHES "Clang") # its checks of C++ code, in programs linked as C too
       target_link_options(${target} PUBLIC -fsanitize-link-c++-runtime -lstdc++)
