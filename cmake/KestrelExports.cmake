@@ -1,9 +1,13 @@
 # Version script and export list, generated from the lines KESTREL_EXPORT(name) of the exports.def
-# file in each room. A name that is listed must exist, a name that is not listed stays local.
+# file in each room and the lines KERNEL(name, ...) of the kernel tables. A name that is listed must
+# exist, a name that is not listed stays local.
 set(KESTREL_EXPORT_FILES
   engine/exports.def
   colour/exports.def
   kernels/exports.def
+  kernels/grey/kernels.def
+  kernels/planar_yuv/kernels.def
+  kernels/yuyv/kernels.def
   jni/exports.def)
 
 function(kestrel_read_exports out)
@@ -11,9 +15,9 @@ function(kestrel_read_exports out)
   foreach(file IN LISTS KESTREL_EXPORT_FILES)
     set(path "${PROJECT_SOURCE_DIR}/${file}")
     set_property(DIRECTORY "${PROJECT_SOURCE_DIR}" APPEND PROPERTY CMAKE_CONFIGURE_DEPENDS "${path}")
-    file(STRINGS "${path}" lines REGEX "^KESTREL_EXPORT\\([A-Za-z0-9_]+\\)")
+    file(STRINGS "${path}" lines REGEX "^(KESTREL_EXPORT|KERNEL)\\([A-Za-z0-9_]+[,)]")
     foreach(line IN LISTS lines)
-      string(REGEX REPLACE "^KESTREL_EXPORT\\(([A-Za-z0-9_]+)\\).*" "\\1" name "${line}")
+      string(REGEX REPLACE "^[A-Z_]+\\(([A-Za-z0-9_]+).*" "\\1" name "${line}")
       list(APPEND names ${name})
     endforeach()
   endforeach()

@@ -1,5 +1,7 @@
 #include "kernels/pipeline/destination.h"
 
+#include <string.h>
+
 namespace kestrel {
 namespace {
 
@@ -12,6 +14,75 @@ int32_t RoundUpToEven(int32_t value) {
 }
 
 }  // namespace
+
+uint8_t* PlaneWriter::Start(int64_t column, int64_t row, int n) {
+  if (tiles_ && count_ > 0) return buffer_ + count_ * n_ * unit_;
+  column_ = column;
+  row_ = row;
+  n_ = n;
+  return !tiles_ && plane_.columnStep == unit_ ? plane_.At(column, row) : buffer_;
+}
+
+void PlaneWriter::Finish() {
+  if (tiles_) {
+    ++count_;
+  } else if (plane_.columnStep != unit_) {
+    rows_->writePixels(plane_.At(column_, row_), plane_.columnStep, buffer_, unit_, n_);
+  }
+}
+
+void PlaneWriter::Write(int64_t column, int64_t row, const uint8_t* bytes, int n) {
+  if (tiles_) {
+    memcpy(Start(column, row, n), bytes, size_t(n));
+    Finish();
+  } else {
+    rows_->writeStrided(plane_.At(column, row), plane_.columnStep, bytes, n);
+  }
+}
+
+void PlaneWriter::WriteTransposed(int64_t column, int64_t row, const uint8_t* units,
+                                  ptrdiff_t pitch, int n, int runs) {
+  if (plane_.rowStep == unit_) {
+    rows_->transpose(plane_.At(column, row), plane_.columnStep, units, pitch, unit_, runs, n);
+  } else if (plane_.rowStep == -unit_) {
+    rows_->transpose(plane_.At(column, row + runs - 1), plane_.columnStep,
+                     units + (runs - 1) * pitch, -pitch, unit_, runs, n);
+  } else {
+    // Samples of a packed image: they do not lie side by side.
+    for (int i = 0; i < runs; ++i) {
+      rows_->writePixels(plane_.At(column, row + i), plane_.columnStep, units + i * pitch, unit_,
+                         n);
+    }
+  }
+}
+
+void PlaneWriter::WriteBlock(int64_t column, int64_t row, const uint8_t* units, ptrdiff_t pitch,
+                             int n, int runs) {
+  if (tiles_) {
+    // In pieces that stay in the first-level cache on both sides.
+    constexpr int kPiece = 64;
+    for (int i = 0; i < runs; i += kPiece) {
+      const int piece = runs - i < kPiece ? runs - i : kPiece;
+      WriteTransposed(column, row + i, units + i * pitch, pitch, n, piece);
+    }
+    return;
+  }
+  const size_t bytes = size_t(n) * size_t(unit_);
+  for (int i = 0; i < runs; ++i) {
+    uint8_t* const start = plane_.At(column, row + i);
+    if (plane_.columnStep == unit_) {
+      memcpy(start, units + i * pitch, bytes);
+    } else {
+      rows_->writePixels(start, plane_.columnStep, units + i * pitch, unit_, n);
+    }
+  }
+}
+
+void PlaneWriter::Flush() {
+  if (count_ == 0) return;
+  WriteTransposed(column_, row_, buffer_, ptrdiff_t(n_) * unit_, n_, count_);
+  count_ = 0;
+}
 
 Destination::Destination(const Job& job)
     : job_(job),
@@ -29,6 +100,27 @@ Destination::Destination(const Job& job)
     alphaFill_ = {~(0xFFu << shift), engine_.alpha << shift};
   }
   for (int i = 0; i < 3; ++i) planes_[i] = Plane(i);
+  const bool tiles = engine_.swapXY != 0 && exchange_ == LumaExchange::kNone;
+  const bool rgb = engine_.dstLayout.code == CODE_RGB;
+  writers_[0].Set(planes_[0], rgb ? pixels_.bytes : 1, tiles, &rows_);
+  const ptrdiff_t apart = planes_[2].start - planes_[1].start;
+  if (engine_.dstLayout.planeCount == 3 && (apart == 1 || apart == -1) &&
+      engine_.dstPlaneFactors[1] == 2 && planes_[1].rowStep == planes_[2].rowStep &&
+      planes_[1].columnStep == planes_[2].columnStep) {
+    chromaPairs_ = apart == 1 ? 1 : 2;
+    writers_[1].Set(planes_[chromaPairs_], 2, tiles, &rows_);
+  } else {
+    writers_[1].Set(planes_[1], 1, tiles, &rows_);
+    writers_[2].Set(planes_[2], 1, tiles, &rows_);
+  }
+  if (job.has(kPairChroma)) {
+    // A mirrored walk meets the pixel that is first in memory last.
+    const bool firstInMemoryIsLast = engine_.mirrorX != 0;
+    bool& u = engine_.swapXY != 0 ? uOfLastRow_ : uOfLastColumn_;
+    bool& v = engine_.swapXY != 0 ? vOfLastRow_ : vOfLastColumn_;
+    u = firstInMemoryIsLast;
+    v = !firstInMemoryIsLast;
+  }
   for (int c = 0; c < 3; ++c) {
     const int32_t bits = int32_t(pixels_.size[c]);
     fullShifts_.right[c] = 8 - bits;
@@ -74,26 +166,29 @@ DestinationPlane Destination::Plane(int i) const {
 }
 
 int64_t Destination::ChromaColumn(int32_t x) const {
-  const int32_t factor = int32_t(engine_.dstSubsample[1]);
+  const uint32_t factor = engine_.dstSubsample[1];
   const int32_t left = job_.rect.left;
   // YUYV pairs its columns from the job's left edge, all other layouts from the region's origin.
-  if (engine_.dstLayout.code == CODE_YUYV) return (int64_t(x) - left) / factor;
-  return int64_t(x / factor) - left / factor;
+  if (engine_.dstLayout.code == CODE_YUYV) return DivideByFactor(int64_t(x) - left, factor);
+  return DivideByFactor(x, factor) - DivideByFactor(left, factor);
 }
 
 // Rows advance after each row whose successor starts a new block.
 int64_t Destination::ChromaRow(int32_t r) const {
-  const int64_t factor = engine_.dstSubsample[4];
-  const auto blocksBefore = [factor](int64_t row) {
-    return row / factor - (row % factor < 0 ? 1 : 0);
-  };
-  return blocksBefore(r) - blocksBefore(job_.rect.top);
+  return BlockOfRow(r) - BlockOfRow(job_.rect.top);
 }
 
-bool Destination::WritesChroma(int32_t r) const {
-  const int32_t factor = int32_t(engine_.dstSubsample[4]);
-  const bool lastOfBlock = (r + 1) % factor == 0 || r == job_.rect.bottom - 1;
-  return lastOfBlock && planes_[1].rows.Contains(ChromaRow(r));
+// r / vertical factor, rounded down.
+int64_t Destination::BlockOfRow(int64_t r) const {
+  const uint32_t factor = engine_.dstSubsample[4];
+  return DivideByFactor(r < 0 ? r - int64_t(factor) + 1 : r, factor);
+}
+
+bool Destination::WritesChroma(int32_t r, bool ofLastRow) const {
+  const int64_t block = BlockOfRow(r);
+  const bool decides = ofLastRow ? r == job_.rect.bottom - 1 || BlockOfRow(int64_t(r) + 1) != block
+                                 : r == job_.rect.top || BlockOfRow(int64_t(r) - 1) != block;
+  return decides && planes_[1].rows.Contains(ChromaRow(r));
 }
 
 void Destination::SelectColumns(int32_t x, int n) {
@@ -111,18 +206,34 @@ void Destination::SelectColumns(int32_t x, int n) {
   }
   chromaCount_ = 0;
   if (!hasChroma_) return;
+  int first = 0;
   for (int i = 0; i < n; ++i) {
     const int64_t column = ChromaColumn(x + i);
-    const bool last = i + 1 == n || ChromaColumn(x + i + 1) != column;
-    if (!last || !planes_[1].columns.Contains(column)) continue;
-    if (chromaCount_ == 0) firstChroma_ = column;
-    chromaColumns_[chromaCount_++] = x + i;
+    if (i + 1 < n && ChromaColumn(x + i + 1) == column) continue;
+    if (planes_[1].columns.Contains(column)) {
+      if (chromaCount_ == 0) firstChroma_ = column;
+      uColumns_[chromaCount_] = x + (uOfLastColumn_ ? i : first);
+      vColumns_[chromaCount_] = x + (vOfLastColumn_ ? i : first);
+      ++chromaCount_;
+    }
+    first = i + 1;
   }
+}
+
+// All writers store together and in order: in one packed layout a chroma sample takes the place of
+// a luma sample, and must come after it.
+void Destination::Flush() {
+  for (PlaneWriter& writer : writers_) writer.Flush();
+}
+
+void Destination::MakeRoom(int writer, int64_t column, int64_t row, int n) {
+  if (writers_[writer].tiles() && !writers_[writer].Fits(column, row, n)) Flush();
 }
 
 void Destination::PutLuma(int32_t r, const uint8_t* luma) {
   const DestinationPlane& plane = planes_[0];
   const int64_t row = int64_t(exchange_ == LumaExchange::kRows ? r ^ 1 : r) - job_.rect.top;
+  const int n = pixelEnd_ - firstPixel_;
   if (!plane.rows.Contains(row)) return;
   if (exchange_ == LumaExchange::kColumns) {
     for (int i = 0; i < n_; ++i) {
@@ -131,34 +242,48 @@ void Destination::PutLuma(int32_t r, const uint8_t* luma) {
     }
     return;
   }
-  const int64_t first = int64_t(x_) + firstPixel_ - job_.rect.left;
-  rows_.writeStrided(plane.At(first, row), plane.columnStep, luma + firstPixel_,
-                     pixelEnd_ - firstPixel_);
+  if (n <= 0) return;
+  const int64_t column = int64_t(x_) + firstPixel_ - job_.rect.left;
+  MakeRoom(0, column, row, n);
+  writers_[0].Write(column, row, luma + firstPixel_, n);
+}
+
+void Destination::PutChromaPlane(int plane, int32_t r, const uint8_t* samples) {
+  if (samples == nullptr) return;
+  const int64_t row = ChromaRow(r);
+  MakeRoom(plane, firstChroma_, row, chromaCount_);
+  writers_[plane].Write(firstChroma_, row, samples, chromaCount_);
 }
 
 void Destination::PutChroma(int32_t r, const uint8_t* u, const uint8_t* v) {
   if (chromaCount_ == 0) return;
-  const int64_t row = ChromaRow(r);
-  rows_.writeStrided(planes_[1].At(firstChroma_, row), planes_[1].columnStep, u, chromaCount_);
-  rows_.writeStrided(planes_[2].At(firstChroma_, row), planes_[2].columnStep, v, chromaCount_);
+  if (chromaPairs_ == 0) {
+    PutChromaPlane(1, r, u);
+    PutChromaPlane(2, r, v);
+  } else if (u != nullptr) {
+    const int64_t row = ChromaRow(r);
+    MakeRoom(1, firstChroma_, row, chromaCount_);
+    uint8_t* pairs = writers_[1].Start(firstChroma_, row, chromaCount_);
+    rows_.interleave(pairs, chromaPairs_ == 1 ? u : v, chromaPairs_ == 1 ? v : u, chromaCount_);
+    writers_[1].Finish();
+  }
 }
 
 void Destination::PutRgb(int32_t r, const uint8_t* const rgb[3], const uint8_t* alpha,
                          bool narrowed) {
-  const DestinationPlane& plane = planes_[0];
   const int64_t row = int64_t(r) - job_.rect.top;
   const int n = pixelEnd_ - firstPixel_;
-  if (!writesPixels_ || n <= 0 || !plane.rows.Contains(row)) return;
+  if (!writesPixels_ || n <= 0 || !planes_[0].rows.Contains(row)) return;
   const uint8_t* const first[3] = {rgb[0] + firstPixel_, rgb[1] + firstPixel_,
                                    rgb[2] + firstPixel_};
-  uint8_t* const start = plane.At(int64_t(x_) + firstPixel_ - job_.rect.left, row);
-  const bool direct = plane.columnStep == pixels_.bytes;
-  uint8_t* const pixels = direct ? start : packed_;
+  const int64_t column = int64_t(x_) + firstPixel_ - job_.rect.left;
+  MakeRoom(0, column, row, n);
+  uint8_t* const pixels = writers_[0].Start(column, row, n);
   rows_.packRgb(pixels, first, pixels_, narrowed ? narrowedShifts_ : fullShifts_, alphaFill_, n);
   if (alpha != nullptr && pixels_.alphaByte >= 0) {
     rows_.putAlpha(pixels, alpha + firstPixel_, pixels_, n);
   }
-  if (!direct) rows_.writePixels(start, plane.columnStep, packed_, pixels_.bytes, n);
+  writers_[0].Finish();
 }
 
 }  // namespace kestrel

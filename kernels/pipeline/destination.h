@@ -32,51 +32,135 @@ struct DestinationPlane {
   }
 };
 
+// Writes runs of packed units into one plane. Runs of a quarter turn would each touch as many
+// destination rows as they have units; a tile gathers several on the stack and stores it
+// transposed, so that both sides stream.
+class PlaneWriter {
+ public:
+  static constexpr int kTileColumns = 64;
+  static constexpr int kTileRows = 32;
+
+  void Set(const DestinationPlane& plane, int unit, bool tiles, const RowOps* rows) {
+    plane_ = plane;
+    unit_ = unit;
+    tiles_ = tiles;
+    rows_ = rows;
+  }
+  bool tiles() const { return tiles_; }
+  // Whether a run can join the tile as it stands.
+  bool Fits(int64_t column, int64_t row, int n) const {
+    return count_ == 0 ||
+           (count_ < kTileRows && column == column_ && n == n_ && row == row_ + count_);
+  }
+
+  // Memory for a run of n units; the run is written by the Finish that follows.
+  uint8_t* Start(int64_t column, int64_t row, int n);
+  void Finish();
+  // The same for bytes that exist already.
+  void Write(int64_t column, int64_t row, const uint8_t* bytes, int n);
+  // A block of whole runs that lie in memory as they will be written, `pitch` bytes apart.
+  void WriteBlock(int64_t column, int64_t row, const uint8_t* units, ptrdiff_t pitch, int n,
+                  int runs);
+  // Stores what the tile holds.
+  void Flush();
+
+ private:
+  // Stores runs across the destination's rows.
+  void WriteTransposed(int64_t column, int64_t row, const uint8_t* units, ptrdiff_t pitch, int n,
+                       int runs);
+
+  DestinationPlane plane_;
+  const RowOps* rows_ = nullptr;
+  int unit_ = 1;
+  bool tiles_ = false;
+  int64_t column_ = 0, row_ = 0;  // of the tile's first run, or of the run that was started
+  int n_ = 0;
+  int count_ = 0;  // runs in the tile
+  uint8_t buffer_[4 * kTileColumns * kTileRows];
+};
+
 class Destination {
  public:
   explicit Destination(const Job& job);
 
-  // Selects loop columns [x, x + n), n <= kStrip.
+  // Loop columns to select at once.
+  int stripWidth() const { return engine_.swapXY != 0 ? PlaneWriter::kTileColumns : kStrip; }
+  // Selects loop columns [x, x + n), n <= stripWidth().
   void SelectColumns(int32_t x, int n);
 
   // YUV. Chroma is overwritten by every pixel of its block: only the last one in loop order counts,
-  // so chroma is taken at ChromaColumns() and in the rows that WritesChroma() names.
+  // so chroma is taken at uColumns() and vColumns() and in the rows that WritesU and WritesV name.
+  // (With pair chroma the two differ.)
   bool hasChroma() const { return hasChroma_; }
-  bool WritesChroma(int32_t r) const;
-  const int32_t* chromaColumns() const { return chromaColumns_; }
+  bool WritesU(int32_t r) const { return WritesChroma(r, uOfLastRow_); }
+  bool WritesV(int32_t r) const { return WritesChroma(r, vOfLastRow_); }
+  const int32_t* uColumns() const { return uColumns_; }
+  const int32_t* vColumns() const { return vColumns_; }
   int chromaCount() const { return chromaCount_; }
   void PutLuma(int32_t r, const uint8_t* luma);
+  // Either may be null.
   void PutChroma(int32_t r, const uint8_t* u, const uint8_t* v);
+
+  // Where whole planes are copied: plane 0, or chroma plane 1 or 2, or (with chroma pairs) the
+  // pairs as plane 1. Rows and columns count samples of the plane.
+  struct PlaneRun {
+    int64_t column;
+    int n;
+  };
+  PlaneRun LumaRun() const {
+    return {int64_t(x_) + firstPixel_ - job_.rect.left, pixelEnd_ - firstPixel_};
+  }
+  PlaneRun ChromaRun() const { return {firstChroma_, chromaCount_}; }
+  int firstPixel() const { return firstPixel_; }
+  bool ContainsLumaRow(int32_t r) const {
+    return planes_[0].rows.Contains(int64_t(r) - job_.rect.top);
+  }
+  int64_t ChromaRow(int32_t r) const;
+  // 1 or 2 when chroma lies in pairs: the component that comes first.
+  int chromaPairs() const { return chromaPairs_; }
+  bool exchangesLuma() const { return exchange_ != LumaExchange::kNone; }
+  PlaneWriter& writer(int plane) { return writers_[plane]; }
 
   // RGB. `narrowed`: the channels are as wide as their fields already. `alpha` is null unless the
   // source has one.
   void PutRgb(int32_t r, const uint8_t* const rgb[3], const uint8_t* alpha, bool narrowed);
+
+  // Stores what is still gathered; after the last row of the selected columns.
+  void Flush();
 
  private:
   enum class LumaExchange { kNone, kColumns, kRows };
 
   DestinationPlane Plane(int i) const;
   int64_t ChromaColumn(int32_t x) const;
-  int64_t ChromaRow(int32_t r) const;
+  int64_t BlockOfRow(int64_t r) const;
+  bool WritesChroma(int32_t r, bool ofLastRow) const;
+  void MakeRoom(int writer, int64_t column, int64_t row, int n);
+  void PutChromaPlane(int plane, int32_t r, const uint8_t* samples);
 
   const Job& job_;
   const RowOps& rows_;
   const EngineContext& engine_;
   DestinationPlane planes_[3];
+  PlaneWriter writers_[3];
+  int chromaPairs_ = 0;  // 1 or 2: the plane that begins each pair of a semi-planar image
   PixelFormat pixels_;
   FieldShifts narrowedShifts_, fullShifts_;
   AlphaFill alphaFill_ = {~0u, 0};  // the engine's alpha, for sources that have none
   bool hasChroma_;
   bool writesPixels_;
   LumaExchange exchange_;
+  // Which pixel of a chroma block gives U and V: its last in loop order, or with pair chroma one
+  // its first and the other its last, by their order in memory.
+  bool uOfLastColumn_ = true, vOfLastColumn_ = true;
+  bool uOfLastRow_ = true, vOfLastRow_ = true;
 
   int32_t x_ = 0;
   int n_ = 0;
   int chromaCount_ = 0;
-  int64_t firstChroma_ = 0;            // plane column of the first chroma sample
-  int32_t chromaColumns_[kStrip];      // loop columns
-  int firstPixel_ = 0, pixelEnd_ = 0;  // columns of the strip that are inside plane 0
-  uint8_t packed_[4 * kStrip];
+  int64_t firstChroma_ = 0;                      // plane column of the first chroma sample
+  int32_t uColumns_[kStrip], vColumns_[kStrip];  // loop columns
+  int firstPixel_ = 0, pixelEnd_ = 0;            // columns of the strip that are inside plane 0
 };
 
 }  // namespace kestrel

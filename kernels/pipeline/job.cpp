@@ -8,11 +8,6 @@ bool HasPlanes(const PlaneLayout& layout, const uint8_t* const* planes) {
   return planes[0] != nullptr && planes[1] != nullptr && planes[2] != nullptr;
 }
 
-bool NeedsTable(const EngineContext& c) {
-  return c.pathKind == PATH_YUV_TO_RGB || c.pathKind == PATH_RGB_TO_YUV ||
-         (c.pathKind == PATH_YUV_TO_YUV && c.needsLevelTable != 0);
-}
-
 // Indexed pixels smaller than a byte are never written.
 bool HasPixels(const FormatDesc& destination) {
   return destination.code != CODE_RGB || destination.colourStandard >= 8;
@@ -25,7 +20,13 @@ bool IsDrawable(const Job& job) {
   return HasPixels(c.dstFormat) && job.rect.left < job.rect.right &&
          job.rect.top < job.rect.bottom && c.srcReadRight > 0 && c.srcReadBottom > 0 &&
          HasPlanes(c.dstLayout, job.dstStarts) && HasPlanes(c.srcLayout, job.srcPlanes) &&
-         (c.table != nullptr || !NeedsTable(c));
+         !LacksTable(job);
+}
+
+bool LacksTable(const Job& job) {
+  const uint32_t path = job.engine.pathKind;
+  const bool reads = path == PATH_YUV_TO_RGB || path == PATH_RGB_TO_YUV || job.mapsLevels();
+  return reads && job.engine.table == nullptr;
 }
 
 PixelFormat DescribePixels(const FormatDesc& format, const uint32_t* sizes,

@@ -13,6 +13,17 @@ namespace kestrel {
 // in the first-level cache.
 constexpr int kStrip = 512;
 
+// Where a kernel's bytes differ, on purpose, from what the generic converter gives.
+enum Quirk : uint32_t {
+  kExact = 0,
+  kNoLevelMap = 1u << 0,       // copies stored values although the engine changes levels
+  kPairChroma = 1u << 1,       // YUYV: U of the pixel that is first in memory, V of the other
+  kPairEdges = 1u << 2,        // the edge test is made for pairs of columns, not for each
+  kSharedLowerLine = 1u << 3,  // a pair's second row blends toward the line after the first row
+  kNoEdgeColumns = 1u << 4,    // columns outside dstRect are sampled like any other
+  kYuyvPairs = kPairChroma | kNoLevelMap,
+};
+
 struct Job {
   MRECT rect;  // loop orientation
   const int32_t* dstPitches;
@@ -20,12 +31,26 @@ struct Job {
   uint8_t* const* dstStarts;
   const uint8_t* const* srcPlanes;
   const EngineContext& engine;
+  uint32_t quirks = kExact;
 
   const RowOps& rows() const { return *engine.rows; }
+  bool has(Quirk quirk) const { return (quirks & quirk) != 0; }
+  bool mapsLevels() const {
+    return engine.pathKind == PATH_YUV_TO_YUV && engine.needsLevelTable != 0 && !has(kNoLevelMap);
+  }
 };
+
+// value / factor, truncating. Subsampling factors are nearly always 1 or 2, and a division for
+// every row of a narrow job would cost more than its pixels.
+inline int64_t DivideByFactor(int64_t value, uint32_t factor) {
+  return factor == 1 ? value : factor == 2 ? value / 2 : value / int32_t(factor);
+}
 
 // Whether a job can be drawn at all: its planes and table exist, and there is something to read.
 bool IsDrawable(const Job& job);
+
+// Whether the job reads a conversion table that the engine does not have.
+bool LacksTable(const Job& job);
 
 // How the bytes of a masked RGB side make channels.
 PixelFormat DescribePixels(const FormatDesc& format, const uint32_t* sizes,

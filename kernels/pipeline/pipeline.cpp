@@ -23,24 +23,29 @@ class Pipeline {
     if (dithers_) {
       // The remainder travels along whole rows, from the end of one to the start of the next.
       for (int32_t r = job_.rect.top; r < job_.rect.bottom; ++r) {
-        for (int32_t x = job_.rect.left; x < job_.rect.right; x += kStrip) {
+        for (int32_t x = job_.rect.left; x < job_.rect.right; x += destination_.stripWidth()) {
           if (r == job_.rect.top || StripWidth(job_.rect.left) < Width()) SelectColumns(x);
           ConvertRow(r);
         }
       }
     } else {
-      for (int32_t x = job_.rect.left; x < job_.rect.right; x += kStrip) {
+      for (int32_t x = job_.rect.left; x < job_.rect.right; x += destination_.stripWidth()) {
         SelectColumns(x);
+        CopyPlanes();
+        if (!ownsRows()) continue;
         for (int32_t r = job_.rect.top; r < job_.rect.bottom; ++r) ConvertRow(r);
+        destination_.Flush();
       }
     }
+    destination_.Flush();
   }
 
  private:
   int32_t Width() const { return job_.rect.right - job_.rect.left; }
   int StripWidth(int32_t x) const {
     const int32_t rest = job_.rect.right - x;
-    return rest < kStrip ? rest : kStrip;
+    const int32_t most = destination_.stripWidth();
+    return rest < most ? rest : most;
   }
 
   void PrepareSums() {
@@ -68,15 +73,106 @@ class Pipeline {
     source_.SelectColumns(x, n_);
     destination_.SelectColumns(x, n_);
     if (engine_.pathKind == PATH_YUV_TO_RGB) {
-      for (int i = 0; i < n_; ++i) columns_[i] = x + i;
-      source_.SelectChroma(columns_, n_);
+      for (int i = 0; i < n_; ++i) uColumns_[i] = x + i;
+      source_.SelectChroma(uColumns_, uColumns_, n_);
     } else if (engine_.pathKind == PATH_YUV_TO_YUV) {
-      source_.SelectChroma(destination_.chromaColumns(), destination_.chromaCount());
+      source_.SelectChroma(destination_.uColumns(), destination_.vColumns(),
+                           destination_.chromaCount());
     } else {
       for (int k = 0; k < destination_.chromaCount(); ++k) {
-        columns_[k] = destination_.chromaColumns()[k] - x;
+        uColumns_[k] = destination_.uColumns()[k] - x;
+        vColumns_[k] = destination_.vColumns()[k] - x;
       }
     }
+  }
+
+  // What is left for ConvertRow to do.
+  bool ownsRows() const { return !lumaDone_ || !chromaDone_; }
+
+  // Stored values at 1:1: planes whose samples correspond one to one on the two sides are copied as
+  // blocks of rows.
+  void CopyPlanes() {
+    lumaDone_ = chromaDone_ = false;
+    const bool unit = engine_.stepX == 0x10000 && engine_.stepY == 0x10000;
+    if (!unit || engine_.pathKind != PATH_YUV_TO_YUV || job_.mapsLevels() ||
+        job_.has(kPairChroma) || destination_.exchangesLuma()) {
+      return;
+    }
+    const Destination::PlaneRun luma = destination_.LumaRun();
+    if (source_.LumaInPlace(0) != nullptr) {
+      if (luma.n > 0) CopyPlane(0, luma);
+      lumaDone_ = true;
+    }
+    // Chroma never comes before luma: one packed layout has both in the same byte.
+    if (!lumaDone_) return;
+    const Destination::PlaneRun chroma = destination_.ChromaRun();
+    chromaDone_ = !destination_.hasChroma() || chroma.n == 0;
+    const bool sameRows = engine_.srcSubsample[4] == engine_.dstSubsample[4];
+    if (chromaDone_ || !sameRows || engine_.srcLayout.code == CODE_GRAY8) return;
+    if (ChromaInPlace(1, 0) != nullptr) {
+      CopyPlane(1, chroma);
+      if (destination_.chromaPairs() == 0) CopyPlane(2, chroma);
+      chromaDone_ = true;
+    }
+  }
+
+  const uint8_t* ChromaInPlace(int plane, int32_t row) const {
+    const int pairs = destination_.chromaPairs();
+    return pairs != 0 ? source_.PairsInPlace(pairs, row) : source_.ChromaInPlace(plane, row);
+  }
+
+  // Where a loop row of a plane is on both sides.
+  struct PlaneRow {
+    int32_t source;
+    int64_t destination;
+  };
+
+  // False for rows that write nothing to the plane.
+  bool LocateRow(int plane, int32_t r, PlaneRow* row) const {
+    if (plane == 0) {
+      *row = {source_.SourceRow(r, 1), int64_t(r) - job_.rect.top};
+      return destination_.ContainsLumaRow(r);
+    }
+    *row = {source_.SourceRow(r, engine_.srcSubsample[4]), destination_.ChromaRow(r)};
+    return destination_.WritesU(r);
+  }
+
+  // Collects rows that follow each other on both sides and writes them as one block.
+  void CopyPlane(int plane, const Destination::PlaneRun& run) {
+    PlaneRow first = {0, 0}, last = {0, 0};
+    int32_t top = job_.rect.top;
+    const int32_t bottom = job_.rect.bottom;
+    while (top < bottom && !LocateRow(plane, top, &first)) ++top;
+    if (top == bottom) return;
+    // Source rows never skip and never go back: when the ends are as far apart on both sides, so is
+    // every row between them.
+    if (LocateRow(plane, bottom - 1, &last) &&
+        last.source - first.source == last.destination - first.destination) {
+      WriteBlock(plane, run, first, int(last.source - first.source) + 1);
+      return;
+    }
+    int count = 0;
+    for (int32_t r = top; r < bottom; ++r) {
+      PlaneRow row;
+      if (!LocateRow(plane, r, &row)) continue;
+      const bool follows =
+          row.source == first.source + count && row.destination == first.destination + count;
+      if (count > 0 && !follows) {
+        WriteBlock(plane, run, first, count);
+        count = 0;
+      }
+      if (count == 0) first = row;
+      ++count;
+    }
+    if (count > 0) WriteBlock(plane, run, first, count);
+  }
+
+  void WriteBlock(int plane, const Destination::PlaneRun& run, const PlaneRow& first, int rows) {
+    const uint8_t* start = plane == 0
+                               ? source_.LumaInPlace(first.source) + destination_.firstPixel()
+                               : ChromaInPlace(plane, first.source);
+    destination_.writer(plane).WriteBlock(run.column, first.destination, start,
+                                          source_.pitch(plane), run.n, rows);
   }
 
   void ConvertRow(int32_t r) {
@@ -92,31 +188,28 @@ class Pipeline {
     }
   }
 
-  bool WantsChroma(int32_t r) const {
-    return destination_.hasChroma() && destination_.chromaCount() > 0 &&
-           destination_.WritesChroma(r);
-  }
-
-  const uint8_t* MapLevels(uint8_t* buffer, const uint8_t* run, int map, int n) {
-    if (engine_.needsLevelTable == 0) return run;
-    rows_.mapLevels(buffer, run, static_cast<const uint8_t*>(engine_.table) + 256 * map, n);
+  const uint8_t* MapLevels(uint8_t* buffer, const uint8_t* run, int map, int n) const {
+    if (!job_.mapsLevels()) return run;
+    rows_.mapLevels(buffer, run, static_cast<const uint8_t*>(engine_.table) + ptrdiff_t{256} * map, n);
     return buffer;
   }
 
   void YuvToYuv(int32_t r) {
-    destination_.PutLuma(r, MapLevels(channels_[0], source_.Luma(r), 0, n_));
-    if (!WantsChroma(r)) return;
-    const uint8_t *u, *v;
-    source_.Chroma(r, &u, &v);
+    if (!lumaDone_) destination_.PutLuma(r, MapLevels(channels_[0], source_.Luma(r), 0, n_));
     const int n = destination_.chromaCount();
-    destination_.PutChroma(r, MapLevels(channels_[1], u, 1, n), MapLevels(channels_[2], v, 1, n));
+    if (n == 0 || chromaDone_) return;
+    const uint8_t* u =
+        destination_.WritesU(r) ? MapLevels(channels_[1], source_.U(r), 1, n) : nullptr;
+    const uint8_t* v =
+        destination_.WritesV(r) ? MapLevels(channels_[2], source_.V(r), 1, n) : nullptr;
+    destination_.PutChroma(r, u, v);
   }
 
   void YuvToRgb(int32_t r) {
     uint8_t* const rgb[3] = {channels_[0], channels_[1], channels_[2]};
     const uint8_t* y = source_.Luma(r);
-    const uint8_t *u, *v;
-    source_.Chroma(r, &u, &v);
+    const uint8_t* u = source_.U(r);
+    const uint8_t* v = source_.V(r);
     if (dithers_) {
       rows_.yuvToRgbCarry(rgb, y, u, v, wide_, &carry_, n_);
     } else if (engine_.rgbSums.insideClampTable == 0) {
@@ -140,15 +233,23 @@ class Pipeline {
   void RgbToYuv(int32_t r) {
     const RgbRun run = source_.Rgb(r);
     const auto tables = static_cast<RgbToYuvTables>(engine_.table);
-    rows_.rgbToLuma(luma_, run.channel, tables, n_);
+    rows_.rgbToYuv(luma_, run.channel, tables, n_);
     destination_.PutLuma(r, luma_);
-    if (!WantsChroma(r)) return;
-    // Only the last pixel of each block decides.
     const int n = destination_.chromaCount();
-    for (int c = 0; c < 3; ++c) rows_.gather(channels_[c], run.channel[c], columns_, n);
-    const uint8_t* const last[3] = {channels_[0], channels_[1], channels_[2]};
-    rows_.rgbToChroma(u_, v_, last, tables, n);
-    destination_.PutChroma(r, u_, v_);
+    if (n == 0) return;
+    // Only the pixels that decide a block's chroma are converted.
+    const bool writesU = destination_.WritesU(r);
+    const bool writesV = destination_.WritesV(r);
+    if (writesU) Chroma(u_, run, uColumns_, tables + 3, n);
+    if (writesV) Chroma(v_, run, vColumns_, tables + 5, n);
+    destination_.PutChroma(r, writesU ? u_ : nullptr, writesV ? v_ : nullptr);
+  }
+
+  void Chroma(uint8_t* samples, const RgbRun& run, const int32_t* columns, RgbToYuvTables tables,
+              int n) {
+    for (int c = 0; c < 3; ++c) rows_.gather(channels_[c], run.channel[c], columns, n);
+    const uint8_t* const picked[3] = {channels_[0], channels_[1], channels_[2]};
+    rows_.rgbToYuv(samples, picked, tables, n);
   }
 
   const Job& job_;
@@ -161,12 +262,13 @@ class Pipeline {
   YuvToRgbWide wide_ = {};
   Carry carry_ = {};
   int n_ = 0;
-  int32_t columns_[kStrip];  // chroma: loop columns, or columns of the strip
+  bool lumaDone_ = false, chromaDone_ = false;   // of the selected columns, by CopyPlanes
+  int32_t uColumns_[kStrip], vColumns_[kStrip];  // loop columns, or columns of the strip
   uint8_t channels_[3][kStrip];
   uint8_t luma_[kStrip], u_[kStrip], v_[kStrip];
 };
 
-static_assert(sizeof(Pipeline) < 40 * 1024, "camera threads have small stacks");
+static_assert(sizeof(Pipeline) < size_t{56} * 1024, "camera threads have small stacks");
 
 }  // namespace
 

@@ -20,8 +20,8 @@ void SampleColumns::Finish(int count) {
 Source::Source(const Job& job)
     : job_(job),
       rows_(job.rows()),
-      columnPositions_(job.engine),
-      rowPositions_(job.engine),
+      columnPositions_(job),
+      rowPositions_(job),
       pixels_(DescribePixels(job.engine.srcFormat, job.engine.srcChannelSize,
                              job.engine.srcChannelPos)),
       palette_(job.engine.srcFormat.palette),
@@ -30,7 +30,7 @@ Source::Source(const Job& job)
   // Indexed pixels are addressed by column: several share a byte.
   const bool isRgb = layout.code == CODE_RGB;
   first_.step = second_.step = palette_ != nullptr ? 1 : isRgb ? pixels_.bytes : layout.step[0];
-  chroma_.step = layout.step[1];
+  chromaU_.step = chromaV_.step = layout.step[1];
   if (layout.code == CODE_GRAY8) {
     memset(u_, 128, sizeof(u_));
     memset(v_, 128, sizeof(v_));
@@ -52,14 +52,34 @@ void Source::SelectColumns(int32_t x, int n) {
   lines_[0].row = lines_[1].row = -1;
 }
 
-void Source::SelectChroma(const int32_t* columns, int n) {
+void Source::SelectChroma(const int32_t* uColumns, const int32_t* vColumns, int n) {
   const int32_t factor = int32_t(job_.engine.srcSubsample[1]);
-  for (int i = 0; i < n; ++i) chroma_.Set(i, columnPositions_.At(columns[i]).first / factor);
-  chroma_.Finish(n);
+  for (int i = 0; i < n; ++i) {
+    chromaU_.Set(i, columnPositions_.At(uColumns[i]).first / factor);
+    chromaV_.Set(i, columnPositions_.At(vColumns[i]).first / factor);
+  }
+  chromaU_.Finish(n);
+  chromaV_.Finish(n);
+}
+
+const uint8_t* Source::LumaInPlace(int32_t row) const {
+  return first_.contiguous && first_.step == 1 ? RowStart(0, row) + first_.offset[0] : nullptr;
+}
+
+const uint8_t* Source::ChromaInPlace(int plane, int32_t row) const {
+  const bool sideBySide = chromaU_.contiguous && chromaU_.step == 1;
+  return sideBySide ? RowStart(plane, row) + chromaU_.offset[0] : nullptr;
+}
+
+const uint8_t* Source::PairsInPlace(int first, int32_t row) const {
+  const bool pairs = chromaU_.contiguous && chromaU_.step == 2 &&
+                     job_.srcPlanes[3 - first] - job_.srcPlanes[first] == 1 &&
+                     job_.srcPitches[1] == job_.srcPitches[2];
+  return pairs ? RowStart(first, row) + chromaU_.offset[0] : nullptr;
 }
 
 const uint8_t* Source::ReadSamples(uint8_t* buffer, const uint8_t* row,
-                                   const SampleColumns& columns) {
+                                   const SampleColumns& columns) const {
   if (!columns.contiguous) {
     rows_.gather(buffer, row, columns.offset, columns.n);
     return buffer;
@@ -148,13 +168,18 @@ const uint8_t* Source::Luma(int32_t r) {
   return blended_[0];
 }
 
-void Source::Chroma(int32_t r, const uint8_t** u, const uint8_t** v) {
-  *u = u_;
-  *v = v_;
-  if (job_.engine.srcLayout.code == CODE_GRAY8) return;
+const uint8_t* Source::Chroma(int plane, int32_t r, const SampleColumns& columns, uint8_t* buffer) {
+  if (job_.engine.srcLayout.code == CODE_GRAY8) return buffer;
   const int32_t row = rowPositions_.At(r, job_.engine.srcSubsample[4]).first;
-  *u = ReadSamples(u_, RowStart(1, row), chroma_);
-  *v = ReadSamples(v_, RowStart(2, row), chroma_);
+  return ReadSamples(buffer, RowStart(plane, row), columns);
+}
+
+const uint8_t* Source::U(int32_t r) {
+  return Chroma(1, r, chromaU_, u_);
+}
+
+const uint8_t* Source::V(int32_t r) {
+  return Chroma(2, r, chromaV_, v_);
 }
 
 RgbRun Source::Rgb(int32_t r) {

@@ -31,12 +31,21 @@ class Source {
 
   // Selects loop columns [x, x + n), n <= kStrip, for Luma and Rgb.
   void SelectColumns(int32_t x, int n);
-  // Selects the loop columns whose chroma is wanted.
-  void SelectChroma(const int32_t* columns, int n);
+  // Selects the loop columns whose U and V are wanted.
+  void SelectChroma(const int32_t* uColumns, const int32_t* vColumns, int n);
+
+  // For copying whole planes: where the selected samples of a source row start when they lie side
+  // by side as they are wanted; null when they do not. Pairs are U and V, `first` (1 or 2) first.
+  const uint8_t* LumaInPlace(int32_t row) const;
+  const uint8_t* ChromaInPlace(int plane, int32_t row) const;
+  const uint8_t* PairsInPlace(int first, int32_t row) const;
+  int32_t SourceRow(int32_t r, uint32_t factor) const { return rowPositions_.At(r, factor).first; }
+  ptrdiff_t pitch(int plane) const { return job_.srcPitches[plane]; }
 
   // Runs for loop row r: valid until the next call of the same function.
   const uint8_t* Luma(int32_t r);
-  void Chroma(int32_t r, const uint8_t** u, const uint8_t** v);
+  const uint8_t* U(int32_t r);
+  const uint8_t* V(int32_t r);
   RgbRun Rgb(int32_t r);
 
  private:
@@ -52,8 +61,10 @@ class Source {
   const uint8_t* RowStart(int plane, int32_t row) const {
     return job_.srcPlanes[plane] + ptrdiff_t(job_.srcPitches[plane]) * row;
   }
-  const uint8_t* ReadSamples(uint8_t* buffer, const uint8_t* row, const SampleColumns& columns);
+  const uint8_t* ReadSamples(uint8_t* buffer, const uint8_t* row,
+                             const SampleColumns& columns) const;
   void ReadPixels(uint8_t* const rgb[3], const uint8_t* row, const SampleColumns& columns);
+  const uint8_t* Chroma(int plane, int32_t r, const SampleColumns& columns, uint8_t* buffer);
   void FillLumaLine(Line* line, int32_t row);
   void FillRgbLine(Line* line, int32_t row);
   using Fill = void (Source::*)(Line*, int32_t);
@@ -70,7 +81,7 @@ class Source {
   bool swappedLuma_;
   bool interpolates_ = false;  // some column of the strip has a weight
 
-  SampleColumns first_, second_, chroma_;
+  SampleColumns first_, second_, chromaU_, chromaV_;
   uint16_t weights_[kStrip];
   Line lines_[2];
   uint8_t scratch_[3][kStrip];  // second taps

@@ -89,10 +89,9 @@ struct KestrelRowOps {
                        const kestrel::YuvToRgbWide& sums, int n);
   void (*yuvToRgbCarry)(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u, const uint8_t* v,
                         const kestrel::YuvToRgbWide& sums, kestrel::Carry* carry, int n);
-  void (*rgbToLuma)(uint8_t* luma, const uint8_t* const rgb[3], kestrel::RgbToYuvTables tables,
-                    int n);
-  void (*rgbToChroma)(uint8_t* u, uint8_t* v, const uint8_t* const rgb[3],
-                      kestrel::RgbToYuvTables tables, int n);
+  // Y with tables 0..2, U with 3..5, V with 5..7: `tables` is the first of the three.
+  void (*rgbToYuv)(uint8_t* dst, const uint8_t* const rgb[3], kestrel::RgbToYuvTables tables,
+                   int n);
   // dst[i] = map[src[i]].
   void (*mapLevels)(uint8_t* dst, const uint8_t* src, const uint8_t* map, int n);
 
@@ -103,6 +102,11 @@ struct KestrelRowOps {
   void (*putAlpha)(uint8_t* pixels, const uint8_t* alpha, const kestrel::PixelFormat& format,
                    int n);
 
+  // dst[2 * i] = a[i], dst[2 * i + 1] = b[i].
+  void (*interleave)(uint8_t* dst, const uint8_t* a, const uint8_t* b, int n);
+  // Unit i of row j of the source becomes unit j of row i of the destination; units of 1..4 bytes.
+  void (*transpose)(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch,
+                    int unit, int rows, int columns);
   // dst[i * step] = src[i]: bytes, and packed pixels whose own bytes stay ascending.
   void (*writeStrided)(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int n);
   void (*writePixels)(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int bytes, int n);

@@ -9,12 +9,25 @@ static_assert(__BYTE_ORDER__ == __ORDER_LITTLE_ENDIAN__, "packed pixels are stor
 namespace kestrel {
 namespace {
 
+// A step that the compiler knows makes a loop of vector shuffles.
+template <ptrdiff_t kStep>
+void ReadEvery(uint8_t* dst, const uint8_t* src, int n) {
+  for (int i = 0; i < n; ++i) dst[i] = src[i * kStep];
+}
+
 void ReadStrided(uint8_t* dst, const uint8_t* src, ptrdiff_t step, int n) {
-  if (step == 1) {
-    memcpy(dst, src, size_t(n));
-    return;
+  switch (step) {
+    case 1:
+      memcpy(dst, src, size_t(n));
+      return;
+    case 2:
+      return ReadEvery<2>(dst, src, n);
+    case 3:
+      return ReadEvery<3>(dst, src, n);
+    default:
+      for (int i = 0; i < n; ++i) dst[i] = src[i * step];
+      return;
   }
-  for (int i = 0; i < n; ++i) dst[i] = src[i * step];
 }
 
 void Gather(uint8_t* dst, const uint8_t* src, const int32_t* offsets, int n) {
@@ -184,23 +197,12 @@ void YuvToRgbCarry(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u, co
   }
 }
 
-void RgbToLuma(uint8_t* luma, const uint8_t* const rgb[3], RgbToYuvTables tables, int n) {
+void RgbToYuv(uint8_t* dst, const uint8_t* const rgb[3], RgbToYuvTables tables, int n) {
   const uint8_t* const red = rgb[0];
   const uint8_t* const green = rgb[1];
   const uint8_t* const blue = rgb[2];
   for (int i = 0; i < n; ++i) {
-    luma[i] = uint8_t((tables[0][red[i]] + tables[1][green[i]] + tables[2][blue[i]]) >> 16);
-  }
-}
-
-void RgbToChroma(uint8_t* u, uint8_t* v, const uint8_t* const rgb[3], RgbToYuvTables tables,
-                 int n) {
-  const uint8_t* const red = rgb[0];
-  const uint8_t* const green = rgb[1];
-  const uint8_t* const blue = rgb[2];
-  for (int i = 0; i < n; ++i) {
-    u[i] = uint8_t((tables[3][red[i]] + tables[4][green[i]] + tables[5][blue[i]]) >> 16);
-    v[i] = uint8_t((tables[5][red[i]] + tables[6][green[i]] + tables[7][blue[i]]) >> 16);
+    dst[i] = uint8_t((tables[0][red[i]] + tables[1][green[i]] + tables[2][blue[i]]) >> 16);
   }
 }
 
@@ -258,17 +260,31 @@ void PutAlpha(uint8_t* pixels, const uint8_t* alpha, const PixelFormat& format, 
   for (int i = 0; i < n; ++i) pixels[i * format.bytes + format.alphaByte] = alpha[i];
 }
 
+template <ptrdiff_t kStep>
+void WriteEvery(uint8_t* dst, const uint8_t* src, int n) {
+  for (int i = 0; i < n; ++i) dst[i * kStep] = src[i];
+}
+
 void WriteStrided(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int n) {
-  if (step == 1) {
-    memcpy(dst, src, size_t(n));
-    return;
+  switch (step) {
+    case 1:
+      memcpy(dst, src, size_t(n));
+      return;
+    case -1:
+      return WriteEvery<-1>(dst, src, n);
+    default:
+      for (int i = 0; i < n; ++i) dst[i * step] = src[i];
+      return;
   }
-  for (int i = 0; i < n; ++i) dst[i * step] = src[i];
 }
 
 template <int kBytes>
 void WriteUnits(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int n) {
-  for (int i = 0; i < n; ++i) memcpy(dst + i * step, src + i * kBytes, kBytes);
+  if (step == -kBytes) {
+    for (int i = 0; i < n; ++i) memcpy(dst - i * kBytes, src + i * kBytes, kBytes);
+  } else {
+    for (int i = 0; i < n; ++i) memcpy(dst + i * step, src + i * kBytes, kBytes);
+  }
 }
 
 void WritePixels(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int bytes, int n) {
@@ -284,12 +300,104 @@ void WritePixels(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int bytes, in
   }
 }
 
+void Interleave(uint8_t* dst, const uint8_t* a, const uint8_t* b, int n) {
+  for (int i = 0; i < n; ++i) {
+    dst[2 * i] = a[i];
+    dst[2 * i + 1] = b[i];
+  }
+}
+
+template <int kBytes>
+void TransposeUnits(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch,
+                    int rows, int columns) {
+  for (int i = 0; i < columns; ++i) {
+    uint8_t* const out = dst + i * dstPitch;
+    const uint8_t* const in = src + i * kBytes;
+    for (int j = 0; j < rows; ++j) memcpy(out + j * kBytes, in + j * srcPitch, kBytes);
+  }
+}
+
+// Vectors of 16 bytes as lanes of one unit each. Pairs: the low (high) halves of two, interleaved.
+using Lanes1 = uint8_t __attribute__((vector_size(16)));
+using Lanes2 = uint16_t __attribute__((vector_size(16)));
+using Lanes4 = uint32_t __attribute__((vector_size(16)));
+
+Lanes1 LowPairs(Lanes1 a, Lanes1 b) {
+  return __builtin_shufflevector(a, b, 0, 16, 1, 17, 2, 18, 3, 19, 4, 20, 5, 21, 6, 22, 7, 23);
+}
+Lanes1 HighPairs(Lanes1 a, Lanes1 b) {
+  return __builtin_shufflevector(a, b, 8, 24, 9, 25, 10, 26, 11, 27, 12, 28, 13, 29, 14, 30, 15,
+                                 31);
+}
+Lanes2 LowPairs(Lanes2 a, Lanes2 b) {
+  return __builtin_shufflevector(a, b, 0, 8, 1, 9, 2, 10, 3, 11);
+}
+Lanes2 HighPairs(Lanes2 a, Lanes2 b) {
+  return __builtin_shufflevector(a, b, 4, 12, 5, 13, 6, 14, 7, 15);
+}
+Lanes4 LowPairs(Lanes4 a, Lanes4 b) {
+  return __builtin_shufflevector(a, b, 0, 4, 1, 5);
+}
+Lanes4 HighPairs(Lanes4 a, Lanes4 b) {
+  return __builtin_shufflevector(a, b, 2, 6, 3, 7);
+}
+
+// A square of as many units as a vector has lanes. Pairing rows i and i + half, once for each bit
+// of an index, moves every unit to its place.
+template <typename Lanes, int kUnit>
+void TransposeSquare(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch) {
+  constexpr int kSide = 16 / kUnit;
+  Lanes a[kSide], b[kSide];
+  for (int i = 0; i < kSide; ++i) memcpy(&a[i], src + i * srcPitch, 16);
+  for (int bit = 1; bit < kSide; bit *= 2) {
+    for (int i = 0; i < kSide / 2; ++i) {
+      b[2 * i] = LowPairs(a[i], a[i + kSide / 2]);
+      b[2 * i + 1] = HighPairs(a[i], a[i + kSide / 2]);
+    }
+    memcpy(a, b, sizeof(a));
+  }
+  for (int i = 0; i < kSide; ++i) memcpy(dst + i * dstPitch, &a[i], 16);
+}
+
+template <typename Lanes, int kUnit>
+void TransposeSquares(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch,
+                      int rows, int columns) {
+  constexpr int kSide = 16 / kUnit;
+  const int wholeRows = rows / kSide * kSide;
+  const int wholeColumns = columns / kSide * kSide;
+  for (int i = 0; i < wholeColumns; i += kSide) {
+    for (int j = 0; j < wholeRows; j += kSide) {
+      TransposeSquare<Lanes, kUnit>(dst + i * dstPitch + j * kUnit, dstPitch,
+                                    src + j * srcPitch + i * kUnit, srcPitch);
+    }
+  }
+  TransposeUnits<kUnit>(dst + wholeRows * kUnit, dstPitch, src + wholeRows * srcPitch, srcPitch,
+                        rows - wholeRows, wholeColumns);
+  TransposeUnits<kUnit>(dst + wholeColumns * dstPitch, dstPitch, src + wholeColumns * kUnit,
+                        srcPitch, rows, columns - wholeColumns);
+}
+
+void Transpose(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch, int unit,
+               int rows, int columns) {
+  switch (unit) {
+    case 1:
+      return TransposeSquares<Lanes1, 1>(dst, dstPitch, src, srcPitch, rows, columns);
+    case 2:
+      return TransposeSquares<Lanes2, 2>(dst, dstPitch, src, srcPitch, rows, columns);
+    case 3:
+      return TransposeUnits<3>(dst, dstPitch, src, srcPitch, rows, columns);
+    default:
+      return TransposeSquares<Lanes4, 4>(dst, dstPitch, src, srcPitch, rows, columns);
+  }
+}
+
 }  // namespace
 
 const RowOps kScalarRows = {
-    ReadStrided, Gather,        GatherPixels, BlendColumns,       BlendRows,     UnpackRgb,
-    UnpackAlpha, UnpackIndexed, YuvToRgb,     YuvToRgbByWideSums, YuvToRgbCarry, RgbToLuma,
-    RgbToChroma, MapLevels,     PackRgb,      PutAlpha,           WriteStrided,  WritePixels,
+    ReadStrided,   Gather,      GatherPixels,  BlendColumns, BlendRows,
+    UnpackRgb,     UnpackAlpha, UnpackIndexed, YuvToRgb,     YuvToRgbByWideSums,
+    YuvToRgbCarry, RgbToYuv,    MapLevels,     PackRgb,      PutAlpha,
+    Interleave,    Transpose,   WriteStrided,  WritePixels,
 };
 
 const RowOps* SelectRowOps() {

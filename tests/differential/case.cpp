@@ -235,27 +235,6 @@ int32_t DrawPitch(Random* random, int32_t rowBytes) {
   return random->Percent(20) ? -pitch : pitch;
 }
 
-void DrawSide(Random* random, int32_t imageWidth, int32_t imageHeight, Side* side) {
-  side->nullSlot = -1;
-  side->isKnown = reference::DecodeFormat(side->record, &side->format) == 0;
-  if (!side->isKnown) {
-    side->blocks = ImageBlocks{1, {{1, 1}, {0, 0}, {0, 0}}};
-  } else {
-    side->blocks = BlocksOf(side->format, std::max(imageWidth, 1), std::max(imageHeight, 1),
-                            random->Percent(10));
-  }
-  for (int i = 0; i < side->blocks.count; ++i) {
-    side->pitches[i] = DrawPitch(random, side->blocks.block[i].rowBytes);
-    side->placement[i] = DrawPlacement(random);
-  }
-  if (side->blocks.count == 2 || (side->blocks.count == 3 && random->Percent(50))) {
-    side->pitches[2] = side->pitches[1];
-  }
-  if (side->isKnown && side->format.planeCount == 3 && random->Percent(1)) {
-    side->nullSlot = random->Between(1, 2);
-  }
-}
-
 void Append(std::string* text, const char* name, const MPPFORMAT& record, const Side& side) {
   char line[256];
   std::snprintf(line, sizeof(line), "  %s: format 0x%08x (internal 0x%x) %dx%d%s", name,
@@ -278,6 +257,27 @@ void Append(std::string* text, const char* name, const MPPFORMAT& record, const 
 }
 
 }  // namespace
+
+void DrawSide(Random* random, int32_t imageWidth, int32_t imageHeight, Side* side) {
+  side->nullSlot = -1;
+  side->isKnown = reference::DecodeFormat(side->record, &side->format) == 0;
+  if (!side->isKnown) {
+    side->blocks = ImageBlocks{1, {{1, 1}, {0, 0}, {0, 0}}};
+  } else {
+    side->blocks = BlocksOf(side->format, std::max(imageWidth, 1), std::max(imageHeight, 1),
+                            random->Percent(10));
+  }
+  for (int i = 0; i < side->blocks.count; ++i) {
+    side->pitches[i] = DrawPitch(random, side->blocks.block[i].rowBytes);
+    side->placement[i] = DrawPlacement(random);
+  }
+  if (side->blocks.count == 2 || (side->blocks.count == 3 && random->Percent(50))) {
+    side->pitches[2] = side->pitches[1];
+  }
+  if (side->isKnown && side->format.planeCount == 3 && random->Percent(1)) {
+    side->nullSlot = random->Between(1, 2);
+  }
+}
 
 Case DrawCase(uint64_t seed, uint64_t number) {
   static const uint8_t kSomePalette[4] = {0, 0, 0, 0};

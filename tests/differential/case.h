@@ -42,6 +42,9 @@ struct Case {
   Content content;
 };
 
+// Formats, pitches and places of a side whose record is set and whose image is that large.
+void DrawSide(Random* random, int32_t imageWidth, int32_t imageHeight, Side* side);
+
 // Case `number` of `seed`, the same on every machine. A palette is only a non-null address here:
 // whoever runs the case supplies the entries.
 Case DrawCase(uint64_t seed, uint64_t number);

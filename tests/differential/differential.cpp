@@ -11,6 +11,7 @@
 
 #include "engine/postprocess.h"
 #include "tests/differential/case.h"
+#include "tests/differential/placed.h"
 #include "tests/reference/reference.h"
 #include "tests/support/guarded_buffer.h"
 
@@ -20,7 +21,6 @@ namespace {
 using testing_support::GuardedBuffer;
 
 constexpr size_t kCapacity = size_t{1} << 20;
-constexpr ptrdiff_t kMargin = 64;  // bytes around a block that must stay as they were
 
 // What a crash handler can still say.
 volatile std::sig_atomic_t crashInModel = 0;
@@ -37,70 +37,6 @@ extern "C" void ReportCrash(int signalNumber) {
                                    static_cast<unsigned long long>(currentNumber));
   std::fwrite(line, 1, size_t(length), stderr);
   std::signal(signalNumber, SIG_DFL);  // the faulting instruction runs again and ends the program
-}
-
-void FillContent(Random* random, Content content, uint8_t* bytes, size_t count) {
-  constexpr uint8_t kExtremes[] = {0, 0, 255, 255, 16, 128, 235, 240};
-  if (content == Content::kNoise) {
-    random->Fill(bytes, count);
-  } else if (content == Content::kExtremes) {
-    random->Fill(bytes, count);
-    for (size_t i = 0; i < count; ++i) {
-      bytes[i] = kExtremes[bytes[i] & 7];
-    }
-  } else {
-    const uint32_t slope = uint32_t(random->Between(1, 9));
-    const uint32_t start = uint32_t(random->Between(0, 255));
-    for (size_t i = 0; i < count; ++i) {
-      bytes[i] = uint8_t(start + i * slope / 3);
-    }
-  }
-}
-
-// A block between guard pages and the bytes around it that are watched.
-struct PlacedBlock {
-  uint8_t* first;  // lowest address
-  uint8_t* top;    // address of the top row
-  uint8_t* watched;
-  size_t watchedSize;
-};
-
-PlacedBlock Place(GuardedBuffer* buffer, const Side& side, int index) {
-  const Block& block = side.blocks.block[index];
-  const Placement& placement = side.placement[index];
-  const int32_t pitch = side.pitches[index];
-  const size_t size = SizeOf(block, pitch);
-  PlacedBlock placed;
-  placed.first = buffer->Place(size, placement.edge, placement.alignment, placement.remainder);
-  placed.top = pitch < 0 ? placed.first + ptrdiff_t(-pitch) * (block.rows - 1) : placed.first;
-  placed.watched = placed.first - std::min(kMargin, placed.first - buffer->begin());
-  const uint8_t* const end = placed.first + size;
-  placed.watchedSize =
-      size_t(end - placed.watched) + size_t(std::min(kMargin, buffer->end() - end));
-  return placed;
-}
-
-template <typename Byte>
-void SetPlanes(const Side& side, const PlacedBlock* placed, Byte** planes, int32_t* pitches) {
-  Byte* tops[3] = {nullptr, nullptr, nullptr};
-  for (int i = 0; i < side.blocks.count; ++i) {
-    tops[i] = placed[i].top;
-  }
-  SlotsOf<Byte>(side.format, tops, planes);
-  if (side.nullSlot >= 0) {
-    planes[side.nullSlot] = nullptr;
-  }
-  std::copy(side.pitches, side.pitches + 3, pitches);
-}
-
-std::string Bytes(const uint8_t* bytes, ptrdiff_t count) {
-  std::string text;
-  char hex[4];
-  for (ptrdiff_t i = 0; i < count; ++i) {
-    std::snprintf(hex, sizeof(hex), " %02x", bytes[i]);
-    text += hex;
-  }
-  return text;
 }
 
 class Bench {
@@ -163,7 +99,7 @@ class Bench {
       return "the records of the caller have changed";
     }
     refused_ += code != KESTREL_OK;
-    return Compare(drawn, product, model);
+    return Difference(drawn.dst, product, model);
   }
 
   uint64_t refused() const { return refused_; }
@@ -184,27 +120,6 @@ class Bench {
       MPPDestroy(handle);
     }
     return code;
-  }
-
-  static std::string Compare(const Case& drawn, const PlacedBlock* product,
-                             const PlacedBlock* model) {
-    for (int i = 0; i < drawn.dst.blocks.count; ++i) {
-      const uint8_t* const got = product[i].watched;
-      const uint8_t* const expected = model[i].watched;
-      const size_t size = product[i].watchedSize;
-      if (std::memcmp(got, expected, size) == 0) {
-        continue;
-      }
-      const ptrdiff_t at = std::mismatch(got, got + size, expected).first - got;
-      const ptrdiff_t offset = (got + at) - product[i].first;
-      const ptrdiff_t pitch = std::abs(drawn.dst.pitches[i]);
-      const ptrdiff_t count = std::min<ptrdiff_t>(16, ptrdiff_t(size) - at);
-      return "block " + std::to_string(i) + ", byte " + std::to_string(offset) + " (line " +
-             std::to_string(offset / pitch) + " in memory, byte " + std::to_string(offset % pitch) +
-             ")\n    got     " + Bytes(got + at, count) + "\n    expected" +
-             Bytes(expected + at, count);
-    }
-    return std::string();
   }
 
   std::unique_ptr<GuardedBuffer> source_[3], product_[3], model_[3];

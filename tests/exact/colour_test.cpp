@@ -614,9 +614,10 @@ TEST(Brightness, AddsLevelsToAGreySourceAndContrastDoesNot) {
 TEST(Contrast, ActsOnAGreySourceThatStaysYuv) {
   const uint32_t grey = FORMAT_GRAY8 | FORMAT_BT601_FULL;
   // Gain 2 about 128.
-  EXPECT_EQ(OnePixel(grey, 1, grey, {100}, Param().Adjust(0, 64, 0)), (Bytes{72}));
   EXPECT_EQ(OnePixel(FORMAT_YUV444 | FORMAT_BT601_FULL, 3, grey, {100}, Param().Adjust(0, 64, 0)),
             (Bytes{72, 128, 128}));
+  // The grey family copies what is stored and never changes levels.
+  EXPECT_EQ(OnePixel(grey, 1, grey, {100}, Param().Adjust(0, 64, 0)), (Bytes{100}));
 }
 
 TEST(YuvToYuv, ChangesRangeButNeverTheMatrix) {

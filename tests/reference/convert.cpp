@@ -2,6 +2,7 @@
 #include <algorithm>
 #include <cstdint>
 #include <initializer_list>
+#include <map>
 
 #include "tests/reference/reference.h"
 
@@ -23,24 +24,23 @@ int64_t Position(bool bilinear, int64_t origin, int64_t step, int64_t distance) 
 
 class Source {
  public:
-  Source(const Engine& engine, const int32_t* pitches, const uint8_t* const* planes)
-      : engine_(engine), format_(engine.src), pitches_(pitches), planes_(planes) {}
+  Source(const Engine& engine, const Rect& loop, const int32_t* pitches,
+         const uint8_t* const* planes, const Quirks& quirks)
+      : engine_(engine),
+        loop_(loop),
+        format_(engine.src),
+        pitches_(pitches),
+        planes_(planes),
+        quirks_(quirks) {}
 
   Place Row(int64_t loopRow) const {
-    const int64_t position = Position(engine_.bilinear, engine_.srcOriginY, engine_.stepY,
-                                      loopRow - engine_.loopOriginY);
-    const int64_t last = engine_.srcRect.bottom - 1;
-    Place place;
-    // A 16.16 position against a whole row number: it tells positions above row 0 and nothing else.
-    if (position < engine_.srcRect.top) {
-      place = {engine_.srcRect.top, engine_.srcRect.top + 1, 0};
-    } else {
-      place = {position >> 16, (position >> 16) + 1, position & 0xFFFF};
-    }
-    // Row numbers are unsigned where they are compared: one above the image ends in its last row.
-    if (int64_t{uint32_t(place.index)} >= last) {
-      place.index = last;
-      place.next = last;
+    Place place = OwnRow(loopRow);
+    if (quirks_.sharedLowerLine && (loopRow - loop_.top) % 2 == 1) {
+      const int64_t last = engine_.srcRect.bottom - 1;
+      place.next = std::min(OwnRow(loopRow - 1).index + 1, last);
+      if (place.index >= last) {
+        place.weight = 0;
+      }
     }
     return Limited(place, engine_.srcReadBottom);
   }
@@ -48,13 +48,20 @@ class Source {
   Place Column(int64_t loopColumn) const {
     const int64_t position = Position(engine_.bilinear, engine_.srcOriginX, engine_.stepX,
                                       loopColumn - engine_.loopOriginX);
+    const int64_t first = engine_.srcRect.left;
+    const int64_t last = engine_.srcRect.right - 1;
+    const int64_t tested =
+        quirks_.edgesOfPairs ? loopColumn - (loopColumn - loop_.left) % 2 : loopColumn;
     Place place;
-    if (loopColumn < engine_.coveredRect.left) {
-      place = {engine_.srcRect.left, engine_.srcRect.left, 0};
-    } else if (loopColumn >= engine_.coveredRect.right - 1) {
-      place = {engine_.srcRect.right - 1, engine_.srcRect.right - 1, 0};
+    if (!quirks_.noEdgeColumns && tested < engine_.coveredRect.left) {
+      place = {first, first, 0};
+    } else if (!quirks_.noEdgeColumns && tested >= engine_.coveredRect.right - 1) {
+      place = {last, last, 0};
     } else {
       place = {position >> 16, (position >> 16) + 1, position & 0xFFFF};
+      if (quirks_.edgesOfPairs || quirks_.noEdgeColumns) {
+        place.index = std::clamp(place.index, first, last);
+      }
     }
     return Limited(place, engine_.srcReadRight);
   }
@@ -74,6 +81,25 @@ class Source {
   }
 
  private:
+  Place OwnRow(int64_t loopRow) const {
+    const int64_t position = Position(engine_.bilinear, engine_.srcOriginY, engine_.stepY,
+                                      loopRow - engine_.loopOriginY);
+    const int64_t last = engine_.srcRect.bottom - 1;
+    Place place;
+    // A 16.16 position against a whole row number: it tells positions above row 0 and nothing else.
+    if (position < engine_.srcRect.top) {
+      place = {engine_.srcRect.top, engine_.srcRect.top + 1, 0};
+    } else {
+      place = {position >> 16, (position >> 16) + 1, position & 0xFFFF};
+    }
+    // Row numbers are unsigned where they are compared: one above the image ends in its last row.
+    if (int64_t{uint32_t(place.index)} >= last) {
+      place.index = last;
+      place.next = last;
+    }
+    return place;
+  }
+
   // Nothing outside the image is read, whatever the rules above say.
   static Place Limited(Place place, int64_t end) {
     place.index = std::clamp<int64_t>(place.index, 0, end - 1);
@@ -156,16 +182,23 @@ class Source {
   }
 
   const Engine& engine_;
+  const Rect loop_;
   const Format& format_;
   const int32_t* pitches_;
   const uint8_t* const* planes_;
+  const Quirks quirks_;
 };
 
 class Destination {
  public:
   Destination(const Engine& engine, const Rect& loop, const int32_t* pitches,
-              uint8_t* const* starts)
-      : engine_(engine), format_(engine.dst), loop_(loop), pitches_(pitches), starts_(starts) {
+              uint8_t* const* starts, const Quirks& quirks)
+      : engine_(engine),
+        format_(engine.dst),
+        loop_(loop),
+        pitches_(pitches),
+        starts_(starts),
+        quirks_(quirks) {
     // Where in the image the job starts: undo the exchange of axes, then the mirroring.
     Rect image = loop;
     if (engine.swapXY) {
@@ -225,13 +258,31 @@ class Destination {
       const int64_t factor = engine_.swapXY ? format_.vertical[i] : format_.horizontal[i];
       const int64_t along = format_.code == CODE_YUYV ? (loopColumn - loop_.left) / factor
                                                       : loopColumn / factor - loop_.left / factor;
-      Store(At(i, along, rowsDone_[i]), yuv[i]);
+      uint8_t* const address = At(i, along, rowsDone_[i]);
+      if (!quirks_.chromaOfPairs || GivesChroma(i, address, ImageColumn(loopColumn))) {
+        Store(address, yuv[i]);
+      }
     }
   }
 
  private:
   int64_t LoopVertical(int plane) const {
     return engine_.swapXY ? format_.horizontal[plane] : format_.vertical[plane];
+  }
+
+  int64_t ImageColumn(int64_t loopColumn) const {
+    const int64_t dx = engine_.swapXY ? loopRow_ - loop_.top : loopColumn - loop_.left;
+    return firstX_ + (engine_.mirrorX ? -dx : dx);
+  }
+
+  // Among the pixels that share a group the first in memory gives U, the last gives V.
+  bool GivesChroma(int component, const uint8_t* address, int64_t imageColumn) {
+    const auto [known, isNew] = chromaColumns_.try_emplace(address, imageColumn);
+    if (!isNew && (component == kU ? imageColumn > known->second : imageColumn < known->second)) {
+      return false;
+    }
+    known->second = imageColumn;
+    return true;
   }
 
   uint8_t* LumaAt(int64_t loopColumn) {
@@ -277,7 +328,9 @@ class Destination {
   const Rect loop_;
   const int32_t* pitches_;
   uint8_t* const* starts_;
-  int64_t firstX_;  // image coordinates of the first pixel
+  const Quirks quirks_;
+  std::map<const uint8_t*, int64_t> chromaColumns_;  // image column that each sample came from
+  int64_t firstX_;                                   // image coordinates of the first pixel
   int64_t firstY_;
   int64_t imageRight_;
   int64_t loopRow_ = 0;
@@ -288,13 +341,14 @@ class Destination {
 
 void ConvertLoopRect(const Engine& engine, const Rect& loopRect, const int32_t* dstPitches,
                      const int32_t* srcPitches, uint8_t* const* dstStarts,
-                     const uint8_t* const* srcPlanes) {
+                     const uint8_t* const* srcPlanes, const Quirks& quirks) {
   if (loopRect.IsEmpty() || engine.sourceIsEmpty || engine.srcReadRight < 1 ||
       engine.srcReadBottom < 1) {
     return;
   }
-  const Source source(engine, srcPitches, srcPlanes);
-  Destination destination(engine, loopRect, dstPitches, dstStarts);
+  const Source source(engine, loopRect, srcPitches, srcPlanes, quirks);
+  Destination destination(engine, loopRect, dstPitches, dstStarts, quirks);
+  const bool changesLevels = engine.changesLevels && !quirks.storedLevels;
   if (!destination.StartsInside()) {
     return;
   }
@@ -309,7 +363,7 @@ void ConvertLoopRect(const Engine& engine, const Rect& loopRect, const int32_t* 
       Triple pixel = source.Pixel(column, row);
       switch (engine.path) {
         case ColourPath::kYuvToYuv:
-          destination.WriteYuv(x, engine.changesLevels ? engine.levels.Convert(pixel) : pixel);
+          destination.WriteYuv(x, changesLevels ? engine.levels.Convert(pixel) : pixel);
           break;
         case ColourPath::kRgbToYuv:
           destination.WriteYuv(x, RgbToYuv(pixel, engine.dst.standard));

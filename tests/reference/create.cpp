@@ -30,17 +30,18 @@ int64_t RoundUp(int64_t value, int64_t multiple) {
   return -RoundDown(-value, multiple);
 }
 
-// Regions and sizes are rounded to the blocks of the engine.
-int64_t BlockSize(const Format& dst, const Format& src, uint32_t passMode, bool fast4x4) {
+uint32_t BlockMode(const Format& dst, const Format& src, uint32_t passMode, bool fast4x4) {
   const bool anySubsampling = dst.code == CODE_YV_ANY || dst.code == CODE_I_ANY ||
                               src.code == CODE_YV_ANY || src.code == CODE_I_ANY;
   if (passMode < 2 || passMode > 4 || anySubsampling || src.palette != nullptr) {
     return 1;
   }
-  if (passMode == 4) {
-    return fast4x4 ? 1 : 4;
-  }
-  return passMode == 2 ? 2 : 4;
+  return passMode == 4 && !fast4x4 ? 3 : passMode;
+}
+
+// Regions and sizes are rounded to the blocks of the engine.
+int64_t BlockSize(uint32_t blockMode) {
+  return blockMode == 2 ? 2 : blockMode == 3 ? 4 : 1;
 }
 
 // One axis of a region that shrinks about its centre.
@@ -92,6 +93,7 @@ uint32_t BuildEngine(const MPPFORMAT& dst, const MPPFORMAT& src, const MPPPARAM&
     return kBadArgument;  // their steps are below 0, which comes after the formats
   }
   engine->path = PathOf(engine->dst, engine->src);
+  engine->transformCode = params.transformCode;
   engine->swapXY = (params.transformCode & 1) != 0;
   engine->mirrorX = (params.transformCode & 2) != 0;
   engine->mirrorY = (params.transformCode & 4) != 0;
@@ -126,7 +128,8 @@ uint32_t BuildEngine(const MPPFORMAT& dst, const MPPFORMAT& src, const MPPPARAM&
   const bool fast4x4 =
       engine->bilinear && engine->dst.code == CODE_I420 && engine->src.code == CODE_I420 &&
       (params.transformCode == 0 || params.transformCode == 3 || params.transformCode == 5);
-  const int64_t block = BlockSize(engine->dst, engine->src, passMode, fast4x4);
+  engine->blockMode = BlockMode(engine->dst, engine->src, passMode, fast4x4);
+  const int64_t block = BlockSize(engine->blockMode);
 
   if (engine->stepX != engine->stepY) {
     if (params.aspectMode & MPP_ASPECT_FIT) {
@@ -185,6 +188,12 @@ uint32_t BuildEngine(const MPPFORMAT& dst, const MPPFORMAT& src, const MPPPARAM&
     engine->changesLevels =
         !adjustments.IsNeutral() || ((engine->src.standard ^ engine->dst.standard) & 3) != 0;
     engine->levels = LevelChange(engine->src.standard, engine->dst.standard, adjustments);
+  }
+  if (IsUnitScale(*engine)) {
+    engine->blockMode = std::min(engine->blockMode, 3u);
+    if (engine->blockMode == 3 && engine->changesLevels) {
+      engine->blockMode = 2;
+    }
   }
   return kOk;
 }

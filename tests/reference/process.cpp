@@ -3,6 +3,7 @@
 #include <cstdint>
 #include <utility>
 
+#include "tests/reference/chooser.h"
 #include "tests/reference/reference.h"
 
 namespace reference {
@@ -50,9 +51,7 @@ Rect ClampedInto(const Rect& rect, const Rect& bounds) {
 class Runner {
  public:
   Runner(const Engine& engine, const Job& job)
-      : engine_(engine),
-        dst_(engine.dst, job.dstPlanes, job.dstPitches),
-        src_(engine.src, job.srcPlanes, job.srcPitches) {}
+      : engine_(engine), job_(job), quirks_(QuirksOf(Choose(engine).kernel)) {}
 
   void Run(const Rect& rect) const {
     // The limits are measured from the clipped corner, not from that of the region.
@@ -79,40 +78,16 @@ class Runner {
 
  private:
   void Dispatch(const Rect& band) const {
-    if (band.IsEmpty() || dst_.HasNullPlane() || src_.HasNullPlane()) {
-      return;
+    KernelCall call;
+    if (PrepareCall(engine_, job_, band, &call)) {
+      ConvertLoopRect(engine_, call.loopRect, call.dstPitches, call.srcPitches, call.dstStarts,
+                      call.srcPlanes, quirks_);
     }
-    const int64_t x = engine_.mirrorX ? band.right - 1 : band.left;
-    const int64_t y = engine_.mirrorY ? band.bottom - 1 : band.top;
-    if (x < 0 || y < 0) {
-      return;
-    }
-    uint8_t* starts[3];
-    int32_t pitches[3];
-    for (int i = 0; i < 3; ++i) {
-      starts[i] = dst_.address[i] + dst_.pitch[i] * (y / engine_.dst.vertical[i]) +
-                  engine_.dst.step[i] * (x / engine_.dst.horizontal[i]);
-      pitches[i] = engine_.mirrorY ? -dst_.pitch[i] : dst_.pitch[i];
-    }
-    Rect loop = band;
-    const Rect& region = engine_.dstRegion;
-    if (engine_.mirrorY) {
-      loop.top = region.top + region.bottom - band.bottom;
-      loop.bottom = region.top + region.bottom - band.top;
-    }
-    if (engine_.mirrorX) {
-      loop.left = region.left + region.right - band.right;
-      loop.right = region.left + region.right - band.left;
-    }
-    if (engine_.swapXY) {
-      loop = Transposed(loop);
-    }
-    ConvertLoopRect(engine_, loop, pitches, src_.pitch, starts, src_.address);
   }
 
   const Engine& engine_;
-  Binding<uint8_t> dst_;
-  Binding<const uint8_t> src_;
+  const Job& job_;
+  const Quirks quirks_;
 };
 
 bool IsMultipleOf4(int64_t value) {
@@ -175,6 +150,38 @@ MPPFORMAT Normalised(MPPFORMAT record) {
 }
 
 }  // namespace
+
+bool PrepareCall(const Engine& engine, const Job& job, const Rect& band, KernelCall* call) {
+  const Binding<uint8_t> dst(engine.dst, job.dstPlanes, job.dstPitches);
+  const Binding<const uint8_t> src(engine.src, job.srcPlanes, job.srcPitches);
+  const int64_t x = engine.mirrorX ? band.right - 1 : band.left;
+  const int64_t y = engine.mirrorY ? band.bottom - 1 : band.top;
+  if (band.IsEmpty() || dst.HasNullPlane() || src.HasNullPlane() || x < 0 || y < 0) {
+    return false;
+  }
+  for (int i = 0; i < 3; ++i) {
+    call->dstStarts[i] = dst.address[i] + dst.pitch[i] * (y / engine.dst.vertical[i]) +
+                         engine.dst.step[i] * (x / engine.dst.horizontal[i]);
+    call->dstPitches[i] = engine.mirrorY ? -dst.pitch[i] : dst.pitch[i];
+    call->srcPlanes[i] = src.address[i];
+    call->srcPitches[i] = src.pitch[i];
+  }
+  Rect& loop = call->loopRect;
+  const Rect& region = engine.dstRegion;
+  loop = band;
+  if (engine.mirrorY) {
+    loop.top = region.top + region.bottom - band.bottom;
+    loop.bottom = region.top + region.bottom - band.top;
+  }
+  if (engine.mirrorX) {
+    loop.left = region.left + region.right - band.right;
+    loop.right = region.left + region.right - band.left;
+  }
+  if (engine.swapXY) {
+    loop = Transposed(loop);
+  }
+  return true;
+}
 
 uint32_t Convert(const Job& job) {
   const MPPFORMAT dst = Normalised(job.dst);

@@ -43,6 +43,8 @@ enum class ColourPath { kYuvToYuv, kYuvToRgb, kRgbToRgb, kRgbToYuv };
 struct Engine {
   Format dst;
   Format src;
+  uint32_t blockMode = 1;
+  uint32_t transformCode = 0;
   ColourPath path = ColourPath::kYuvToYuv;
   bool swapXY = false;
   bool mirrorX = false;
@@ -69,17 +71,42 @@ struct Engine {
   LevelChange levels;
 };
 
+inline bool IsUnitScale(const Engine& engine) {
+  return engine.stepX == 0x10000 && engine.stepY == 0x10000;
+}
+
 // Creation of one pass engine. passMode is that of the pass: 1, 2 and 3 in a tiled handle.
 uint32_t BuildEngine(const MPPFORMAT& dst, const MPPFORMAT& src, const MPPPARAM& params,
                      uint32_t passMode, Engine* engine);
 
-// The generic converter on its own, under the contract that all conversion kernels have: a loop
-// rectangle, destination pitches negated when mirrorY, addresses of the first pixel of the job in
-// each destination plane and of the image origin in each source plane (planes already bound:
-// channel addresses of one-plane formats, U before V).
+// What some kernels give on purpose instead of the generic converter's bytes.
+struct Quirks {
+  bool storedLevels = false;     // levels stay as stored although the engine changes them
+  bool chromaOfPairs = false;    // YUYV: U of the pixel that is first in memory, V of the other
+  bool edgesOfPairs = false;     // edge columns are told by the first column of each pair
+  bool sharedLowerLine = false;  // rows in pairs, blended toward the line below the first one's
+  bool noEdgeColumns = false;    // columns outside the covered rectangle are sampled like others
+};
+
+// The generic converter on its own, or changed by quirks, under the contract that all conversion
+// kernels have: a loop rectangle, destination pitches negated when mirrorY, addresses of the first
+// pixel of the job in each destination plane and of the image origin in each source plane (planes
+// already bound: channel addresses of one-plane formats, U before V).
 void ConvertLoopRect(const Engine& engine, const Rect& loopRect, const int32_t* dstPitches,
                      const int32_t* srcPitches, uint8_t* const* dstStarts,
-                     const uint8_t* const* srcPlanes);
+                     const uint8_t* const* srcPlanes, const Quirks& quirks = Quirks());
+
+// The arguments of the call that draws one band (a rectangle of the image) with one kernel.
+struct KernelCall {
+  Rect loopRect;
+  int32_t dstPitches[3];
+  int32_t srcPitches[3];
+  uint8_t* dstStarts[3];
+  const uint8_t* srcPlanes[3];
+};
+
+// False when there is nothing to call: an empty band, a missing plane, a start before the image.
+bool PrepareCall(const Engine& engine, const Job& job, const Rect& band, KernelCall* call);
 
 }  // namespace reference
 

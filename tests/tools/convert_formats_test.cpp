@@ -220,9 +220,9 @@ TEST_F(ConvertFormats, ColourStandardChangesTheNumbers) {
 }
 
 TEST_F(ConvertFormats, AdjustmentsAndAlphaReachTheEngine) {
-  WriteFile("grey.i444", {100, 120, 140, 160, 128, 128, 128, 128, 128, 128, 128, 128});
+  WriteFile("grey.yv24", {100, 120, 140, 160, 128, 128, 128, 128, 128, 128, 128, 128});
   const auto with = [this](const Arguments& extra) {
-    Arguments arguments = {"grey.i444", "--input-size", "2x2", "-o", "out.i444"};
+    Arguments arguments = {"grey.yv24", "--input-size", "2x2", "-o", "out.i444"};
     arguments.insert(arguments.end(), extra.begin(), extra.end());
     return Converted(arguments);
   };
@@ -231,16 +231,16 @@ TEST_F(ConvertFormats, AdjustmentsAndAlphaReachTheEngine) {
   EXPECT_EQ(with({"--contrast", "-128"})[0], with({"--contrast", "-128"})[3]);
   EXPECT_GT(with({"--contrast", "32"})[3] - with({"--contrast", "32"})[0], 60);
   const Bytes rgba =
-      Converted({"grey.i444", "--input-size", "2x2", "--alpha", "7", "-o", "out.rgba"});
+      Converted({"grey.yv24", "--input-size", "2x2", "--alpha", "7", "-o", "out.rgba"});
   EXPECT_EQ(rgba[3], 7);
   EXPECT_EQ(rgba[15], 7);
-  EXPECT_EQ(Converted({"grey.i444", "--input-size", "2x2", "-o", "opaque.rgba"})[3], 255);
+  EXPECT_EQ(Converted({"grey.yv24", "--input-size", "2x2", "-o", "opaque.rgba"})[3], 255);
 }
 
 TEST_F(ConvertFormats, SaturationMovesChroma) {
-  WriteFile("one.i444", {100, 100, 100, 100, 90, 90, 90, 90, 150, 150, 150, 150});
+  WriteFile("one.yv24", {100, 100, 100, 100, 90, 90, 90, 90, 150, 150, 150, 150});
   const Bytes less =
-      Converted({"one.i444", "--input-size", "2x2", "--saturation", "-128", "-o", "less.i444"});
+      Converted({"one.yv24", "--input-size", "2x2", "--saturation", "-128", "-o", "less.i444"});
   EXPECT_EQ(less[4], 128);
   EXPECT_EQ(less[8], 128);
   EXPECT_EQ(less[0], 100);

@@ -1,0 +1,217 @@
+#include "tests/kernels/kernel_case.h"
+
+#include <algorithm>
+#include <cstring>
+
+namespace kernel_tests {
+namespace {
+
+using differential::Case;
+using differential::Content;
+using differential::Random;
+using testing_support::GuardedBuffer;
+
+struct PublicCode {
+  uint32_t layout;  // one bit of kestrel::FormatSet
+  uint32_t code;
+};
+
+constexpr PublicCode kCodes[] = {
+    {kestrel::kRgb24, FORMAT_RGB888},  {kestrel::kRgb24, FORMAT_BGR888},
+    {kestrel::kRgb24, FORMAT_RGB666},  {kestrel::kRgb24, FORMAT_BGR666},
+    {kestrel::kRgb24, 0x16000565},     {kestrel::kRgb24, 0x36001676},
+    {kestrel::kGrey, FORMAT_GRAY8},    {kestrel::kI420, FORMAT_I420},
+    {kestrel::kI440, FORMAT_I440},     {kestrel::kI422, FORMAT_I422},
+    {kestrel::kI444, FORMAT_I444},     {kestrel::kYv12, FORMAT_YV12},
+    {kestrel::kNv21, FORMAT_NV21},     {kestrel::kNv12, FORMAT_NV12},
+    {kestrel::kNv61, FORMAT_NV61},     {kestrel::kYuyv, FORMAT_YUYV},
+    {kestrel::kYuv444, FORMAT_YUV444},
+};
+
+uint32_t DrawCode(Random* random, uint32_t layouts) {
+  PublicCode code;
+  do {
+    code = random->Pick(kCodes);
+  } while ((code.layout & layouts) == 0);
+  const bool hasStandard = code.layout != kestrel::kRgb24;
+  return code.code |
+         (hasStandard && random->Percent(60) ? uint32_t(random->Between(0, 3)) << 12 : 0);
+}
+
+int32_t DrawLength(Random* random) {
+  return random->Between(1, random->Percent(60) ? 20 : 70);
+}
+
+bool TakesUnitScale(kestrel::Scale scale) {
+  return scale == kestrel::Scale::kUnit || scale == kestrel::Scale::kUnitSteps;
+}
+
+void DrawSizes(Random* random, kestrel::Scale scale, Case* drawn) {
+  MPPFORMAT& src = drawn->src.record;
+  src.width = DrawLength(random);
+  src.height = DrawLength(random);
+  int32_t width = src.width;
+  int32_t height = src.height;
+  const bool takesUnit = TakesUnitScale(scale);
+  const int32_t kind = random->Between(1, 100);
+  if (takesUnit && kind <= 10 && height > 1) {  // 1:1 after cropping, and bilinear all the same
+    height = random->Between(1, height - 1);
+    drawn->params.aspectMode = MPP_ASPECT_CROP;
+    drawn->params.resampleFlags = MPP_BILINEAR;
+  } else if (!takesUnit && kind <= 15) {
+    width *= 2;
+    height *= 2;
+  } else if (!takesUnit && kind <= 25) {  // scaled on one axis
+    height = DrawLength(random);
+  } else if (!takesUnit && kind <= 90) {
+    width = DrawLength(random);
+    height = DrawLength(random);
+  }
+  const bool swaps = (drawn->params.transformCode & MPP_SWAP_XY) != 0;
+  drawn->dst.record.width = swaps ? height : width;
+  drawn->dst.record.height = swaps ? width : height;
+}
+
+// start..end inside [low, high), at least one pixel.
+void DrawInside(Random* random, int32_t low, int32_t high, int32_t* start, int32_t* end) {
+  *start = random->Between(low, high - 1);
+  *end = random->Between(*start + 1, high);
+}
+
+}  // namespace
+
+EngineHandle CreateEngine(const MPPFORMAT& dst, const MPPFORMAT& src, const MPPPARAM& params) {
+  MPPFORMAT dstRecord = dst;
+  MPPFORMAT srcRecord = src;
+  MPPPARAM record = params;
+  MPPHandle* handle = nullptr;
+  MPPCreate(&dstRecord, &srcRecord, &record, &handle);
+  return EngineHandle(handle);
+}
+
+Case DrawForKernel(Random* random, const kestrel::KernelRow& row) {
+  Case drawn{};
+  drawn.src.record.format = DrawCode(random, row.sources);
+  const bool same = row.pairing == kestrel::Pairing::kSame;
+  drawn.dst.record.format = same ? (drawn.src.record.format & ~FORMAT_STANDARD_MASK) |
+                                       uint32_t(random->Between(0, 3)) << 12
+                                 : DrawCode(random, row.destinations);
+  MPPPARAM& params = drawn.params;
+  const bool mayBlend = !TakesUnitScale(row.scale) && row.scale != kestrel::Scale::kNearest &&
+                        row.scale != kestrel::Scale::kNotBilinear;
+  params.resampleFlags = mayBlend && random->Percent(85) ? MPP_BILINEAR : MPP_NEAREST;
+  params.transformCode = uint32_t(random->Between(0, 7));
+  if (random->Percent(8)) {
+    params.transformCode |= 8;  // no flag sees it, tests of the whole code do
+  }
+  params.passMode = uint32_t(random->Between(1, 4));
+  params.bandSelector = uint32_t(random->Between(0, 5));
+  params.aspectMode = random->Percent(80) ? 0 : uint32_t(random->Between(1, 2));
+  if (random->Percent(20)) {
+    params.brightness = random->Between(-128, 128);
+    params.contrast = random->Between(-128, 128);
+    params.saturation = random->Between(-128, 128);
+  }
+  DrawSizes(random, row.scale, &drawn);
+  if (random->Percent(50)) {
+    params.srcOriginX = random->Between(0, 5);
+    params.srcOriginY = random->Between(0, 5);
+    params.dstOriginX = random->Between(0, 5);
+    params.dstOriginY = random->Between(0, 5);
+  }
+  if (random->Percent(30)) {
+    int32_t right = params.srcOriginX + drawn.src.record.width;
+    int32_t bottom = params.srcOriginY + drawn.src.record.height;
+    if (random->Percent(15)) {
+      right += random->Between(0, 5);
+      bottom += random->Between(0, 5);
+    }
+    DrawInside(random, params.srcOriginX, right, &params.srcRect.left, &params.srcRect.right);
+    DrawInside(random, params.srcOriginY, bottom, &params.srcRect.top, &params.srcRect.bottom);
+  }
+  return drawn;
+}
+
+void DrawBand(Random* random, const reference::Engine& engine, Case* drawn) {
+  const MPPPARAM& params = drawn->params;
+  const reference::Rect& region = engine.dstRegion;
+  MRECT& rect = drawn->rect;
+  rect = {int32_t(region.left), int32_t(region.top), int32_t(region.right), int32_t(region.bottom)};
+  const int32_t kind = random->Between(1, 100);
+  if (kind > 40 && !region.IsEmpty()) {
+    const int32_t beyond = kind > 85 ? 5 : 0;
+    MRECT part;
+    DrawInside(random, rect.left - beyond, rect.right + beyond, &part.left, &part.right);
+    DrawInside(random, rect.top - beyond, rect.bottom + beyond, &part.top, &part.bottom);
+    if (kind > 80 && kind <= 85) {  // one column
+      part.right = part.left + 1;
+    }
+    rect = part;
+  }
+  constexpr Content kContents[] = {Content::kNoise, Content::kNoise, Content::kExtremes,
+                                   Content::kSmooth};
+  drawn->content = random->Pick(kContents);
+  const int32_t dstRight = params.dstOriginX + drawn->dst.record.width;
+  const int32_t dstBottom = params.dstOriginY + drawn->dst.record.height;
+  DrawSide(random, std::max(dstRight, rect.right), std::max(dstBottom, rect.bottom), &drawn->dst);
+  DrawSide(random, params.srcOriginX + drawn->src.record.width,
+           params.srcOriginY + drawn->src.record.height, &drawn->src);
+  drawn->dst.nullSlot = -1;
+  drawn->src.nullSlot = -1;
+}
+
+KernelBench::KernelBench() {
+  constexpr size_t kCapacity = size_t{1} << 17;
+  for (int i = 0; i < 3; ++i) {
+    source_[i] = std::make_unique<GuardedBuffer>(kCapacity);
+    got_[i] = std::make_unique<GuardedBuffer>(kCapacity);
+    expected_[i] = std::make_unique<GuardedBuffer>(kCapacity);
+  }
+}
+
+bool KernelBench::Prepare(const Case& drawn, const reference::Engine& engine) {
+  case_ = drawn;
+  engine_ = &engine;
+  Random random(drawn.seed, drawn.number);
+  for (int i = 0; i < drawn.src.blocks.count; ++i) {
+    sourceBlocks_[i] = Place(source_[i].get(), drawn.src, i);
+    FillContent(&random, drawn.content, sourceBlocks_[i].watched, sourceBlocks_[i].watchedSize);
+  }
+  for (int i = 0; i < drawn.dst.blocks.count; ++i) {
+    gotBlocks_[i] = Place(got_[i].get(), drawn.dst, i);
+    expectedBlocks_[i] = Place(expected_[i].get(), drawn.dst, i);
+    random.Fill(gotBlocks_[i].watched, gotBlocks_[i].watchedSize);
+    std::memcpy(expectedBlocks_[i].watched, gotBlocks_[i].watched, gotBlocks_[i].watchedSize);
+  }
+  reference::KernelCall call;
+  // Processing stops before its kernels when cropping has left nothing of the source.
+  return !engine.sourceIsEmpty && Bind(gotBlocks_, &call);
+}
+
+bool KernelBench::Bind(const differential::PlacedBlock* dst, reference::KernelCall* call) const {
+  reference::Job job{};
+  SetPlanes(case_.src, sourceBlocks_, job.srcPlanes, job.srcPitches);
+  SetPlanes(case_.dst, dst, job.dstPlanes, job.dstPitches);
+  const MRECT& rect = case_.rect;
+  return PrepareCall(*engine_, job, {rect.left, rect.top, rect.right, rect.bottom}, call);
+}
+
+void KernelBench::CallModel(const reference::Quirks& quirks) {
+  reference::KernelCall call;
+  Bind(expectedBlocks_, &call);
+  ConvertLoopRect(*engine_, call.loopRect, call.dstPitches, call.srcPitches, call.dstStarts,
+                  call.srcPlanes, quirks);
+}
+
+std::string KernelBench::Difference() const {
+  return differential::Difference(case_.dst, gotBlocks_, expectedBlocks_);
+}
+
+std::string KernelBench::Describe() const {
+  const MRECT& rect = case_.rect;
+  return differential::Describe(case_) + "  band (" + std::to_string(rect.left) + ", " +
+         std::to_string(rect.top) + ", " + std::to_string(rect.right) + ", " +
+         std::to_string(rect.bottom) + ")";
+}
+
+}  // namespace kernel_tests
