@@ -190,7 +190,8 @@ class Pipeline {
 
   const uint8_t* MapLevels(uint8_t* buffer, const uint8_t* run, int map, int n) const {
     if (!job_.mapsLevels()) return run;
-    rows_.mapLevels(buffer, run, static_cast<const uint8_t*>(engine_.table) + ptrdiff_t{256} * map, n);
+    rows_.mapLevels(buffer, run, static_cast<const uint8_t*>(engine_.table) + ptrdiff_t{256} * map,
+                    n);
     return buffer;
   }
 

@@ -342,21 +342,30 @@ Lanes4 HighPairs(Lanes4 a, Lanes4 b) {
   return __builtin_shufflevector(a, b, 2, 6, 3, 7);
 }
 
-// A square of as many units as a vector has lanes. Pairing rows i and i + half, once for each bit
-// of an index, moves every unit to its place.
+// Pairs rows i and i + half of a square, once for each bit of an index: that moves every unit to
+// its place. Recursion instead of a loop keeps the rows in registers.
+template <int kRounds, typename Lanes, int kSide>
+inline __attribute__((always_inline)) void PairRows(Lanes (&rows)[kSide]) {
+  if constexpr (kRounds > 0) {
+    Lanes paired[kSide];
+    for (int i = 0; i < kSide / 2; ++i) {
+      paired[2 * i] = LowPairs(rows[i], rows[i + kSide / 2]);
+      paired[2 * i + 1] = HighPairs(rows[i], rows[i + kSide / 2]);
+    }
+    PairRows<kRounds - 1>(paired);
+    for (int i = 0; i < kSide; ++i) rows[i] = paired[i];
+  }
+}
+
+// A square of as many units as a vector has lanes.
 template <typename Lanes, int kUnit>
 void TransposeSquare(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch) {
   constexpr int kSide = 16 / kUnit;
-  Lanes a[kSide], b[kSide];
-  for (int i = 0; i < kSide; ++i) memcpy(&a[i], src + i * srcPitch, 16);
-  for (int bit = 1; bit < kSide; bit *= 2) {
-    for (int i = 0; i < kSide / 2; ++i) {
-      b[2 * i] = LowPairs(a[i], a[i + kSide / 2]);
-      b[2 * i + 1] = HighPairs(a[i], a[i + kSide / 2]);
-    }
-    memcpy(a, b, sizeof(a));
-  }
-  for (int i = 0; i < kSide; ++i) memcpy(dst + i * dstPitch, &a[i], 16);
+  constexpr int kBits = kSide == 16 ? 4 : kSide == 8 ? 3 : 2;
+  Lanes rows[kSide];
+  for (int i = 0; i < kSide; ++i) memcpy(&rows[i], src + i * srcPitch, 16);
+  PairRows<kBits>(rows);
+  for (int i = 0; i < kSide; ++i) memcpy(dst + i * dstPitch, &rows[i], 16);
 }
 
 template <typename Lanes, int kUnit>
