@@ -342,42 +342,50 @@ Lanes4 HighPairs(Lanes4 a, Lanes4 b) {
   return __builtin_shufflevector(a, b, 2, 6, 3, 7);
 }
 
-// Pairs rows i and i + half of a square, once for each bit of an index: that moves every unit to
-// its place. Recursion instead of a loop keeps the rows in registers.
-template <int kRounds, typename Lanes, int kSide>
-inline __attribute__((always_inline)) void PairRows(Lanes (&rows)[kSide]) {
+// Pairs rows i and i + half. Each round turns the highest bit of a unit's row number into the
+// lowest of its place within the row; after as many rounds as there are bits, the units of a column
+// lie side by side. Recursion instead of a loop keeps the rows in registers.
+template <int kRounds, typename Lanes, int kRows>
+inline __attribute__((always_inline)) void PairRows(Lanes (&rows)[kRows]) {
   if constexpr (kRounds > 0) {
-    Lanes paired[kSide];
-    for (int i = 0; i < kSide / 2; ++i) {
-      paired[2 * i] = LowPairs(rows[i], rows[i + kSide / 2]);
-      paired[2 * i + 1] = HighPairs(rows[i], rows[i + kSide / 2]);
+    Lanes paired[kRows];
+    for (int i = 0; i < kRows / 2; ++i) {
+      paired[2 * i] = LowPairs(rows[i], rows[i + kRows / 2]);
+      paired[2 * i + 1] = HighPairs(rows[i], rows[i + kRows / 2]);
     }
     PairRows<kRounds - 1>(paired);
-    for (int i = 0; i < kSide; ++i) rows[i] = paired[i];
+    for (int i = 0; i < kRows; ++i) rows[i] = paired[i];
   }
 }
 
-// A square of as many units as a vector has lanes.
+// As many rows as fit the registers: 8 of 16 bytes, 8 of 8 pairs, 4 of 4 words.
 template <typename Lanes, int kUnit>
-void TransposeSquare(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch) {
-  constexpr int kSide = 16 / kUnit;
-  constexpr int kBits = kSide == 16 ? 4 : kSide == 8 ? 3 : 2;
-  Lanes rows[kSide];
-  for (int i = 0; i < kSide; ++i) memcpy(&rows[i], src + i * srcPitch, 16);
-  PairRows<kBits>(rows);
-  for (int i = 0; i < kSide; ++i) memcpy(dst + i * dstPitch, &rows[i], 16);
-}
+struct TransposedBlock {
+  static constexpr int kColumns = 16 / kUnit;
+  static constexpr int kRows = kUnit == 4 ? 4 : 8;
+
+  static void Write(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch) {
+    constexpr int kRun = kRows * kUnit;  // bytes of a column
+    Lanes rows[kRows];
+    for (int i = 0; i < kRows; ++i) memcpy(&rows[i], src + i * srcPitch, 16);
+    PairRows<(kRows == 8 ? 3 : 2)>(rows);
+    for (int i = 0; i < kColumns; ++i) {
+      const uint8_t* vector = reinterpret_cast<const uint8_t*>(&rows[i * kRun / 16]);
+      memcpy(dst + i * dstPitch, vector + i * kRun % 16, kRun);
+    }
+  }
+};
 
 template <typename Lanes, int kUnit>
-void TransposeSquares(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch,
-                      int rows, int columns) {
-  constexpr int kSide = 16 / kUnit;
-  const int wholeRows = rows / kSide * kSide;
-  const int wholeColumns = columns / kSide * kSide;
-  for (int i = 0; i < wholeColumns; i += kSide) {
-    for (int j = 0; j < wholeRows; j += kSide) {
-      TransposeSquare<Lanes, kUnit>(dst + i * dstPitch + j * kUnit, dstPitch,
-                                    src + j * srcPitch + i * kUnit, srcPitch);
+void TransposeBlocks(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch,
+                     int rows, int columns) {
+  using Block = TransposedBlock<Lanes, kUnit>;
+  const int wholeRows = rows / Block::kRows * Block::kRows;
+  const int wholeColumns = columns / Block::kColumns * Block::kColumns;
+  for (int i = 0; i < wholeColumns; i += Block::kColumns) {
+    for (int j = 0; j < wholeRows; j += Block::kRows) {
+      Block::Write(dst + i * dstPitch + j * kUnit, dstPitch, src + j * srcPitch + i * kUnit,
+                   srcPitch);
     }
   }
   TransposeUnits<kUnit>(dst + wholeRows * kUnit, dstPitch, src + wholeRows * srcPitch, srcPitch,
@@ -390,13 +398,13 @@ void Transpose(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t s
                int rows, int columns) {
   switch (unit) {
     case 1:
-      return TransposeSquares<Lanes1, 1>(dst, dstPitch, src, srcPitch, rows, columns);
+      return TransposeBlocks<Lanes1, 1>(dst, dstPitch, src, srcPitch, rows, columns);
     case 2:
-      return TransposeSquares<Lanes2, 2>(dst, dstPitch, src, srcPitch, rows, columns);
+      return TransposeBlocks<Lanes2, 2>(dst, dstPitch, src, srcPitch, rows, columns);
     case 3:
       return TransposeUnits<3>(dst, dstPitch, src, srcPitch, rows, columns);
     default:
-      return TransposeSquares<Lanes4, 4>(dst, dstPitch, src, srcPitch, rows, columns);
+      return TransposeBlocks<Lanes4, 4>(dst, dstPitch, src, srcPitch, rows, columns);
   }
 }
 
