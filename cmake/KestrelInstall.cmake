@@ -9,7 +9,12 @@ set(KESTREL_PUBLIC_HEADERS
   engine/format_codes.h
   engine/postprocess.h
   engine/records.h
-  jni/bitmap_buffers.h)
+  jni/bitmap_buffers.h
+  kernels/all_kernels.def
+  kernels/grey/kernels.def
+  kernels/kernels.h
+  kernels/planar_yuv/kernels.def
+  kernels/yuyv/kernels.def)
 
 foreach(header IN LISTS KESTREL_PUBLIC_HEADERS)
   get_filename_component(room "${header}" DIRECTORY)

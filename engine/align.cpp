@@ -34,8 +34,9 @@ MRECT SourceOf(const PassEngine& e, const MRECT& dst) {
   const int64_t offsetX = bilinear ? int64_t(e.stepX >> 1) - 32768 : 0;
   const int64_t offsetY = bilinear ? int64_t(e.stepY >> 1) - 32768 : 0;
   const int64_t extra = bilinear ? 3 : 1;
+  // A pixel of 31 bits and sign times a step of 32 bits just fits 64.
   const auto position = [](int64_t pixel, uint32_t step, int64_t offset) {
-    return (pixel * int64_t(step) + offset) >> 16;
+    return (SaturateToInt32(pixel) * int64_t(step) + offset) >> 16;
   };
   const auto clamp = [](int64_t value) { return SaturateToInt32(value < 0 ? 0 : value); };
   MRECT src = {clamp(position(dst.left, e.stepX, offsetX)),

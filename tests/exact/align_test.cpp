@@ -154,6 +154,20 @@ TEST(Align, NeedsOneRectangleThatIsAllZero) {
   }
 }
 
+// The farthest pixel times the greatest step just fits 64 bits; sanitizers watch.
+TEST(Align, OfTheFarthestPixelAtTheGreatestStep) {
+  const Engine engine({kGrey, 1, 1}, {kGrey, INT32_MAX, INT32_MAX});
+  MRECT dst = {INT32_MIN, INT32_MIN, INT32_MIN, INT32_MIN};
+  MRECT src = {};
+  EXPECT_EQ(MPPAlign(engine.handle(), &dst, &src), KESTREL_OK);
+  EXPECT_EQ(src, (MRECT{0, 0, 0, 0}));
+  dst = {INT32_MAX, INT32_MAX, INT32_MAX, INT32_MAX};
+  src = {};
+  EXPECT_EQ(MPPAlign(engine.handle(), &dst, &src), KESTREL_OK);
+  EXPECT_EQ(src.right, INT32_MAX);
+  EXPECT_EQ(src.bottom, INT32_MAX);
+}
+
 TEST(Align, NeedsAllArguments) {
   const Engine engine({kGrey, 60, 40}, {kGrey, 90, 80});
   MRECT dst = {1, 2, 3, 4};
