@@ -16,7 +16,7 @@ int32_t RoundUpToEven(int32_t value) {
 }  // namespace
 
 uint8_t* PlaneWriter::Start(int64_t column, int64_t row, int n) {
-  if (tiles_ && count_ > 0) return buffer_ + count_ * n_ * unit_;
+  if (tiles_ && count_ > 0) return buffer_ + ptrdiff_t{count_} * n_ * unit_;
   column_ = column;
   row_ = row;
   n_ = n;

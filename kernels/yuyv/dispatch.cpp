@@ -11,9 +11,10 @@ constexpr int kDeclined = -1;
 enum class Turn { kR90, kR180, kR270, kMirror, kSwap, kNone };
 
 Turn TurnOf(const EngineContext& c) {
-  if (c.swapXY != 0)
-    return c.mirrorX != 0 ? Turn::kR90 : c.mirrorY != 0 ? Turn::kR270 : Turn::kSwap;
-  if (c.mirrorX != 0) return c.mirrorY != 0 ? Turn::kR180 : Turn::kMirror;
+  const bool mirrorX = c.mirrorX != 0;
+  const bool mirrorY = c.mirrorY != 0;
+  if (c.swapXY != 0) return mirrorX ? Turn::kR90 : mirrorY ? Turn::kR270 : Turn::kSwap;
+  if (mirrorX) return mirrorY ? Turn::kR180 : Turn::kMirror;
   return Turn::kNone;
 }
 
