@@ -91,7 +91,6 @@ Destination::Destination(const Job& job)
       pixels_(DescribePixels(job.engine.dstFormat, job.engine.dstChannelSize,
                              job.engine.dstChannelPos)),
       hasChroma_(job.engine.dstLayout.code != CODE_RGB && job.engine.dstLayout.code != CODE_GRAY8),
-      writesPixels_(pixels_.bytes > 0),
       exchange_(!ExchangesLuma(job.engine.dstLayout.code) ? LumaExchange::kNone
                 : job.engine.swapXY != 0                  ? LumaExchange::kRows
                                                           : LumaExchange::kColumns) {
@@ -273,7 +272,7 @@ void Destination::PutRgb(int32_t r, const uint8_t* const rgb[3], const uint8_t* 
                          bool narrowed) {
   const int64_t row = int64_t(r) - job_.rect.top;
   const int n = pixelEnd_ - firstPixel_;
-  if (!writesPixels_ || n <= 0 || !planes_[0].rows.Contains(row)) return;
+  if (n <= 0 || !planes_[0].rows.Contains(row)) return;
   const uint8_t* const first[3] = {rgb[0] + firstPixel_, rgb[1] + firstPixel_,
                                    rgb[2] + firstPixel_};
   const int64_t column = int64_t(x_) + firstPixel_ - job_.rect.left;

@@ -148,7 +148,6 @@ class Destination {
   FieldShifts narrowedShifts_, fullShifts_;
   AlphaFill alphaFill_ = {~0u, 0};  // the engine's alpha, for sources that have none
   bool hasChroma_;
-  bool writesPixels_;
   LumaExchange exchange_;
   // Which pixel of a chroma block gives U and V: its last in loop order, or with pair chroma one
   // its first and the other its last, by their order in memory.

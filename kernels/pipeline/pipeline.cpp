@@ -144,8 +144,9 @@ class Pipeline {
     const int32_t bottom = job_.rect.bottom;
     while (top < bottom && !LocateRow(plane, top, &first)) ++top;
     if (top == bottom) return;
-    // Source rows never skip and never go back: when the ends are as far apart on both sides, so is
-    // every row between them.
+    // From one row to the next the source advances by one at most: when the ends are as far apart
+    // on both sides, so is every row between them. (Rows above the image read one further down, and
+    // with those the ends never are.)
     if (LocateRow(plane, bottom - 1, &last) &&
         last.source - first.source == last.destination - first.destination) {
       WriteBlock(plane, run, first, int(last.source - first.source) + 1);

@@ -278,6 +278,15 @@ INSTANTIATE_TEST_SUITE_P(Paths, AllocationFailure,
                                        : "Mode" + std::to_string(std::get<1>(param.param)));
                          });
 
+MBITMAP Descriptor(uint32_t code, int32_t width, int32_t height, TestImage& image) {
+  MBITMAP bitmap = {code, width, height, {}, {}};
+  for (int i = 0; i < 3; ++i) {
+    bitmap.pitch[i] = image.pitches()[i];
+    bitmap.plane[i] = image.planes()[i];
+  }
+  return bitmap;
+}
+
 class OneShotFailure : public testing::TestWithParam<Job> {};
 
 TEST_P(OneShotFailure, EachRequestFailsOnce) {
@@ -289,14 +298,8 @@ TEST_P(OneShotFailure, EachRequestFailsOnce) {
   TestImage source(srcShape, 24, 26, nullptr, true);
   TestImage destination(dstShape, 36, 20, nullptr, true);
   source.Fill(1);
-  MBITMAP src = {job.srcCode, 24, 26, {}, {}};
-  MBITMAP dst = {job.dstCode, 36, 20, {}, {}};
-  for (int i = 0; i < 3; ++i) {
-    src.pitch[i] = source.pitches()[i];
-    src.plane[i] = source.planes()[i];
-    dst.pitch[i] = destination.pitches()[i];
-    dst.plane[i] = destination.planes()[i];
-  }
+  MBITMAP src = Descriptor(job.srcCode, 24, 26, source);
+  MBITMAP dst = Descriptor(job.dstCode, 36, 20, destination);
   const MBITMAP srcBefore = src;
   const MBITMAP dstBefore = dst;
   const size_t liveBefore = tessel_double::LiveBlocks();
@@ -337,14 +340,8 @@ TEST_P(OneShotWithoutTables, NothingIsWritten) {
   TestImage source(srcShape, 24, 26, nullptr, true);
   TestImage destination(dstShape, 36, 20, nullptr, true);
   destination.Fill(2);
-  MBITMAP src = {job.srcCode, 24, 26, {}, {}};
-  MBITMAP dst = {job.dstCode, 36, 20, {}, {}};
-  for (int i = 0; i < 3; ++i) {
-    src.pitch[i] = source.pitches()[i];
-    src.plane[i] = source.planes()[i];
-    dst.pitch[i] = destination.pitches()[i];
-    dst.plane[i] = destination.planes()[i];
-  }
+  MBITMAP src = Descriptor(job.srcCode, 24, 26, source);
+  MBITMAP dst = Descriptor(job.dstCode, 36, 20, destination);
   tessel_double::Reset();
   tessel_double::FailSize(job.tableSize);
   EXPECT_EQ(ConvertCS(&src, &dst), KESTREL_OK);
