@@ -20,7 +20,7 @@ uint8_t* PlaneWriter::Start(int64_t column, int64_t row, int n) {
   column_ = column;
   row_ = row;
   n_ = n;
-  return !tiles_ && plane_.columnStep == unit_ ? plane_.At(column, row) : buffer_;
+  return inPlace() ? plane_.At(column, row) : buffer_;
 }
 
 void PlaneWriter::Finish() {
@@ -59,12 +59,7 @@ void PlaneWriter::WriteTransposed(int64_t column, int64_t row, const uint8_t* un
 void PlaneWriter::WriteBlock(int64_t column, int64_t row, const uint8_t* units, ptrdiff_t pitch,
                              int n, int runs) {
   if (tiles_) {
-    // In pieces that stay in the first-level cache on both sides.
-    constexpr int kPiece = 64;
-    for (int i = 0; i < runs; i += kPiece) {
-      const int piece = runs - i < kPiece ? runs - i : kPiece;
-      WriteTransposed(column, row + i, units + i * pitch, pitch, n, piece);
-    }
+    WriteTransposed(column, row, units, pitch, n, runs);
     return;
   }
   const size_t bytes = size_t(n) * size_t(unit_);
@@ -172,6 +167,30 @@ int64_t Destination::ChromaColumn(int32_t x) const {
   return DivideByFactor(x, factor) - DivideByFactor(left, factor);
 }
 
+// The last loop column of the job whose chroma goes to a column of the plane.
+int32_t Destination::LastXOfChroma(int64_t column) const {
+  const int64_t factor = engine_.dstSubsample[1];
+  const int64_t left = job_.rect.left;
+  const int64_t next = engine_.dstLayout.code == CODE_YUYV ? left + (column + 1) * factor
+                                                           : (left / factor + column + 1) * factor;
+  return int32_t(next < job_.rect.right ? next : job_.rect.right) - 1;
+}
+
+Destination::PlaneRun Destination::LumaRun() const {
+  int64_t first = 0;
+  int64_t end = int64_t(job_.rect.right) - job_.rect.left;
+  planes_[0].columns.Clip(&first, &end);
+  return {first, int32_t(end - first), int32_t(int64_t(job_.rect.left) + first),
+          int32_t(int64_t(job_.rect.left) + end - 1)};
+}
+
+Destination::PlaneRun Destination::ChromaRun() const {
+  int64_t first = 0;
+  int64_t end = ChromaColumn(job_.rect.right - 1) + 1;
+  planes_[1].columns.Clip(&first, &end);
+  return {first, int(end - first), LastXOfChroma(first), LastXOfChroma(end - 1)};
+}
+
 // Rows advance after each row whose successor starts a new block.
 int64_t Destination::ChromaRow(int32_t r) const {
   return BlockOfRow(r) - BlockOfRow(job_.rect.top);
@@ -193,24 +212,20 @@ bool Destination::WritesChroma(int32_t r, bool ofLastRow) const {
 void Destination::SelectColumns(int32_t x, int n) {
   x_ = x;
   n_ = n;
-  firstPixel_ = 0;
-  pixelEnd_ = n;
-  while (firstPixel_ < n &&
-         !planes_[0].columns.Contains(int64_t(x) + firstPixel_ - job_.rect.left)) {
-    ++firstPixel_;
-  }
-  while (pixelEnd_ > firstPixel_ &&
-         !planes_[0].columns.Contains(int64_t(x) + pixelEnd_ - 1 - job_.rect.left)) {
-    --pixelEnd_;
-  }
+  const int64_t column = int64_t(x) - job_.rect.left;
+  int64_t firstInside = column;
+  int64_t endInside = column + n;
+  planes_[0].columns.Clip(&firstInside, &endInside);
+  firstPixel_ = int(firstInside - column);
+  pixelEnd_ = int(endInside - column);
   chromaCount_ = 0;
   if (!hasChroma_) return;
   int first = 0;
   for (int i = 0; i < n; ++i) {
-    const int64_t column = ChromaColumn(x + i);
-    if (i + 1 < n && ChromaColumn(x + i + 1) == column) continue;
-    if (planes_[1].columns.Contains(column)) {
-      if (chromaCount_ == 0) firstChroma_ = column;
+    const int64_t chroma = ChromaColumn(x + i);
+    if (i + 1 < n && ChromaColumn(x + i + 1) == chroma) continue;
+    if (planes_[1].columns.Contains(chroma)) {
+      if (chromaCount_ == 0) firstChroma_ = chroma;
       uColumns_[chromaCount_] = x + (uOfLastColumn_ ? i : first);
       vColumns_[chromaCount_] = x + (vOfLastColumn_ ? i : first);
       ++chromaCount_;

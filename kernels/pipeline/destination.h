@@ -13,11 +13,17 @@ namespace kestrel {
 struct PlaneAxis {
   int64_t origin = 0;
   int32_t direction = 1;
-  int64_t limit = INT64_MAX;
+  int64_t limit = int64_t{1} << 40;  // none
 
   bool Contains(int64_t k) const {
     const int64_t coordinate = origin + direction * k;
     return coordinate >= 0 && coordinate < limit;
+  }
+  // Takes off what is outside at both ends of samples [*first, *end).
+  void Clip(int64_t* first, int64_t* end) const {
+    const int64_t inside = direction > 0 ? -origin : origin - limit + 1;
+    if (*first < inside) *first = inside;
+    if (*end > inside + limit) *end = inside + limit;
   }
 };
 
@@ -47,6 +53,8 @@ class PlaneWriter {
     rows_ = rows;
   }
   bool tiles() const { return tiles_; }
+  // Whether runs lie in memory as they are packed; Start then gives the destination itself.
+  bool inPlace() const { return !tiles_ && plane_.columnStep == unit_; }
   // Whether a run can join the tile as it stands.
   bool Fits(int64_t column, int64_t row, int n) const {
     return count_ == 0 ||
@@ -101,17 +109,16 @@ class Destination {
   // Either may be null.
   void PutChroma(int32_t r, const uint8_t* u, const uint8_t* v);
 
-  // Where whole planes are copied: plane 0, or chroma plane 1 or 2, or (with chroma pairs) the
-  // pairs as plane 1. Rows and columns count samples of the plane.
+  // Where whole planes are copied: samples [column, column + n) of plane 0, or of chroma plane 1 or
+  // 2, or (with chroma pairs) of the pairs as plane 1, and the loop columns that decide the first
+  // and the last of them. Rows and columns count samples of the plane.
   struct PlaneRun {
     int64_t column;
     int n;
+    int32_t firstX, lastX;
   };
-  PlaneRun LumaRun() const {
-    return {int64_t(x_) + firstPixel_ - job_.rect.left, pixelEnd_ - firstPixel_};
-  }
-  PlaneRun ChromaRun() const { return {firstChroma_, chromaCount_}; }
-  int firstPixel() const { return firstPixel_; }
+  PlaneRun LumaRun() const;
+  PlaneRun ChromaRun() const;
   bool ContainsLumaRow(int32_t r) const {
     return planes_[0].rows.Contains(int64_t(r) - job_.rect.top);
   }
@@ -133,6 +140,7 @@ class Destination {
 
   DestinationPlane Plane(int i) const;
   int64_t ChromaColumn(int32_t x) const;
+  int32_t LastXOfChroma(int64_t column) const;
   int64_t BlockOfRow(int64_t r) const;
   bool WritesChroma(int32_t r, bool ofLastRow) const;
   void MakeRoom(int writer, int64_t column, int64_t row, int n);

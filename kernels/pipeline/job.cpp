@@ -25,7 +25,8 @@ bool IsDrawable(const Job& job) {
 
 bool LacksTable(const Job& job) {
   const uint32_t path = job.engine.pathKind;
-  const bool reads = path == PATH_YUV_TO_RGB || path == PATH_RGB_TO_YUV || job.mapsLevels();
+  const bool reads = (path == PATH_YUV_TO_RGB && !job.has(kSixBitMatrix)) ||
+                     path == PATH_RGB_TO_YUV || job.mapsLevels();
   return reads && job.engine.table == nullptr;
 }
 

@@ -21,6 +21,11 @@ enum Quirk : uint32_t {
   kPairEdges = 1u << 2,        // the edge test is made for pairs of columns, not for each
   kSharedLowerLine = 1u << 3,  // a pair's second row blends toward the line after the first row
   kNoEdgeColumns = 1u << 4,    // columns outside dstRect are sampled like any other
+  kClampedCarry = 1u << 5,     // always dithers, by what the clamped 8-bit channels lose
+  kCarryIfAsked = 1u << 6,     // with clamped carry: only where the engine dithers
+  kNoDither = 1u << 7,         // truncates although the engine dithers
+  kNearestOnly = 1u << 8,      // never blends; columns corner-aligned, rows as the engine says
+  kSixBitMatrix = 1u << 9,     // YUV to RGB by factors of 6 fractional bits, never adjusted
   kYuyvPairs = kPairChroma | kNoLevelMap,
 };
 

@@ -15,7 +15,10 @@ class Pipeline {
         engine_(job.engine),
         source_(job),
         destination_(job),
-        dithers_(engine_.dither != 0 && engine_.pathKind == PATH_YUV_TO_RGB) {
+        clampedCarry_(job.has(kClampedCarry) && (engine_.dither != 0 || !job.has(kCarryIfAsked))),
+        dithers_(clampedCarry_ || (engine_.dither != 0 && engine_.pathKind == PATH_YUV_TO_RGB &&
+                                   !job.has(kNoDither))) {
+    PrepareCarry();
     PrepareSums();
   }
 
@@ -29,10 +32,10 @@ class Pipeline {
         }
       }
     } else {
+      CopyPlanes();
+      if (lumaDone_ && chromaDone_) return;
       for (int32_t x = job_.rect.left; x < job_.rect.right; x += destination_.stripWidth()) {
         SelectColumns(x);
-        CopyPlanes();
-        if (!ownsRows()) continue;
         for (int32_t r = job_.rect.top; r < job_.rect.bottom; ++r) ConvertRow(r);
         destination_.Flush();
       }
@@ -41,6 +44,14 @@ class Pipeline {
   }
 
  private:
+  using PlaneRun = Destination::PlaneRun;
+
+  // Where a loop row of a plane is on both sides.
+  struct PlaneRow {
+    int32_t source;
+    int64_t destination;
+  };
+
   int32_t Width() const { return job_.rect.right - job_.rect.left; }
   int StripWidth(int32_t x) const {
     const int32_t rest = job_.rect.right - x;
@@ -62,8 +73,19 @@ class Pipeline {
       wide_.offset[c] = s.offset[c];
       wide_.base[c] = s.indexBase[c];
       wide_.maximum[c] = s.maximum[c];
-      const uint32_t bits = engine_.dstChannelSize[c];
-      carry_.mask[c] = bits < 8 ? (1 << (8 - bits)) - 1 : 0;
+      if (clampedCarry_) {
+        wide_.narrowing[c] = 0;
+        wide_.base[c] = s.indexBase[c] << s.narrowing[c];
+        wide_.maximum[c] = 255;
+      }
+    }
+  }
+
+  void PrepareCarry() {
+    for (int c = 0; c < 3; ++c) {
+      const int32_t bits = int32_t(engine_.dstChannelSize[c]);
+      carryShifts_.right[c] = bits < 8 ? 8 - bits : 0;
+      carry_.mask[c] = (1 << carryShifts_.right[c]) - 1;
       carry_.remainder[c] = carry_.mask[c] >> 1;
     }
   }
@@ -86,46 +108,65 @@ class Pipeline {
     }
   }
 
-  // What is left for ConvertRow to do.
-  bool ownsRows() const { return !lumaDone_ || !chromaDone_; }
-
-  // Stored values at 1:1: planes whose samples correspond one to one on the two sides are copied as
-  // blocks of rows.
+  // Stored values at 1:1: planes whose samples correspond one to one on the two sides are copied,
+  // or their chroma interleaved or taken apart, in rows as wide as the job.
   void CopyPlanes() {
-    lumaDone_ = chromaDone_ = false;
     const bool unit = engine_.stepX == 0x10000 && engine_.stepY == 0x10000;
     if (!unit || engine_.pathKind != PATH_YUV_TO_YUV || job_.mapsLevels() ||
         job_.has(kPairChroma) || destination_.exchangesLuma()) {
       return;
     }
-    const Destination::PlaneRun luma = destination_.LumaRun();
-    if (source_.LumaInPlace(0) != nullptr) {
-      if (luma.n > 0) CopyPlane(0, luma);
-      lumaDone_ = true;
+    const PlaneRun luma = destination_.LumaRun();
+    if (luma.n > 0) {
+      if (!source_.LumaLiesInPlace(luma.firstX, luma.n)) return;
+      CopyPlane(0, luma);
     }
     // Chroma never comes before luma: one packed layout has both in the same byte.
-    if (!lumaDone_) return;
-    const Destination::PlaneRun chroma = destination_.ChromaRun();
-    chromaDone_ = !destination_.hasChroma() || chroma.n == 0;
-    const bool sameRows = engine_.srcSubsample[4] == engine_.dstSubsample[4];
-    if (chromaDone_ || !sameRows || engine_.srcLayout.code == CODE_GRAY8) return;
-    if (ChromaInPlace(1, 0) != nullptr) {
-      CopyPlane(1, chroma);
-      if (destination_.chromaPairs() == 0) CopyPlane(2, chroma);
-      chromaDone_ = true;
+    lumaDone_ = true;
+    chromaDone_ = !destination_.hasChroma();
+    // The block about column 0 is wider than the others.
+    if (!chromaDone_ && job_.rect.left >= 0) chromaDone_ = CopyChroma(destination_.ChromaRun());
+  }
+
+  bool CopyChroma(const PlaneRun& run) {
+    if (run.n <= 0) return true;
+    const bool sameFactors = engine_.srcSubsample[1] == engine_.dstSubsample[1] &&
+                             engine_.srcSubsample[4] == engine_.dstSubsample[4];
+    if (!sameFactors || engine_.srcLayout.code == CODE_GRAY8 ||
+        !source_.ChromaLiesInPlace(run.firstX, run.lastX, run.n)) {
+      return false;
+    }
+    const int from = source_.chromaPairs();
+    const int to = destination_.chromaPairs();
+    if (from == 0 && engine_.srcLayout.step[1] != 1) return false;
+    if (from == to) {
+      CopyPlane(from == 0 ? 1 : from, run);
+      if (from == 0) CopyPlane(2, run);
+      return true;
+    }
+    if (!destination_.writer(1).inPlace() || (to == 0 && !destination_.writer(2).inPlace())) {
+      return false;
+    }
+    for (int32_t r = job_.rect.top; r < job_.rect.bottom; ++r) {
+      PlaneRow row;
+      if (LocateRow(1, r, &row)) RearrangeChroma(run, row, from, to);
+    }
+    return true;
+  }
+
+  void RearrangeChroma(const PlaneRun& run, const PlaneRow& row, int from, int to) {
+    uint8_t* first = destination_.writer(1).Start(run.column, row.destination, run.n);
+    const uint8_t* pairs = source_.ChromaAt(from, run.firstX, row.source);
+    if (from != 0 && to != 0) {
+      rows_.swapPairs(first, pairs, run.n);
+    } else if (to == 0) {
+      uint8_t* second = destination_.writer(2).Start(run.column, row.destination, run.n);
+      rows_.deinterleave(from == 1 ? first : second, from == 1 ? second : first, pairs, run.n);
+    } else {
+      rows_.interleave(first, source_.ChromaAt(to, run.firstX, row.source),
+                       source_.ChromaAt(3 - to, run.firstX, row.source), run.n);
     }
   }
-
-  const uint8_t* ChromaInPlace(int plane, int32_t row) const {
-    const int pairs = destination_.chromaPairs();
-    return pairs != 0 ? source_.PairsInPlace(pairs, row) : source_.ChromaInPlace(plane, row);
-  }
-
-  // Where a loop row of a plane is on both sides.
-  struct PlaneRow {
-    int32_t source;
-    int64_t destination;
-  };
 
   // False for rows that write nothing to the plane.
   bool LocateRow(int plane, int32_t r, PlaneRow* row) const {
@@ -138,7 +179,7 @@ class Pipeline {
   }
 
   // Collects rows that follow each other on both sides and writes them as one block.
-  void CopyPlane(int plane, const Destination::PlaneRun& run) {
+  void CopyPlane(int plane, const PlaneRun& run) {
     PlaneRow first = {0, 0}, last = {0, 0};
     int32_t top = job_.rect.top;
     const int32_t bottom = job_.rect.bottom;
@@ -168,13 +209,14 @@ class Pipeline {
     if (count > 0) WriteBlock(plane, run, first, count);
   }
 
-  void WriteBlock(int plane, const Destination::PlaneRun& run, const PlaneRow& first, int rows) {
-    const uint8_t* start = plane == 0
-                               ? source_.LumaInPlace(first.source) + destination_.firstPixel()
-                               : ChromaInPlace(plane, first.source);
-    destination_.writer(plane).WriteBlock(run.column, first.destination, start,
-                                          source_.pitch(plane), run.n, rows);
+  void WriteBlock(int plane, const PlaneRun& run, const PlaneRow& first, int rows) {
+    const uint8_t* start = plane == 0 ? source_.LumaAt(run.firstX, first.source)
+                                      : source_.ChromaAt(plane, run.firstX, first.source);
+    // Chroma pairs are written as plane 1, whichever comes first.
+    PlaneWriter& writer = destination_.writer(plane == 2 && pairsWriter() ? 1 : plane);
+    writer.WriteBlock(run.column, first.destination, start, source_.pitch(plane), run.n, rows);
   }
+  bool pairsWriter() const { return destination_.chromaPairs() != 0; }
 
   void ConvertRow(int32_t r) {
     switch (engine_.pathKind) {
@@ -212,14 +254,21 @@ class Pipeline {
     const uint8_t* y = source_.Luma(r);
     const uint8_t* u = source_.U(r);
     const uint8_t* v = source_.V(r);
-    if (dithers_) {
+    bool narrowed = engine_.dstFormat.colourStandard == 16;
+    if (job_.has(kSixBitMatrix)) {
+      rows_.yuvToRgbSixBit(rgb, y, u, v, n_);
+      narrowed = false;
+    } else if (clampedCarry_) {
+      rows_.yuvToRgbWide(rgb, y, u, v, wide_, n_);
+      rows_.narrowWithCarry(rgb, rgb, carryShifts_, &carry_, n_);
+    } else if (dithers_) {
       rows_.yuvToRgbCarry(rgb, y, u, v, wide_, &carry_, n_);
     } else if (engine_.rgbSums.insideClampTable == 0) {
       rows_.yuvToRgbWide(rgb, y, u, v, wide_, n_);
     } else {
       YuvToRgbByTable(rgb, y, u, v);
     }
-    destination_.PutRgb(r, rgb, nullptr, engine_.dstFormat.colourStandard == 16);
+    destination_.PutRgb(r, rgb, nullptr, narrowed);
   }
 
   void YuvToRgbByTable(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u,
@@ -228,8 +277,13 @@ class Pipeline {
   }
 
   void RgbToRgb(int32_t r) {
-    const RgbRun run = source_.Rgb(r);
-    destination_.PutRgb(r, run.channel, run.alpha, false);
+    RgbRun run = source_.Rgb(r);
+    if (clampedCarry_) {
+      uint8_t* const rgb[3] = {channels_[0], channels_[1], channels_[2]};
+      rows_.narrowWithCarry(rgb, run.channel, carryShifts_, &carry_, n_);
+      for (int c = 0; c < 3; ++c) run.channel[c] = rgb[c];
+    }
+    destination_.PutRgb(r, run.channel, run.alpha, clampedCarry_);
   }
 
   void RgbToYuv(int32_t r) {
@@ -259,12 +313,13 @@ class Pipeline {
   const EngineContext& engine_;
   Source source_;
   Destination destination_;
-  bool dithers_;
+  bool clampedCarry_, dithers_;
   YuvToRgbTable table_ = {};
   YuvToRgbWide wide_ = {};
   Carry carry_ = {};
+  FieldShifts carryShifts_ = {};
   int n_ = 0;
-  bool lumaDone_ = false, chromaDone_ = false;   // of the selected columns, by CopyPlanes
+  bool lumaDone_ = false, chromaDone_ = false;   // by CopyPlanes
   int32_t uColumns_[kStrip], vColumns_[kStrip];  // loop columns, or columns of the strip
   uint8_t channels_[3][kStrip];
   uint8_t luma_[kStrip], u_[kStrip], v_[kStrip];

@@ -18,6 +18,8 @@ class ColumnPositions {
  public:
   explicit ColumnPositions(const Job& job);
   Taps At(int32_t x) const;
+  // Whether each of the n columns from x reads the source column after its predecessor's.
+  bool Advance(int32_t x, int32_t n) const;
 
  private:
   int64_t start_, step_;

@@ -62,20 +62,33 @@ void Source::SelectChroma(const int32_t* uColumns, const int32_t* vColumns, int 
   chromaV_.Finish(n);
 }
 
-const uint8_t* Source::LumaInPlace(int32_t row) const {
-  return first_.contiguous && first_.step == 1 ? RowStart(0, row) + first_.offset[0] : nullptr;
+bool Source::LumaLiesInPlace(int32_t x, int32_t n) const {
+  return first_.step == 1 && !swappedLuma_ && columnPositions_.Advance(x, n);
 }
 
-const uint8_t* Source::ChromaInPlace(int plane, int32_t row) const {
-  const bool sideBySide = chromaU_.contiguous && chromaU_.step == 1;
-  return sideBySide ? RowStart(plane, row) + chromaU_.offset[0] : nullptr;
+bool Source::ChromaLiesInPlace(int32_t firstX, int32_t lastX, int32_t n) const {
+  // Then from block to block the source advances by one sample at most.
+  return columnPositions_.Advance(firstX, lastX - firstX + 1) &&
+         ChromaColumn(lastX) - ChromaColumn(firstX) == n - 1;
 }
 
-const uint8_t* Source::PairsInPlace(int first, int32_t row) const {
-  const bool pairs = chromaU_.contiguous && chromaU_.step == 2 &&
-                     job_.srcPlanes[3 - first] - job_.srcPlanes[first] == 1 &&
-                     job_.srcPitches[1] == job_.srcPitches[2];
-  return pairs ? RowStart(first, row) + chromaU_.offset[0] : nullptr;
+int32_t Source::ChromaColumn(int32_t x) const {
+  return columnPositions_.At(x).first / int32_t(job_.engine.srcSubsample[1]);
+}
+
+int Source::chromaPairs() const {
+  const ptrdiff_t apart = job_.srcPlanes[2] - job_.srcPlanes[1];
+  const bool pairs =
+      chromaU_.step == 2 && (apart == 1 || apart == -1) && job_.srcPitches[1] == job_.srcPitches[2];
+  return !pairs ? 0 : apart == 1 ? 1 : 2;
+}
+
+const uint8_t* Source::LumaAt(int32_t x, int32_t row) const {
+  return RowStart(0, row) + columnPositions_.At(x).first;
+}
+
+const uint8_t* Source::ChromaAt(int plane, int32_t x, int32_t row) const {
+  return RowStart(plane, row) + ChromaColumn(x) * chromaU_.step;
 }
 
 const uint8_t* Source::ReadSamples(uint8_t* buffer, const uint8_t* row,

@@ -34,11 +34,15 @@ class Source {
   // Selects the loop columns whose U and V are wanted.
   void SelectChroma(const int32_t* uColumns, const int32_t* vColumns, int n);
 
-  // For copying whole planes: where the selected samples of a source row start when they lie side
-  // by side as they are wanted; null when they do not. Pairs are U and V, `first` (1 or 2) first.
-  const uint8_t* LumaInPlace(int32_t row) const;
-  const uint8_t* ChromaInPlace(int plane, int32_t row) const;
-  const uint8_t* PairsInPlace(int first, int32_t row) const;
+  // For copying whole planes. Whether the luma of n loop columns from x lies side by side in a
+  // source row, and the chroma of n loop columns that are a block apart, from the first to the
+  // last.
+  bool LumaLiesInPlace(int32_t x, int32_t n) const;
+  bool ChromaLiesInPlace(int32_t firstX, int32_t lastX, int32_t n) const;
+  // 1 or 2 when chroma lies in pairs: the component that comes first.
+  int chromaPairs() const;
+  const uint8_t* LumaAt(int32_t x, int32_t row) const;
+  const uint8_t* ChromaAt(int plane, int32_t x, int32_t row) const;
   int32_t SourceRow(int32_t r, uint32_t factor) const { return rowPositions_.At(r, factor).first; }
   ptrdiff_t pitch(int plane) const { return job_.srcPitches[plane]; }
 
@@ -64,6 +68,7 @@ class Source {
   const uint8_t* ReadSamples(uint8_t* buffer, const uint8_t* row,
                              const SampleColumns& columns) const;
   void ReadPixels(uint8_t* const rgb[3], const uint8_t* row, const SampleColumns& columns);
+  int32_t ChromaColumn(int32_t x) const;
   const uint8_t* Chroma(int plane, int32_t r, const SampleColumns& columns, uint8_t* buffer);
   void FillLumaLine(Line* line, int32_t row);
   void FillRgbLine(Line* line, int32_t row);

@@ -89,12 +89,21 @@ struct KestrelRowOps {
                        const kestrel::YuvToRgbWide& sums, int n);
   void (*yuvToRgbCarry)(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u, const uint8_t* v,
                         const kestrel::YuvToRgbWide& sums, kestrel::Carry* carry, int n);
+  // By factors of six fractional bits, for full range BT.601, never adjusted:
+  //   R = Y + ((90 V - 11485) >> 6), G = Y + ((8669 - 46 V - 22 U) >> 6),
+  //   B = Y + ((113 U - 14516) >> 6), each clamped to 0..255.
+  void (*yuvToRgbSixBit)(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u,
+                         const uint8_t* v, int n);
   // Y with tables 0..2, U with 3..5, V with 5..7: `tables` is the first of the three.
   void (*rgbToYuv)(uint8_t* dst, const uint8_t* const rgb[3], kestrel::RgbToYuvTables tables,
                    int n);
   // dst[i] = map[src[i]].
   void (*mapLevels)(uint8_t* dst, const uint8_t* src, const uint8_t* map, int n);
 
+  // Channels of 8 bits to fields, carrying what narrowing drops into the next pixel:
+  // sum = src + remainder, dst = min(sum, 255) >> shift, remainder = sum & mask.
+  void (*narrowWithCarry)(uint8_t* const dst[3], const uint8_t* const src[3],
+                          const kestrel::FieldShifts& shifts, kestrel::Carry* carry, int n);
   // Channels to packed pixels.
   void (*packRgb)(uint8_t* dst, const uint8_t* const rgb[3], const kestrel::PixelFormat& format,
                   const kestrel::FieldShifts& shifts, kestrel::AlphaFill alpha, int n);
@@ -102,8 +111,10 @@ struct KestrelRowOps {
   void (*putAlpha)(uint8_t* pixels, const uint8_t* alpha, const kestrel::PixelFormat& format,
                    int n);
 
-  // dst[2 * i] = a[i], dst[2 * i + 1] = b[i].
+  // dst[2 * i] = a[i], dst[2 * i + 1] = b[i]; the reverse; and pairs with their halves exchanged.
   void (*interleave)(uint8_t* dst, const uint8_t* a, const uint8_t* b, int n);
+  void (*deinterleave)(uint8_t* a, uint8_t* b, const uint8_t* src, int n);
+  void (*swapPairs)(uint8_t* dst, const uint8_t* src, int n);
   // Unit i of row j of the source becomes unit j of row i of the destination; units of 1..4 bytes.
   void (*transpose)(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch,
                     int unit, int rows, int columns);

@@ -197,6 +197,35 @@ void YuvToRgbCarry(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u, co
   }
 }
 
+uint8_t ClampToByte(int32_t value) {
+  return uint8_t(value < 0 ? 0 : value > 255 ? 255 : value);
+}
+
+void YuvToRgbBySixBits(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u, const uint8_t* v,
+                       int n) {
+  uint8_t* const red = rgb[0];
+  uint8_t* const green = rgb[1];
+  uint8_t* const blue = rgb[2];
+  for (int i = 0; i < n; ++i) {
+    red[i] = ClampToByte(y[i] + ((90 * v[i] - 11485) >> 6));
+    green[i] = ClampToByte(y[i] + ((8669 - 46 * v[i] - 22 * u[i]) >> 6));
+    blue[i] = ClampToByte(y[i] + ((113 * u[i] - 14516) >> 6));
+  }
+}
+
+void NarrowWithCarry(uint8_t* const dst[3], const uint8_t* const src[3], const FieldShifts& shifts,
+                     Carry* carry, int n) {
+  for (int c = 0; c < 3; ++c) {
+    int32_t remainder = carry->remainder[c];
+    for (int i = 0; i < n; ++i) {
+      const int32_t sum = src[c][i] + remainder;
+      dst[c][i] = uint8_t((sum > 255 ? 255 : sum) >> shifts.right[c]);
+      remainder = sum & carry->mask[c];
+    }
+    carry->remainder[c] = remainder;
+  }
+}
+
 void RgbToYuv(uint8_t* dst, const uint8_t* const rgb[3], RgbToYuvTables tables, int n) {
   const uint8_t* const red = rgb[0];
   const uint8_t* const green = rgb[1];
@@ -307,6 +336,21 @@ void Interleave(uint8_t* dst, const uint8_t* a, const uint8_t* b, int n) {
   }
 }
 
+void Deinterleave(uint8_t* a, uint8_t* b, const uint8_t* src, int n) {
+  for (int i = 0; i < n; ++i) {
+    a[i] = src[2 * i];
+    b[i] = src[2 * i + 1];
+  }
+}
+
+void SwapPairs(uint8_t* dst, const uint8_t* src, int n) {
+  for (int i = 0; i < n; ++i) {
+    const uint8_t first = src[2 * i];
+    dst[2 * i] = src[2 * i + 1];
+    dst[2 * i + 1] = first;
+  }
+}
+
 template <int kBytes>
 void TransposeUnits(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch,
                     int rows, int columns) {
@@ -321,6 +365,7 @@ void TransposeUnits(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdif
 using Lanes1 = uint8_t __attribute__((vector_size(16)));
 using Lanes2 = uint16_t __attribute__((vector_size(16)));
 using Lanes4 = uint32_t __attribute__((vector_size(16)));
+using Lanes8 = uint64_t __attribute__((vector_size(16)));
 
 Lanes1 LowPairs(Lanes1 a, Lanes1 b) {
   return __builtin_shufflevector(a, b, 0, 16, 1, 17, 2, 18, 3, 19, 4, 20, 5, 21, 6, 22, 7, 23);
@@ -341,6 +386,12 @@ Lanes4 LowPairs(Lanes4 a, Lanes4 b) {
 Lanes4 HighPairs(Lanes4 a, Lanes4 b) {
   return __builtin_shufflevector(a, b, 2, 6, 3, 7);
 }
+Lanes8 LowPairs(Lanes8 a, Lanes8 b) {
+  return __builtin_shufflevector(a, b, 0, 2);
+}
+Lanes8 HighPairs(Lanes8 a, Lanes8 b) {
+  return __builtin_shufflevector(a, b, 1, 3);
+}
 
 // Pairs rows i and i + half. Each round turns the highest bit of a unit's row number into the
 // lowest of its place within the row; after as many rounds as there are bits, the units of a column
@@ -358,63 +409,101 @@ inline __attribute__((always_inline)) void PairRows(Lanes (&rows)[kRows]) {
   }
 }
 
-// As many rows as fit the registers: 8 of 16 bytes, 8 of 8 pairs, 4 of 4 words.
+template <typename Lanes, int kRows>
+inline __attribute__((always_inline)) void LoadPaired(Lanes (&rows)[kRows], const uint8_t* src,
+                                                      ptrdiff_t srcPitch) {
+  for (int i = 0; i < kRows; ++i) memcpy(&rows[i], src + i * srcPitch, sizeof(Lanes));
+  PairRows<(kRows == 8 ? 3 : 2)>(rows);
+}
+
+// A square of 16 bytes by as many rows as make 16 bytes of a column.
 template <typename Lanes, int kUnit>
-struct TransposedBlock {
-  static constexpr int kColumns = 16 / kUnit;
-  static constexpr int kRows = kUnit == 4 ? 4 : 8;
+struct TransposedSquare {
+  static constexpr int kSide = 16 / kUnit;
 
   static void Write(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch) {
-    constexpr int kRun = kRows * kUnit;  // bytes of a column
-    Lanes rows[kRows];
-    for (int i = 0; i < kRows; ++i) memcpy(&rows[i], src + i * srcPitch, 16);
-    PairRows<(kRows == 8 ? 3 : 2)>(rows);
-    for (int i = 0; i < kColumns; ++i) {
-      const uint8_t* vector = reinterpret_cast<const uint8_t*>(&rows[i * kRun / 16]);
-      memcpy(dst + i * dstPitch, vector + i * kRun % 16, kRun);
+    Lanes rows[kSide];
+    LoadPaired(rows, src, srcPitch);
+    for (int i = 0; i < kSide; ++i) memcpy(dst + i * dstPitch, &rows[i], 16);
+  }
+};
+
+// Sixteen rows do not fit the registers: two halves of eight, joined column by column.
+template <>
+struct TransposedSquare<Lanes1, 1> {
+  static constexpr int kSide = 16;
+
+  static void Write(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch) {
+    Lanes1 upper[8], lower[8];
+    LoadPaired(upper, src, srcPitch);
+    LoadPaired(lower, src + 8 * srcPitch, srcPitch);
+    for (int i = 0; i < 8; ++i) {
+      const Lanes8 even = LowPairs(Lanes8(upper[i]), Lanes8(lower[i]));
+      const Lanes8 odd = HighPairs(Lanes8(upper[i]), Lanes8(lower[i]));
+      memcpy(dst + 2 * i * dstPitch, &even, 16);
+      memcpy(dst + (2 * i + 1) * dstPitch, &odd, 16);
     }
   }
 };
 
+// In blocks whose columns fill a cache line of the destination each; the line after it is asked for
+// early, because stores to lines that are far away are what this waits for. The last squares reach
+// back over their neighbours, which gives the same bytes again.
 template <typename Lanes, int kUnit>
-void TransposeBlocks(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch,
-                     int rows, int columns) {
-  using Block = TransposedBlock<Lanes, kUnit>;
-  const int wholeRows = rows / Block::kRows * Block::kRows;
-  const int wholeColumns = columns / Block::kColumns * Block::kColumns;
-  for (int i = 0; i < wholeColumns; i += Block::kColumns) {
-    for (int j = 0; j < wholeRows; j += Block::kRows) {
-      Block::Write(dst + i * dstPitch + j * kUnit, dstPitch, src + j * srcPitch + i * kUnit,
-                   srcPitch);
+void TransposeSquares(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch,
+                      int rows, int columns) {
+  using Square = TransposedSquare<Lanes, kUnit>;
+  constexpr int kLine = 64 / kUnit;
+  const int lastRow = rows - Square::kSide;
+  const int lastColumn = columns - Square::kSide;
+  if (lastRow < 0 || lastColumn < 0) {
+    return TransposeUnits<kUnit>(dst, dstPitch, src, srcPitch, rows, columns);
+  }
+  for (int top = 0; top < rows; top += kLine) {
+    const int bottom = top + kLine < rows ? top + kLine : rows;
+    for (int i = 0; i < columns; i += Square::kSide) {
+      const int column = i < lastColumn ? i : lastColumn;
+      uint8_t* const out = dst + column * dstPitch;
+      for (int k = 0; k < Square::kSide; ++k) {
+        __builtin_prefetch(out + k * dstPitch + bottom * kUnit, 1);
+      }
+      for (int j = top; j < bottom; j += Square::kSide) {
+        const int row = j < lastRow ? j : lastRow;
+        Square::Write(out + row * kUnit, dstPitch, src + row * srcPitch + column * kUnit, srcPitch);
+      }
     }
   }
-  TransposeUnits<kUnit>(dst + wholeRows * kUnit, dstPitch, src + wholeRows * srcPitch, srcPitch,
-                        rows - wholeRows, wholeColumns);
-  TransposeUnits<kUnit>(dst + wholeColumns * dstPitch, dstPitch, src + wholeColumns * kUnit,
-                        srcPitch, rows, columns - wholeColumns);
 }
 
 void Transpose(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch, int unit,
                int rows, int columns) {
   switch (unit) {
     case 1:
-      return TransposeBlocks<Lanes1, 1>(dst, dstPitch, src, srcPitch, rows, columns);
+      return TransposeSquares<Lanes1, 1>(dst, dstPitch, src, srcPitch, rows, columns);
     case 2:
-      return TransposeBlocks<Lanes2, 2>(dst, dstPitch, src, srcPitch, rows, columns);
+      return TransposeSquares<Lanes2, 2>(dst, dstPitch, src, srcPitch, rows, columns);
     case 3:
       return TransposeUnits<3>(dst, dstPitch, src, srcPitch, rows, columns);
     default:
-      return TransposeBlocks<Lanes4, 4>(dst, dstPitch, src, srcPitch, rows, columns);
+      return TransposeSquares<Lanes4, 4>(dst, dstPitch, src, srcPitch, rows, columns);
   }
 }
 
 }  // namespace
 
 const RowOps kScalarRows = {
-    ReadStrided,   Gather,      GatherPixels,  BlendColumns, BlendRows,
-    UnpackRgb,     UnpackAlpha, UnpackIndexed, YuvToRgb,     YuvToRgbByWideSums,
-    YuvToRgbCarry, RgbToYuv,    MapLevels,     PackRgb,      PutAlpha,
-    Interleave,    Transpose,   WriteStrided,  WritePixels,
+    ReadStrided,     Gather,
+    GatherPixels,    BlendColumns,
+    BlendRows,       UnpackRgb,
+    UnpackAlpha,     UnpackIndexed,
+    YuvToRgb,        YuvToRgbByWideSums,
+    YuvToRgbCarry,   YuvToRgbBySixBits,
+    RgbToYuv,        MapLevels,
+    NarrowWithCarry, PackRgb,
+    PutAlpha,        Interleave,
+    Deinterleave,    SwapPairs,
+    Transpose,       WriteStrided,
+    WritePixels,
 };
 
 const RowOps* SelectRowOps() {
