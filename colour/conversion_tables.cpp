@@ -172,6 +172,7 @@ void BuildLevelTable(EngineContext* c) {
   const int32_t chromaGain = AdjustGain(map.chromaGain, p.contrast, p.saturation, 1);
   const int32_t chromaOffset =
       AdjustOffset(map.chromaOffset, p.contrast, p.saturation, map.chromaGain);
+  c->levelSums = {{lumaGain, chromaGain}, {lumaOffset + kHalf, chromaOffset + kHalf}};
   if (AllocateTable(c, kLevelBlockSize) == nullptr) return;
   uint8_t* levels = static_cast<uint8_t*>(c->table);
   for (int64_t i = 0; i < 256; ++i) {

@@ -69,6 +69,12 @@ typedef struct YuvToRgbSums {
   uint32_t insideClampTable; /* no colour can leave the clamp tables: plain table reads are exact */
 } YuvToRgbSums;
 
+/* YUV to YUV levels: value -> (value * gain + offset) >> 16, clamped; for luma and for chroma. */
+typedef struct LevelSums {
+  int32_t gain[2];
+  int32_t offset[2];
+} LevelSums;
+
 struct KestrelRowOps;
 
 /* The engine context: sixth argument of every kernel. Flags are 0 or nonzero. */
@@ -126,6 +132,7 @@ typedef struct EngineContext {
   int32_t srcReadRight;  /* source samples are read from 0 up to these limits only */
   int32_t srcReadBottom;
   YuvToRgbSums rgbSums;             /* valid for PATH_YUV_TO_RGB */
+  LevelSums levelSums;              /* valid where needsLevelTable is set */
   const struct KestrelRowOps* rows; /* row operations of the chosen instruction set */
 } EngineContext;
 

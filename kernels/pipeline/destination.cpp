@@ -15,7 +15,8 @@ int32_t RoundUpToEven(int32_t value) {
 
 }  // namespace
 
-uint8_t* PlaneWriter::Start(int64_t column, int64_t row, int n) {
+uint8_t* PlaneWriter::Start(int64_t column, int64_t row, int n, int runs) {
+  started_ = runs;
   if (tiles_ && count_ > 0) return buffer_ + ptrdiff_t{count_} * n_ * unit_;
   column_ = column;
   row_ = row;
@@ -25,9 +26,12 @@ uint8_t* PlaneWriter::Start(int64_t column, int64_t row, int n) {
 
 void PlaneWriter::Finish() {
   if (tiles_) {
-    ++count_;
-  } else if (plane_.columnStep != unit_) {
-    rows_->writePixels(plane_.At(column_, row_), plane_.columnStep, buffer_, unit_, n_);
+    count_ += started_;
+  } else if (!inPlace()) {
+    for (int i = 0; i < started_; ++i) {
+      rows_->writePixels(plane_.At(column_, row_ + i), plane_.columnStep,
+                         buffer_ + ptrdiff_t{i} * n_ * unit_, unit_, n_);
+    }
   }
 }
 
@@ -96,16 +100,18 @@ Destination::Destination(const Job& job)
   for (int i = 0; i < 3; ++i) planes_[i] = Plane(i);
   const bool tiles = engine_.swapXY != 0 && exchange_ == LumaExchange::kNone;
   const bool rgb = engine_.dstLayout.code == CODE_RGB;
-  writers_[0].Set(planes_[0], rgb ? pixels_.bytes : 1, tiles, &rows_);
+  // A plane of YUV takes a quarter of what pixels may take, chroma pairs two quarters.
+  constexpr int kPlane = PlaneWriter::kTileSize;
+  writers_[0].Set(planes_[0], rgb ? pixels_.bytes : 1, tiles, buffer_, &rows_);
   const ptrdiff_t apart = planes_[2].start - planes_[1].start;
   if (engine_.dstLayout.planeCount == 3 && (apart == 1 || apart == -1) &&
       engine_.dstPlaneFactors[1] == 2 && planes_[1].rowStep == planes_[2].rowStep &&
       planes_[1].columnStep == planes_[2].columnStep) {
     chromaPairs_ = apart == 1 ? 1 : 2;
-    writers_[1].Set(planes_[chromaPairs_], 2, tiles, &rows_);
+    writers_[1].Set(planes_[chromaPairs_], 2, tiles, buffer_ + kPlane, &rows_);
   } else {
-    writers_[1].Set(planes_[1], 1, tiles, &rows_);
-    writers_[2].Set(planes_[2], 1, tiles, &rows_);
+    writers_[1].Set(planes_[1], 1, tiles, buffer_ + kPlane, &rows_);
+    writers_[2].Set(planes_[2], 1, tiles, buffer_ + 2 * kPlane, &rows_);
   }
   if (job.has(kPairChroma)) {
     // A mirrored walk meets the pixel that is first in memory last.
@@ -240,8 +246,8 @@ void Destination::Flush() {
   for (PlaneWriter& writer : writers_) writer.Flush();
 }
 
-void Destination::MakeRoom(int writer, int64_t column, int64_t row, int n) {
-  if (writers_[writer].tiles() && !writers_[writer].Fits(column, row, n)) Flush();
+void Destination::MakeRoom(int writer, int64_t column, int64_t row, int n, int runs) {
+  if (writers_[writer].tiles() && !writers_[writer].Fits(column, row, n, runs)) Flush();
 }
 
 void Destination::PutLuma(int32_t r, const uint8_t* luma) {
@@ -283,21 +289,29 @@ void Destination::PutChroma(int32_t r, const uint8_t* u, const uint8_t* v) {
   }
 }
 
-void Destination::PutRgb(int32_t r, const uint8_t* const rgb[3], const uint8_t* alpha,
-                         bool narrowed) {
+Destination::PixelRun Destination::StartPixels(int32_t r, int rows) {
   const int64_t row = int64_t(r) - job_.rect.top;
   const int n = pixelEnd_ - firstPixel_;
-  if (n <= 0 || !planes_[0].rows.Contains(row)) return;
-  const uint8_t* const first[3] = {rgb[0] + firstPixel_, rgb[1] + firstPixel_,
-                                   rgb[2] + firstPixel_};
+  const bool inside =
+      n > 0 && planes_[0].rows.Contains(row) && planes_[0].rows.Contains(row + rows - 1);
+  if (!inside) return {nullptr, 0, 0, 0};
   const int64_t column = int64_t(x_) + firstPixel_ - job_.rect.left;
-  MakeRoom(0, column, row, n);
-  uint8_t* const pixels = writers_[0].Start(column, row, n);
-  rows_.packRgb(pixels, first, pixels_, narrowed ? narrowedShifts_ : fullShifts_, alphaFill_, n);
+  MakeRoom(0, column, row, n, rows);
+  uint8_t* const pixels = writers_[0].Start(column, row, n, rows);
+  return {pixels, writers_[0].startedPitch(), firstPixel_, n};
+}
+
+void Destination::PutRgb(int32_t r, const uint8_t* const rgb[3], const uint8_t* alpha,
+                         bool narrowed) {
+  const PixelRun run = StartPixels(r, 1);
+  if (run.pixels == nullptr) return;
+  const uint8_t* const first[3] = {rgb[0] + run.first, rgb[1] + run.first, rgb[2] + run.first};
+  rows_.packRgb(run.pixels, first, pixels_, narrowed ? narrowedShifts_ : fullShifts_, alphaFill_,
+                run.n);
   if (alpha != nullptr && pixels_.alphaByte >= 0) {
-    rows_.putAlpha(pixels, alpha + firstPixel_, pixels_, n);
+    rows_.putAlpha(run.pixels, alpha + run.first, pixels_, run.n);
   }
-  writers_[0].Finish();
+  FinishPixels();
 }
 
 }  // namespace kestrel

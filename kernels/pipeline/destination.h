@@ -46,23 +46,29 @@ class PlaneWriter {
   static constexpr int kTileColumns = 64;
   static constexpr int kTileRows = 32;
 
-  void Set(const DestinationPlane& plane, int unit, bool tiles, const RowOps* rows) {
+  static constexpr int kTileSize = kTileColumns * kTileRows;  // units
+
+  // `buffer` is for one tile, or two runs of a strip.
+  void Set(const DestinationPlane& plane, int unit, bool tiles, uint8_t* buffer,
+           const RowOps* rows) {
     plane_ = plane;
     unit_ = unit;
     tiles_ = tiles;
+    buffer_ = buffer;
     rows_ = rows;
   }
   bool tiles() const { return tiles_; }
   // Whether runs lie in memory as they are packed; Start then gives the destination itself.
   bool inPlace() const { return !tiles_ && plane_.columnStep == unit_; }
-  // Whether a run can join the tile as it stands.
-  bool Fits(int64_t column, int64_t row, int n) const {
+  // Whether runs can join the tile as it stands.
+  bool Fits(int64_t column, int64_t row, int n, int runs = 1) const {
     return count_ == 0 ||
-           (count_ < kTileRows && column == column_ && n == n_ && row == row_ + count_);
+           (count_ + runs <= kTileRows && column == column_ && n == n_ && row == row_ + count_);
   }
 
-  // Memory for a run of n units; the run is written by the Finish that follows.
-  uint8_t* Start(int64_t column, int64_t row, int n);
+  // Memory for one or two runs of n units; they are written by the Finish that follows.
+  uint8_t* Start(int64_t column, int64_t row, int n, int runs = 1);
+  ptrdiff_t startedPitch() const { return inPlace() ? plane_.rowStep : ptrdiff_t{n_} * unit_; }
   void Finish();
   // The same for bytes that exist already.
   void Write(int64_t column, int64_t row, const uint8_t* bytes, int n);
@@ -83,8 +89,9 @@ class PlaneWriter {
   bool tiles_ = false;
   int64_t column_ = 0, row_ = 0;  // of the tile's first run, or of the run that was started
   int n_ = 0;
-  int count_ = 0;  // runs in the tile
-  uint8_t buffer_[4 * kTileColumns * kTileRows];
+  int started_ = 0;  // runs
+  int count_ = 0;    // runs in the tile
+  uint8_t* buffer_ = nullptr;
 };
 
 class Destination {
@@ -128,7 +135,19 @@ class Destination {
   bool exchangesLuma() const { return exchange_ != LumaExchange::kNone; }
   PlaneWriter& writer(int plane) { return writers_[plane]; }
 
-  // RGB. `narrowed`: the channels are as wide as their fields already. `alpha` is null unless the
+  // RGB. Memory for the pixels of one or two rows; null when they are outside the image. The
+  // pixels are those of strip columns [first, first + n).
+  struct PixelRun {
+    uint8_t* pixels;
+    ptrdiff_t pitch;
+    int first, n;
+  };
+  PixelRun StartPixels(int32_t r, int rows);
+  void FinishPixels() { writers_[0].Finish(); }
+  const PixelFormat& pixelFormat() const { return pixels_; }
+  AlphaFill alphaFill() const { return alphaFill_; }
+
+  // `narrowed`: the channels are as wide as their fields already. `alpha` is null unless the
   // source has one.
   void PutRgb(int32_t r, const uint8_t* const rgb[3], const uint8_t* alpha, bool narrowed);
 
@@ -143,7 +162,7 @@ class Destination {
   int32_t LastXOfChroma(int64_t column) const;
   int64_t BlockOfRow(int64_t r) const;
   bool WritesChroma(int32_t r, bool ofLastRow) const;
-  void MakeRoom(int writer, int64_t column, int64_t row, int n);
+  void MakeRoom(int writer, int64_t column, int64_t row, int n, int runs = 1);
   void PutChromaPlane(int plane, int32_t r, const uint8_t* samples);
 
   const Job& job_;
@@ -168,6 +187,7 @@ class Destination {
   int64_t firstChroma_ = 0;                      // plane column of the first chroma sample
   int32_t uColumns_[kStrip], vColumns_[kStrip];  // loop columns
   int firstPixel_ = 0, pixelEnd_ = 0;            // columns of the strip that are inside plane 0
+  uint8_t buffer_[4 * PlaneWriter::kTileSize];   // of all writers; planes of YUV share it
 };
 
 }  // namespace kestrel

@@ -28,7 +28,7 @@ class Pipeline {
       for (int32_t r = job_.rect.top; r < job_.rect.bottom; ++r) {
         for (int32_t x = job_.rect.left; x < job_.rect.right; x += destination_.stripWidth()) {
           if (r == job_.rect.top || StripWidth(job_.rect.left) < Width()) SelectColumns(x);
-          ConvertRow(r);
+          ConvertRows(r);
         }
       }
     } else {
@@ -36,7 +36,7 @@ class Pipeline {
       if (lumaDone_ && chromaDone_) return;
       for (int32_t x = job_.rect.left; x < job_.rect.right; x += destination_.stripWidth()) {
         SelectColumns(x);
-        for (int32_t r = job_.rect.top; r < job_.rect.bottom; ++r) ConvertRow(r);
+        for (int32_t r = job_.rect.top; r < job_.rect.bottom;) r += ConvertRows(r);
         destination_.Flush();
       }
     }
@@ -63,20 +63,26 @@ class Pipeline {
     if (engine_.pathKind != PATH_YUV_TO_RGB) return;
     const YuvToRgbSums& s = engine_.rgbSums;
     const uint32_t* words = static_cast<const uint32_t*>(engine_.table);
-    wide_ = {s.yGain, s.vToR, s.vToG, s.uToG, s.uToB, {}, {}, {}, {}};
-    table_.clamp = static_cast<const uint8_t*>(engine_.table);
-    table_.u = words + engine_.tableOffsets[0];
-    table_.v = words + engine_.tableOffsets[1];
-    table_.y = words + engine_.tableOffsets[2];
+    colour_.form = job_.has(kSixBitMatrix)   ? YuvToRgbForm::kSixBits
+                   : s.insideClampTable == 0 ? YuvToRgbForm::kWide
+                   : s.yGain == 65536        ? YuvToRgbForm::kWholeLuma
+                                             : YuvToRgbForm::kTable;
+    YuvToRgbTable& table = colour_.table;
+    YuvToRgbWide& wide = colour_.wide;
+    wide = {s.yGain, s.vToR, s.vToG, s.uToG, s.uToB, {}, {}, {}, {}};
+    table.clamp = static_cast<const uint8_t*>(engine_.table);
+    table.u = words + engine_.tableOffsets[0];
+    table.v = words + engine_.tableOffsets[1];
+    table.y = words + engine_.tableOffsets[2];
     for (int c = 0; c < 3; ++c) {
-      table_.narrowing[c] = wide_.narrowing[c] = s.narrowing[c];
-      wide_.offset[c] = s.offset[c];
-      wide_.base[c] = s.indexBase[c];
-      wide_.maximum[c] = s.maximum[c];
+      table.narrowing[c] = wide.narrowing[c] = s.narrowing[c];
+      wide.offset[c] = s.offset[c];
+      wide.base[c] = s.indexBase[c];
+      wide.maximum[c] = s.maximum[c];
       if (clampedCarry_) {
-        wide_.narrowing[c] = 0;
-        wide_.base[c] = s.indexBase[c] << s.narrowing[c];
-        wide_.maximum[c] = 255;
+        wide.narrowing[c] = 0;
+        wide.base[c] = s.indexBase[c] << s.narrowing[c];
+        wide.maximum[c] = 255;
       }
     }
   }
@@ -94,9 +100,11 @@ class Pipeline {
     n_ = StripWidth(x);
     source_.SelectColumns(x, n_);
     destination_.SelectColumns(x, n_);
-    if (engine_.pathKind == PATH_YUV_TO_RGB) {
+    if (engine_.pathKind == PATH_YUV_TO_RGB && dithers_) {
       for (int i = 0; i < n_; ++i) uColumns_[i] = x + i;
       source_.SelectChroma(uColumns_, uColumns_, n_);
+    } else if (engine_.pathKind == PATH_YUV_TO_RGB) {
+      source_.SelectPixelChroma(x, n_);
     } else if (engine_.pathKind == PATH_YUV_TO_YUV) {
       source_.SelectChroma(destination_.uColumns(), destination_.vColumns(),
                            destination_.chromaCount());
@@ -218,23 +226,32 @@ class Pipeline {
   }
   bool pairsWriter() const { return destination_.chromaPairs() != 0; }
 
-  void ConvertRow(int32_t r) {
+  // The number of rows done, from r on.
+  int ConvertRows(int32_t r) {
     switch (engine_.pathKind) {
       case PATH_YUV_TO_YUV:
-        return YuvToYuv(r);
+        YuvToYuv(r);
+        return 1;
       case PATH_YUV_TO_RGB:
-        return YuvToRgb(r);
+        if (!dithers_) return YuvToRgb(r);
+        YuvToRgbDithered(r);
+        return 1;
       case PATH_RGB_TO_RGB:
-        return RgbToRgb(r);
+        RgbToRgb(r);
+        return 1;
       default:
-        return RgbToYuv(r);
+        RgbToYuv(r);
+        return 1;
     }
   }
 
   const uint8_t* MapLevels(uint8_t* buffer, const uint8_t* run, int map, int n) const {
     if (!job_.mapsLevels()) return run;
-    rows_.mapLevels(buffer, run, static_cast<const uint8_t*>(engine_.table) + ptrdiff_t{256} * map,
-                    n);
+    const uint8_t* maps = static_cast<const uint8_t*>(engine_.table);
+    rows_.mapLevels(
+        buffer, run,
+        {maps + ptrdiff_t{256} * map, engine_.levelSums.gain[map], engine_.levelSums.offset[map]},
+        n);
     return buffer;
   }
 
@@ -249,31 +266,54 @@ class Pipeline {
     destination_.PutChroma(r, u, v);
   }
 
-  void YuvToRgb(int32_t r) {
+  void YuvToRgbDithered(int32_t r) {
     uint8_t* const rgb[3] = {channels_[0], channels_[1], channels_[2]};
     const uint8_t* y = source_.Luma(r);
     const uint8_t* u = source_.U(r);
     const uint8_t* v = source_.V(r);
-    bool narrowed = engine_.dstFormat.colourStandard == 16;
-    if (job_.has(kSixBitMatrix)) {
-      rows_.yuvToRgbSixBit(rgb, y, u, v, n_);
-      narrowed = false;
-    } else if (clampedCarry_) {
-      rows_.yuvToRgbWide(rgb, y, u, v, wide_, n_);
+    if (clampedCarry_) {
+      rows_.yuvToRgbWide(rgb, y, u, v, colour_.wide, n_);
       rows_.narrowWithCarry(rgb, rgb, carryShifts_, &carry_, n_);
-    } else if (dithers_) {
-      rows_.yuvToRgbCarry(rgb, y, u, v, wide_, &carry_, n_);
-    } else if (engine_.rgbSums.insideClampTable == 0) {
-      rows_.yuvToRgbWide(rgb, y, u, v, wide_, n_);
     } else {
-      YuvToRgbByTable(rgb, y, u, v);
+      rows_.yuvToRgbCarry(rgb, y, u, v, colour_.wide, &carry_, n_);
     }
-    destination_.PutRgb(r, rgb, nullptr, narrowed);
+    destination_.PutRgb(r, rgb, nullptr, engine_.dstFormat.colourStandard == 16);
   }
 
-  void YuvToRgbByTable(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u,
-                       const uint8_t* v) {
-    rows_.yuvToRgb(rgb, y, u, v, table_, n_);
+  // The number of rows done. At 1:1 two rows often share a row of chroma, and half of the work on
+  // chroma is saved.
+  int YuvToRgb(int32_t r) {
+    const uint8_t* y = source_.LumaInPlace(r);
+    if (y != nullptr && r + 1 < job_.rect.bottom && engine_.srcSubsample[4] == 2 &&
+        source_.SourceRow(r, 2) == source_.SourceRow(r + 1, 2)) {
+      const uint8_t* below = source_.LumaInPlace(r + 1);
+      if (below != nullptr && ConvertPixels(r, y, below - y, 2)) return 2;
+    }
+    ConvertPixels(r, y != nullptr ? y : source_.Luma(r), 0, 1);
+    return 1;
+  }
+
+  // False when there is no room for the rows.
+  bool ConvertPixels(int32_t r, const uint8_t* y, ptrdiff_t yPitch, int rows) {
+    const Destination::PixelRun run = destination_.StartPixels(r, rows);
+    if (run.pixels == nullptr) return false;
+    const PixelChroma chroma = source_.ChromaOfPixels(r);
+    const PixelFormat& format = destination_.pixelFormat();
+    // A run may begin with the second of two pixels that share a sample.
+    int i = 0;
+    while (i < run.n) {
+      const int column = run.first + i + chroma.phase;
+      const int n = (column & chroma.run.shift) != 0 ? 1 : run.n - i;
+      const ptrdiff_t sample = ptrdiff_t{column >> chroma.run.shift} * chroma.run.step;
+      const ChromaRun part = {chroma.run.u + sample, chroma.run.v + sample, chroma.run.shift,
+                              chroma.run.step};
+      rows_.yuvToPixels(
+          {run.pixels + ptrdiff_t{i} * format.bytes, run.pitch, y + run.first + i, yPitch, rows},
+          part, colour_, format, destination_.alphaFill(), n);
+      i += n;
+    }
+    destination_.FinishPixels();
+    return true;
   }
 
   void RgbToRgb(int32_t r) {
@@ -314,8 +354,7 @@ class Pipeline {
   Source source_;
   Destination destination_;
   bool clampedCarry_, dithers_;
-  YuvToRgbTable table_ = {};
-  YuvToRgbWide wide_ = {};
+  kestrel::YuvToRgb colour_ = {};
   Carry carry_ = {};
   FieldShifts carryShifts_ = {};
   int n_ = 0;

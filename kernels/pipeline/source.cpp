@@ -17,6 +17,15 @@ void SampleColumns::Finish(int count) {
   for (int i = 1; i < n && contiguous; ++i) contiguous = offset[i] - offset[i - 1] == step;
 }
 
+void SampleColumns::Plan(const RowOps& rows) {
+  if (contiguous) return;
+  plan.n = n / 2;
+  plan.first = offset;
+  plan.second = offset + 1;
+  plan.stride = 2;
+  rows.planPairs(&plan);
+}
+
 Source::Source(const Job& job)
     : job_(job),
       rows_(job.rows()),
@@ -50,6 +59,18 @@ void Source::SelectColumns(int32_t x, int n) {
   first_.Finish(n);
   second_.Finish(n);
   lines_[0].row = lines_[1].row = -1;
+  // Pixels of RGB are gathered whole.
+  if (job_.engine.srcLayout.code == CODE_RGB) return;
+  if (!interpolates_) {
+    first_.Plan(rows_);
+  } else {
+    blend_.n = n;
+    blend_.first = first_.offset;
+    blend_.second = second_.offset;
+    blend_.stride = 1;
+    blend_.weights = weights_;
+    rows_.planPairs(&blend_);
+  }
 }
 
 void Source::SelectChroma(const int32_t* uColumns, const int32_t* vColumns, int n) {
@@ -58,8 +79,70 @@ void Source::SelectChroma(const int32_t* uColumns, const int32_t* vColumns, int 
     chromaU_.Set(i, columnPositions_.At(uColumns[i]).first / factor);
     chromaV_.Set(i, columnPositions_.At(vColumns[i]).first / factor);
   }
-  chromaU_.Finish(n);
-  chromaV_.Finish(n);
+  SampleColumns* const both[] = {&chromaU_, &chromaV_};
+  for (SampleColumns* columns : both) {
+    columns->Finish(n);
+    columns->Plan(rows_);
+  }
+}
+
+void Source::SelectPixelChroma(int32_t x, int n) {
+  const PlaneLayout& layout = job_.engine.srcLayout;
+  const uint32_t factor = job_.engine.srcSubsample[1];
+  phase_ = shift_ = 0;
+  chromaCount_ = n;
+  if (layout.code == CODE_GRAY8) return;
+  const ptrdiff_t vFromU = job_.srcPlanes[2] - job_.srcPlanes[1];
+  if (factor <= 2 && columnPositions_.Advance(x, n)) {
+    const int32_t column = columnPositions_.At(x).first;
+    shift_ = int(factor) - 1;
+    phase_ = column & shift_;
+    chromaCount_ = ((n - 1 + phase_) >> shift_) + 1;
+    chromaU_.offset[0] = int32_t((column >> shift_) * chromaU_.step);
+    const bool inPlace = chromaU_.step == 1 || chromaPairs() != 0;
+    pixelChroma_ = inPlace ? PixelChromaRead::kInPlace : PixelChromaRead::kStrided;
+    return;
+  }
+  for (int i = 0; i < n; ++i) {
+    chromaU_.Set(i, columnPositions_.At(x + i).first / int32_t(factor));
+  }
+  // Samples of both components in one group of bytes: one plan reads them in turn.
+  const bool grouped =
+      vFromU < chromaU_.step && -vFromU < chromaU_.step && job_.srcPitches[1] == job_.srcPitches[2];
+  if (grouped) {
+    pixelChroma_ = PixelChromaRead::kPairs;
+    for (int i = 0; i < n; ++i) chromaV_.offset[i] = chromaU_.offset[i] + int32_t(vFromU);
+    chromaU_.plan.n = n;
+    chromaU_.plan.first = chromaU_.offset;
+    chromaU_.plan.second = chromaV_.offset;
+    chromaU_.plan.stride = 1;
+    rows_.planPairs(&chromaU_.plan);
+  } else {
+    pixelChroma_ = PixelChromaRead::kGathered;
+    chromaU_.Finish(n);
+    chromaU_.Plan(rows_);
+  }
+}
+
+PixelChroma Source::ChromaOfPixels(int32_t r) {
+  if (pixelChroma_ == PixelChromaRead::kGrey) return {{u_, v_, 0, 1}, 0};
+  const int32_t row = rowPositions_.At(r, job_.engine.srcSubsample[4]).first;
+  const uint8_t* const u = RowStart(1, row);
+  const uint8_t* const v = RowStart(2, row);
+  const int32_t start = chromaU_.offset[0];
+  switch (pixelChroma_) {
+    case PixelChromaRead::kInPlace:
+      return {{u + start, v + start, shift_, int32_t(chromaU_.step)}, phase_};
+    case PixelChromaRead::kStrided:
+      rows_.readStrided(u_, u + start, chromaU_.step, chromaCount_);
+      rows_.readStrided(v_, v + start, chromaU_.step, chromaCount_);
+      return {{u_, v_, shift_, 1}, phase_};
+    case PixelChromaRead::kPairs:
+      rows_.readPairs(packed_, u, chromaU_.plan);
+      return {{packed_, packed_ + 1, 0, 2}, 0};
+    default:
+      return {{ReadSamples(u_, u, chromaU_), ReadSamples(v_, v, chromaU_), 0, 1}, 0};
+  }
 }
 
 bool Source::LumaLiesInPlace(int32_t x, int32_t n) const {
@@ -91,10 +174,18 @@ const uint8_t* Source::ChromaAt(int plane, int32_t x, int32_t row) const {
   return RowStart(plane, row) + ChromaColumn(x) * chromaU_.step;
 }
 
+const uint8_t* Source::LumaInPlace(int32_t r) const {
+  const Taps taps = rowPositions_.At(r, 1);
+  const bool inPlace = first_.contiguous && first_.step == 1 && !interpolates_ &&
+                       (taps.weight == 0 || taps.first == taps.second);
+  return inPlace ? RowStart(0, taps.first) + first_.offset[0] : nullptr;
+}
+
 const uint8_t* Source::ReadSamples(uint8_t* buffer, const uint8_t* row,
                                    const SampleColumns& columns) const {
   if (!columns.contiguous) {
-    rows_.gather(buffer, row, columns.offset, columns.n);
+    rows_.readPairs(buffer, row, columns.plan);
+    if (columns.n % 2 != 0) buffer[columns.n - 1] = row[columns.offset[columns.n - 1]];
     return buffer;
   }
   const uint8_t* start = row + columns.offset[0];
@@ -117,11 +208,12 @@ void Source::ReadPixels(uint8_t* const rgb[3], const uint8_t* row, const SampleC
 
 void Source::FillLumaLine(Line* line, int32_t row) {
   const uint8_t* start = RowStart(0, row);
-  line->channel[0] = ReadSamples(line->samples[0], start, first_);
-  if (!interpolates_) return;
-  const uint8_t* second = ReadSamples(scratch_[0], start, second_);
-  rows_.blendColumns(line->samples[0], line->channel[0], second, weights_, first_.n);
-  line->channel[0] = line->samples[0];
+  if (interpolates_) {
+    rows_.blendPairs(line->samples[0], start, blend_);
+    line->channel[0] = line->samples[0];
+  } else {
+    line->channel[0] = ReadSamples(line->samples[0], start, first_);
+  }
 }
 
 void Source::FillRgbLine(Line* line, int32_t row) {

@@ -14,15 +14,23 @@ struct SampleColumns {
   ptrdiff_t step = 1;       // bytes between neighbouring samples of the row
   bool contiguous = false;  // offsets rise by exactly `step`
   int32_t offset[kStrip];   // bytes from the start of the row
+  PairPlan plan;            // of neighbouring columns; for ReadSamples, unless contiguous
 
   void Set(int i, int64_t sample) { offset[i] = int32_t(sample * step); }
   void Finish(int count);
+  void Plan(const RowOps& rows);
 };
 
 // A run of channel values; points into the strip's buffers or straight into the source.
 struct RgbRun {
   const uint8_t* channel[3];
   const uint8_t* alpha;  // null unless the source has an alpha byte
+};
+
+// Chroma for the pixels of a strip: pixel i has sample (i + phase) >> run.shift.
+struct PixelChroma {
+  ChromaRun run;
+  int phase;
 };
 
 class Source {
@@ -33,6 +41,9 @@ class Source {
   void SelectColumns(int32_t x, int n);
   // Selects the loop columns whose U and V are wanted.
   void SelectChroma(const int32_t* uColumns, const int32_t* vColumns, int n);
+
+  // Selects the chroma of loop columns [x, x + n), for ChromaOfPixels.
+  void SelectPixelChroma(int32_t x, int n);
 
   // For copying whole planes. Whether the luma of n loop columns from x lies side by side in a
   // source row, and the chroma of n loop columns that are a block apart, from the first to the
@@ -51,6 +62,9 @@ class Source {
   const uint8_t* U(int32_t r);
   const uint8_t* V(int32_t r);
   RgbRun Rgb(int32_t r);
+  PixelChroma ChromaOfPixels(int32_t r);
+  // Where the luma of the strip lies in the source as it is wanted; null when it does not.
+  const uint8_t* LumaInPlace(int32_t r) const;
 
  private:
   // The two source lines, already filtered horizontally, that rows are blended from. An enlarged
@@ -86,11 +100,18 @@ class Source {
   bool swappedLuma_;
   bool interpolates_ = false;  // some column of the strip has a weight
 
+  // How chroma of pixels is had: the same for every pixel, or lying in the source side by side, or
+  // in both components' samples with a step, or with both in one plan of pairs, or one by one.
+  enum class PixelChromaRead { kGrey, kInPlace, kStrided, kPairs, kGathered };
+
   SampleColumns first_, second_, chromaU_, chromaV_;
   uint16_t weights_[kStrip];
+  PairPlan blend_;  // of first_ and second_, where the strip interpolates
+  PixelChromaRead pixelChroma_ = PixelChromaRead::kGrey;
+  int chromaCount_ = 0, phase_ = 0, shift_ = 0;
   Line lines_[2];
   uint8_t scratch_[3][kStrip];  // second taps
-  uint8_t packed_[4 * kStrip];  // gathered pixels
+  uint8_t packed_[4 * kStrip];  // gathered pixels, or pairs of chroma samples
   uint8_t blended_[3][kStrip];
   uint8_t u_[kStrip], v_[kStrip];
 };

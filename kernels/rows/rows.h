@@ -49,25 +49,84 @@ struct YuvToRgbWide {
   int32_t maximum[3];
 };
 
+// How YUV becomes RGB, decided once per engine.
+enum class YuvToRgbForm : uint8_t {
+  kWide,       // sums can leave the clamp tables: in numbers that cannot wrap
+  kTable,      // by table reads, or by sums of 16 bits
+  kWholeLuma,  // the same with a luma gain of exactly 65536: luma adds no fraction to the sums
+  kSixBits,    // by factors of six fractional bits, see yuvToRgbSixBit
+};
+
+struct YuvToRgb {
+  YuvToRgbForm form;
+  YuvToRgbTable table;
+  YuvToRgbWide wide;
+};
+
+// Chroma along a run: pixel i has sample (i >> shift) * step of each.
+struct ChromaRun {
+  const uint8_t* u;
+  const uint8_t* v;
+  int32_t shift;  // 0 or 1
+  int32_t step;   // 1, or 2 where samples of U and V take turns: then one is beside the other
+};
+
+// One or two rows of luma that share a row of chroma, and what becomes of them.
+struct PixelRows {
+  uint8_t* dst;
+  ptrdiff_t dstPitch;
+  const uint8_t* y;
+  ptrdiff_t yPitch;
+  int rows;
+};
+
+// A map of levels, and the numbers that it is made of: map[i] = (i * gain + offset) >> 16, clamped.
+struct LevelMap {
+  const uint8_t* map;
+  int32_t gain;
+  int32_t offset;
+};
+
+// For each of n pairs of bytes where they come from, and what an instruction set prepares of that
+// for itself. The lists are the caller's: byte offsets from the start of a row.
+struct PairPlan {
+  static constexpr int kMost = 512;
+  int n;
+  const int32_t* first;  // of pair i: first[i * stride], second[i * stride]
+  const int32_t* second;
+  int stride;
+  const uint16_t* weights;    // for blendPairs: a weight for each pair
+  int32_t window[kMost / 4];  // for each four pairs a window of 16 bytes, and where in it they are
+  uint8_t shuffle[kMost / 4][8];
+};
+
 // Error carry of 16-bit RGB: the bits that narrowing drops are added to the next pixel's index.
 struct Carry {
   int32_t mask[3];
   int32_t remainder[3];
 };
 
-// RGB to YUV: eight tables of 256 words; channel = (sum of three) >> 16.
+// RGB to YUV: eight tables of 256 words, each a straight line; channel = (sum of three) >> 16.
 using RgbToYuvTables = const int32_t (*)[256];
 
 }  // namespace kestrel
 
 // One per instruction set. Global because engine contexts, plain C records, point at one.
 struct KestrelRowOps {
+  const char* name;  // of the instruction set
+
   // dst[i] = src[i * step], step 1..4.
   void (*readStrided)(uint8_t* dst, const uint8_t* src, ptrdiff_t step, int n);
   // dst[i] = src[offsets[i]].
   void (*gather)(uint8_t* dst, const uint8_t* src, const int32_t* offsets, int n);
   // Pixels of `bytes` bytes at src + offsets[i], packed together.
   void (*gatherPixels)(uint8_t* dst, const uint8_t* src, const int32_t* offsets, int bytes, int n);
+  // Prepares a plan whose n (at most kMost) and lists are set.
+  void (*planPairs)(kestrel::PairPlan* plan);
+  // The first and second bytes of pairs in turn.
+  void (*readPairs)(uint8_t* dst, const uint8_t* src, const kestrel::PairPlan& plan);
+  // Pair i blended by weights[i]: as blendColumns.
+  void (*blendPairs)(uint8_t* dst, const uint8_t* src, const kestrel::PairPlan& plan);
   // a + floor((b - a) * weight / 65536): a weight for each column, or one for the whole row.
   void (*blendColumns)(uint8_t* dst, const uint8_t* a, const uint8_t* b, const uint16_t* weights,
                        int n);
@@ -94,11 +153,14 @@ struct KestrelRowOps {
   //   B = Y + ((113 U - 14516) >> 6), each clamped to 0..255.
   void (*yuvToRgbSixBit)(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u,
                          const uint8_t* v, int n);
+  // Whole packed pixels, one or two rows that share chroma.
+  void (*yuvToPixels)(const kestrel::PixelRows& rows, const kestrel::ChromaRun& chroma,
+                      const kestrel::YuvToRgb& colour, const kestrel::PixelFormat& format,
+                      kestrel::AlphaFill alpha, int n);
   // Y with tables 0..2, U with 3..5, V with 5..7: `tables` is the first of the three.
   void (*rgbToYuv)(uint8_t* dst, const uint8_t* const rgb[3], kestrel::RgbToYuvTables tables,
                    int n);
-  // dst[i] = map[src[i]].
-  void (*mapLevels)(uint8_t* dst, const uint8_t* src, const uint8_t* map, int n);
+  void (*mapLevels)(uint8_t* dst, const uint8_t* src, const kestrel::LevelMap& levels, int n);
 
   // Channels of 8 bits to fields, carrying what narrowing drops into the next pixel:
   // sum = src + remainder, dst = min(sum, 255) >> shift, remainder = sum & mask.
@@ -128,6 +190,19 @@ namespace kestrel {
 using RowOps = KestrelRowOps;
 
 extern const RowOps kScalarRows;
+#if defined(__x86_64__)
+extern const RowOps kSse41Rows;
+extern const RowOps kAvx2Rows;
+#elif defined(__ARM_NEON)
+extern const RowOps kNeonRows;
+#endif
+
+// The tables that this CPU can run, the fastest first and the scalar one last; null after that.
+constexpr int kMostRowOps = 3;
+struct RowOpsList {
+  const RowOps* ops[kMostRowOps + 1];
+};
+RowOpsList AvailableRowOps();
 
 }  // namespace kestrel
 

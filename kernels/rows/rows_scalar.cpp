@@ -1,13 +1,12 @@
 // The reference version of every row operation.
-#include <string.h>
+#include "kernels/rows/rows_scalar.h"
 
-#include "engine/engine_internal.h"
-#include "kernels/rows/rows.h"
+#include <string.h>
 
 static_assert(__BYTE_ORDER__ == __ORDER_LITTLE_ENDIAN__, "packed pixels are stored as words");
 
 namespace kestrel {
-namespace {
+namespace scalar {
 
 // A step that the compiler knows makes a loop of vector shuffles.
 template <ptrdiff_t kStep>
@@ -53,7 +52,7 @@ void GatherPixels(uint8_t* dst, const uint8_t* src, const int32_t* offsets, int 
 }
 
 // The result lies between a and b: always a byte.
-uint8_t Blend(int32_t a, int32_t b, int32_t weight) {
+static uint8_t Blend(int32_t a, int32_t b, int32_t weight) {
   return uint8_t((a * 65536 + weight * (b - a)) >> 16);
 }
 
@@ -64,6 +63,30 @@ void BlendColumns(uint8_t* dst, const uint8_t* a, const uint8_t* b, const uint16
 
 void BlendRows(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t weight, int n) {
   for (int i = 0; i < n; ++i) dst[i] = Blend(a[i], b[i], int32_t(weight));
+}
+
+void PlanPairs(PairPlan*) {}
+
+void ReadSomePairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan, int i, int end) {
+  for (; i < end; ++i) {
+    dst[2 * i] = src[plan.first[i * plan.stride]];
+    dst[2 * i + 1] = src[plan.second[i * plan.stride]];
+  }
+}
+
+void ReadPairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan) {
+  ReadSomePairs(dst, src, plan, 0, plan.n);
+}
+
+void BlendSomePairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan, int i, int end) {
+  for (; i < end; ++i) {
+    dst[i] =
+        Blend(src[plan.first[i * plan.stride]], src[plan.second[i * plan.stride]], plan.weights[i]);
+  }
+}
+
+void BlendPairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan) {
+  BlendSomePairs(dst, src, plan, 0, plan.n);
 }
 
 // Pixels are little-endian words, as every CPU this library is built for is.
@@ -79,7 +102,7 @@ void StorePixel(uint8_t* p, uint32_t pixel) {
   memcpy(p, &pixel, kBytes);
 }
 
-uint8_t TopBits(uint32_t pixel, uint32_t position, uint32_t size) {
+static uint8_t TopBits(uint32_t pixel, uint32_t position, uint32_t size) {
   return size == 0 ? uint8_t{0} : uint8_t(((pixel >> position) << (32 - size)) >> 24);
 }
 
@@ -137,8 +160,8 @@ void UnpackIndexed(uint8_t* const rgb[3], const uint8_t* row, const int32_t* col
   }
 }
 
-void YuvToRgb(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u, const uint8_t* v,
-              const YuvToRgbTable& table, int n) {
+void YuvToRgbByTable(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u, const uint8_t* v,
+                     const YuvToRgbTable& table, int n) {
   // Copies, because a stored byte could be anything's as far as the compiler knows.
   uint8_t* const red = rgb[0];
   uint8_t* const green = rgb[1];
@@ -161,7 +184,7 @@ struct Indices {
   int32_t channel[3];
 };
 
-Indices WideIndices(const YuvToRgbWide& s, int32_t y, int32_t u, int32_t v) {
+static Indices WideIndices(const YuvToRgbWide& s, int32_t y, int32_t u, int32_t v) {
   const int64_t luma = int64_t(y) * s.yGain * 16;
   const int64_t vRed = (s.offset[0] + v * s.vToR) >> 12;
   const int64_t vGreen = (s.offset[1] + v * s.vToG) >> 12;
@@ -172,7 +195,7 @@ Indices WideIndices(const YuvToRgbWide& s, int32_t y, int32_t u, int32_t v) {
            int32_t((uBlue * 65536 + (uGreen & 0xFFFF) + luma) >> 20)}};
 }
 
-uint8_t Narrow(const YuvToRgbWide& s, int channel, int32_t index) {
+static uint8_t Narrow(const YuvToRgbWide& s, int channel, int32_t index) {
   const int32_t value = (index >> s.narrowing[channel]) - s.base[channel];
   return uint8_t(value < 0 ? 0 : value > s.maximum[channel] ? s.maximum[channel] : value);
 }
@@ -197,7 +220,7 @@ void YuvToRgbCarry(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u, co
   }
 }
 
-uint8_t ClampToByte(int32_t value) {
+static uint8_t ClampToByte(int32_t value) {
   return uint8_t(value < 0 ? 0 : value > 255 ? 255 : value);
 }
 
@@ -235,8 +258,8 @@ void RgbToYuv(uint8_t* dst, const uint8_t* const rgb[3], RgbToYuvTables tables, 
   }
 }
 
-void MapLevels(uint8_t* dst, const uint8_t* src, const uint8_t* map, int n) {
-  for (int i = 0; i < n; ++i) dst[i] = map[src[i]];
+void MapLevels(uint8_t* dst, const uint8_t* src, const LevelMap& levels, int n) {
+  for (int i = 0; i < n; ++i) dst[i] = levels.map[src[i]];
 }
 
 template <int kBytes>
@@ -282,6 +305,44 @@ void PackRgb(uint8_t* dst, const uint8_t* const rgb[3], const PixelFormat& forma
     default:
       return format.wholeBytes ? PackBytes<4>(dst, rgb, format, alpha, n)
                                : PackFields<4>(dst, rgb, format, shifts, alpha, n);
+  }
+}
+
+// Channels of a few pixels, then the pixels: a scalar CPU gains nothing from fusing the two.
+void YuvToPixels(const PixelRows& rows, const ChromaRun& chroma, const YuvToRgb& colour,
+                 const PixelFormat& format, AlphaFill alpha, int n) {
+  constexpr int kPiece = 64;
+  uint8_t u[kPiece], v[kPiece], channels[3][kPiece];
+  uint8_t* const rgb[3] = {channels[0], channels[1], channels[2]};
+  FieldShifts shifts;
+  for (int c = 0; c < 3; ++c) {
+    const int32_t drop = 8 - int32_t(format.size[c]);
+    const bool narrowed = format.bytes == 2 && colour.form != YuvToRgbForm::kSixBits;
+    shifts.right[c] = narrowed && drop > 0 ? 0 : drop;
+  }
+  for (int x = 0; x < n; x += kPiece) {
+    const int count = n - x < kPiece ? n - x : kPiece;
+    for (int i = 0; i < count; ++i) {
+      const int sample = ((x + i) >> chroma.shift) * chroma.step;
+      u[i] = chroma.u[sample];
+      v[i] = chroma.v[sample];
+    }
+    for (int row = 0; row < rows.rows; ++row) {
+      const uint8_t* const y = rows.y + row * rows.yPitch + x;
+      switch (colour.form) {
+        case YuvToRgbForm::kWide:
+          YuvToRgbByWideSums(rgb, y, u, v, colour.wide, count);
+          break;
+        case YuvToRgbForm::kSixBits:
+          YuvToRgbBySixBits(rgb, y, u, v, count);
+          break;
+        default:
+          YuvToRgbByTable(rgb, y, u, v, colour.table, count);
+          break;
+      }
+      PackRgb(rows.dst + row * rows.dstPitch + ptrdiff_t{x} * format.bytes, rgb, format, shifts,
+              alpha, count);
+    }
   }
 }
 
@@ -367,29 +428,29 @@ using Lanes2 = uint16_t __attribute__((vector_size(16)));
 using Lanes4 = uint32_t __attribute__((vector_size(16)));
 using Lanes8 = uint64_t __attribute__((vector_size(16)));
 
-Lanes1 LowPairs(Lanes1 a, Lanes1 b) {
+static Lanes1 LowPairs(Lanes1 a, Lanes1 b) {
   return __builtin_shufflevector(a, b, 0, 16, 1, 17, 2, 18, 3, 19, 4, 20, 5, 21, 6, 22, 7, 23);
 }
-Lanes1 HighPairs(Lanes1 a, Lanes1 b) {
+static Lanes1 HighPairs(Lanes1 a, Lanes1 b) {
   return __builtin_shufflevector(a, b, 8, 24, 9, 25, 10, 26, 11, 27, 12, 28, 13, 29, 14, 30, 15,
                                  31);
 }
-Lanes2 LowPairs(Lanes2 a, Lanes2 b) {
+static Lanes2 LowPairs(Lanes2 a, Lanes2 b) {
   return __builtin_shufflevector(a, b, 0, 8, 1, 9, 2, 10, 3, 11);
 }
-Lanes2 HighPairs(Lanes2 a, Lanes2 b) {
+static Lanes2 HighPairs(Lanes2 a, Lanes2 b) {
   return __builtin_shufflevector(a, b, 4, 12, 5, 13, 6, 14, 7, 15);
 }
-Lanes4 LowPairs(Lanes4 a, Lanes4 b) {
+static Lanes4 LowPairs(Lanes4 a, Lanes4 b) {
   return __builtin_shufflevector(a, b, 0, 4, 1, 5);
 }
-Lanes4 HighPairs(Lanes4 a, Lanes4 b) {
+static Lanes4 HighPairs(Lanes4 a, Lanes4 b) {
   return __builtin_shufflevector(a, b, 2, 6, 3, 7);
 }
-Lanes8 LowPairs(Lanes8 a, Lanes8 b) {
+static Lanes8 LowPairs(Lanes8 a, Lanes8 b) {
   return __builtin_shufflevector(a, b, 0, 2);
 }
-Lanes8 HighPairs(Lanes8 a, Lanes8 b) {
+static Lanes8 HighPairs(Lanes8 a, Lanes8 b) {
   return __builtin_shufflevector(a, b, 1, 3);
 }
 
@@ -489,25 +550,35 @@ void Transpose(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t s
   }
 }
 
-}  // namespace
+}  // namespace scalar
 
-const RowOps kScalarRows = {
-    ReadStrided,     Gather,
-    GatherPixels,    BlendColumns,
-    BlendRows,       UnpackRgb,
-    UnpackAlpha,     UnpackIndexed,
-    YuvToRgb,        YuvToRgbByWideSums,
-    YuvToRgbCarry,   YuvToRgbBySixBits,
-    RgbToYuv,        MapLevels,
-    NarrowWithCarry, PackRgb,
-    PutAlpha,        Interleave,
-    Deinterleave,    SwapPairs,
-    Transpose,       WriteStrided,
-    WritePixels,
-};
-
-const RowOps* SelectRowOps() {
-  return &kScalarRows;
-}
+const RowOps kScalarRows = {"scalar",
+                            scalar::ReadStrided,
+                            scalar::Gather,
+                            scalar::GatherPixels,
+                            scalar::PlanPairs,
+                            scalar::ReadPairs,
+                            scalar::BlendPairs,
+                            scalar::BlendColumns,
+                            scalar::BlendRows,
+                            scalar::UnpackRgb,
+                            scalar::UnpackAlpha,
+                            scalar::UnpackIndexed,
+                            scalar::YuvToRgbByTable,
+                            scalar::YuvToRgbByWideSums,
+                            scalar::YuvToRgbCarry,
+                            scalar::YuvToRgbBySixBits,
+                            scalar::YuvToPixels,
+                            scalar::RgbToYuv,
+                            scalar::MapLevels,
+                            scalar::NarrowWithCarry,
+                            scalar::PackRgb,
+                            scalar::PutAlpha,
+                            scalar::Interleave,
+                            scalar::Deinterleave,
+                            scalar::SwapPairs,
+                            scalar::Transpose,
+                            scalar::WriteStrided,
+                            scalar::WritePixels};
 
 }  // namespace kestrel
