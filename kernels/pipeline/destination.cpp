@@ -15,6 +15,13 @@ int32_t RoundUpToEven(int32_t value) {
 
 }  // namespace
 
+int PlaneWriter::Room(int64_t column, int64_t row, int n, int most) const {
+  if (inPlace()) return most;
+  int room = tiles_ ? kTileRows : kTileSize / n;
+  if (tiles_ && Fits(column, row, n)) room -= count_;
+  return room < most ? room : most;
+}
+
 uint8_t* PlaneWriter::Start(int64_t column, int64_t row, int n, int runs) {
   started_ = runs;
   if (tiles_ && count_ > 0) return buffer_ + ptrdiff_t{count_} * n_ * unit_;
@@ -287,6 +294,17 @@ void Destination::PutChroma(int32_t r, const uint8_t* u, const uint8_t* v) {
     rows_.interleave(pairs, chromaPairs_ == 1 ? u : v, chromaPairs_ == 1 ? v : u, chromaCount_);
     writers_[1].Finish();
   }
+}
+
+int Destination::RoomForRows(int32_t r, int most) const {
+  const int64_t row = int64_t(r) - job_.rect.top;
+  const int n = pixelEnd_ - firstPixel_;
+  int64_t first = row;
+  int64_t end = row + most;
+  planes_[0].rows.Clip(&first, &end);
+  if (n <= 0 || first > row || end - row < 2) return 1;
+  const int64_t column = int64_t(x_) + firstPixel_ - job_.rect.left;
+  return writers_[0].Room(column, row, n, int(end - row));
 }
 
 Destination::PixelRun Destination::StartPixels(int32_t r, int rows) {

@@ -48,7 +48,7 @@ class PlaneWriter {
 
   static constexpr int kTileSize = kTileColumns * kTileRows;  // units
 
-  // `buffer` is for one tile, or two runs of a strip.
+  // `buffer` is for kTileSize units.
   void Set(const DestinationPlane& plane, int unit, bool tiles, uint8_t* buffer,
            const RowOps* rows) {
     plane_ = plane;
@@ -66,7 +66,9 @@ class PlaneWriter {
            (count_ + runs <= kTileRows && column == column_ && n == n_ && row == row_ + count_);
   }
 
-  // Memory for one or two runs of n units; they are written by the Finish that follows.
+  // How many of `most` runs of n units one Start can be for.
+  int Room(int64_t column, int64_t row, int n, int most) const;
+  // Memory for some runs of n units; they are written by the Finish that follows.
   uint8_t* Start(int64_t column, int64_t row, int n, int runs = 1);
   ptrdiff_t startedPitch() const { return inPlace() ? plane_.rowStep : ptrdiff_t{n_} * unit_; }
   void Finish();
@@ -135,7 +137,7 @@ class Destination {
   bool exchangesLuma() const { return exchange_ != LumaExchange::kNone; }
   PlaneWriter& writer(int plane) { return writers_[plane]; }
 
-  // RGB. Memory for the pixels of one or two rows; null when they are outside the image. The
+  // RGB. Memory for the pixels of some rows; null when they are outside the image. The
   // pixels are those of strip columns [first, first + n).
   struct PixelRun {
     uint8_t* pixels;
@@ -143,6 +145,8 @@ class Destination {
     int first, n;
   };
   PixelRun StartPixels(int32_t r, int rows);
+  // How many of `most` rows from r on one StartPixels can be for.
+  int RoomForRows(int32_t r, int most) const;
   void FinishPixels() { writers_[0].Finish(); }
   const PixelFormat& pixelFormat() const { return pixels_; }
   AlphaFill alphaFill() const { return alphaFill_; }

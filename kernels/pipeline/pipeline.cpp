@@ -18,6 +18,7 @@ class Pipeline {
         clampedCarry_(job.has(kClampedCarry) && (engine_.dither != 0 || !job.has(kCarryIfAsked))),
         dithers_(clampedCarry_ || (engine_.dither != 0 && engine_.pathKind == PATH_YUV_TO_RGB &&
                                    !job.has(kNoDither))) {
+    stripWidth_ = destination_.stripWidth();
     PrepareCarry();
     PrepareSums();
   }
@@ -26,7 +27,7 @@ class Pipeline {
     if (dithers_) {
       // The remainder travels along whole rows, from the end of one to the start of the next.
       for (int32_t r = job_.rect.top; r < job_.rect.bottom; ++r) {
-        for (int32_t x = job_.rect.left; x < job_.rect.right; x += destination_.stripWidth()) {
+        for (int32_t x = job_.rect.left; x < job_.rect.right; x += stripWidth_) {
           if (r == job_.rect.top || StripWidth(job_.rect.left) < Width()) SelectColumns(x);
           ConvertRows(r);
         }
@@ -34,7 +35,11 @@ class Pipeline {
     } else {
       CopyPlanes();
       if (lumaDone_ && chromaDone_) return;
-      for (int32_t x = job_.rect.left; x < job_.rect.right; x += destination_.stripWidth()) {
+      // Nothing needs a buffer where pixels are in place on both sides: strips are whole rows then.
+      const bool whole = engine_.pathKind == PATH_YUV_TO_RGB && destination_.writer(0).inPlace() &&
+                         source_.PixelsLieInPlace(job_.rect.left, Width());
+      stripWidth_ = whole ? Width() : destination_.stripWidth();
+      for (int32_t x = job_.rect.left; x < job_.rect.right; x += stripWidth_) {
         SelectColumns(x);
         for (int32_t r = job_.rect.top; r < job_.rect.bottom;) r += ConvertRows(r);
         destination_.Flush();
@@ -55,8 +60,7 @@ class Pipeline {
   int32_t Width() const { return job_.rect.right - job_.rect.left; }
   int StripWidth(int32_t x) const {
     const int32_t rest = job_.rect.right - x;
-    const int32_t most = destination_.stripWidth();
-    return rest < most ? rest : most;
+    return rest < stripWidth_ ? rest : stripWidth_;
   }
 
   void PrepareSums() {
@@ -113,7 +117,17 @@ class Pipeline {
         uColumns_[k] = destination_.uColumns()[k] - x;
         vColumns_[k] = destination_.vColumns()[k] - x;
       }
+      uStep_ = CommonStep(uColumns_, destination_.chromaCount());
+      vStep_ = CommonStep(vColumns_, destination_.chromaCount());
     }
+  }
+
+  static int CommonStep(const int32_t* columns, int n) {
+    const int step = n > 1 ? columns[1] - columns[0] : 1;
+    for (int k = 1; k < n; ++k) {
+      if (columns[k] - columns[k - 1] != step) return 0;
+    }
+    return step;
   }
 
   // Stored values at 1:1: planes whose samples correspond one to one on the two sides are copied,
@@ -280,40 +294,35 @@ class Pipeline {
     destination_.PutRgb(r, rgb, nullptr, engine_.dstFormat.colourStandard == 16);
   }
 
-  // The number of rows done. At 1:1 two rows often share a row of chroma, and half of the work on
-  // chroma is saved.
+  // The number of rows done: rows that are in place on both sides are converted at once.
   int YuvToRgb(int32_t r) {
+    const int room = destination_.RoomForRows(r, job_.rect.bottom - r);
+    const int rows = source_.RowsInPlace(r, room);
     const uint8_t* y = source_.LumaInPlace(r);
-    if (y != nullptr && r + 1 < job_.rect.bottom && engine_.srcSubsample[4] == 2 &&
-        source_.SourceRow(r, 2) == source_.SourceRow(r + 1, 2)) {
-      const uint8_t* below = source_.LumaInPlace(r + 1);
-      if (below != nullptr && ConvertPixels(r, y, below - y, 2)) return 2;
-    }
-    ConvertPixels(r, y != nullptr ? y : source_.Luma(r), 0, 1);
-    return 1;
+    ConvertPixels(r, y != nullptr ? y : source_.Luma(r), rows);
+    return rows;
   }
 
-  // False when there is no room for the rows.
-  bool ConvertPixels(int32_t r, const uint8_t* y, ptrdiff_t yPitch, int rows) {
+  void ConvertPixels(int32_t r, const uint8_t* y, int rows) {
     const Destination::PixelRun run = destination_.StartPixels(r, rows);
-    if (run.pixels == nullptr) return false;
+    if (run.pixels == nullptr) return;
     const PixelChroma chroma = source_.ChromaOfPixels(r);
     const PixelFormat& format = destination_.pixelFormat();
     // A run may begin with the second of two pixels that share a sample.
     int i = 0;
     while (i < run.n) {
       const int column = run.first + i + chroma.phase;
-      const int n = (column & chroma.run.shift) != 0 ? 1 : run.n - i;
-      const ptrdiff_t sample = ptrdiff_t{column >> chroma.run.shift} * chroma.run.step;
-      const ChromaRun part = {chroma.run.u + sample, chroma.run.v + sample, chroma.run.shift,
-                              chroma.run.step};
-      rows_.yuvToPixels(
-          {run.pixels + ptrdiff_t{i} * format.bytes, run.pitch, y + run.first + i, yPitch, rows},
-          part, colour_, format, destination_.alphaFill(), n);
+      const int n = (column & chroma.rows.shift) != 0 ? 1 : run.n - i;
+      const ptrdiff_t sample = ptrdiff_t{column >> chroma.rows.shift} * chroma.rows.step;
+      ChromaRows part = chroma.rows;
+      part.u += sample;
+      part.v += sample;
+      rows_.yuvToPixels({run.pixels + ptrdiff_t{i} * format.bytes, run.pitch, y + run.first + i,
+                         source_.pitch(0), rows},
+                        part, colour_, format, destination_.alphaFill(), n);
       i += n;
     }
     destination_.FinishPixels();
-    return true;
   }
 
   void RgbToRgb(int32_t r) {
@@ -336,14 +345,20 @@ class Pipeline {
     // Only the pixels that decide a block's chroma are converted.
     const bool writesU = destination_.WritesU(r);
     const bool writesV = destination_.WritesV(r);
-    if (writesU) Chroma(u_, run, uColumns_, tables + 3, n);
-    if (writesV) Chroma(v_, run, vColumns_, tables + 5, n);
+    if (writesU) Chroma(u_, run, uColumns_, uStep_, tables + 3, n);
+    if (writesV) Chroma(v_, run, vColumns_, vStep_, tables + 5, n);
     destination_.PutChroma(r, writesU ? u_ : nullptr, writesV ? v_ : nullptr);
   }
 
-  void Chroma(uint8_t* samples, const RgbRun& run, const int32_t* columns, RgbToYuvTables tables,
-              int n) {
-    for (int c = 0; c < 3; ++c) rows_.gather(channels_[c], run.channel[c], columns, n);
+  void Chroma(uint8_t* samples, const RgbRun& run, const int32_t* columns, int step,
+              RgbToYuvTables tables, int n) {
+    for (int c = 0; c < 3; ++c) {
+      if (step != 0) {
+        rows_.readStrided(channels_[c], run.channel[c] + columns[0], step, n);
+      } else {
+        rows_.gather(channels_[c], run.channel[c], columns, n);
+      }
+    }
     const uint8_t* const picked[3] = {channels_[0], channels_[1], channels_[2]};
     rows_.rgbToYuv(samples, picked, tables, n);
   }
@@ -357,9 +372,11 @@ class Pipeline {
   kestrel::YuvToRgb colour_ = {};
   Carry carry_ = {};
   FieldShifts carryShifts_ = {};
+  int32_t stripWidth_ = 0;
   int n_ = 0;
   bool lumaDone_ = false, chromaDone_ = false;   // by CopyPlanes
   int32_t uColumns_[kStrip], vColumns_[kStrip];  // loop columns, or columns of the strip
+  int uStep_ = 0, vStep_ = 0;                    // from each of them to the next; 0 when it varies
   uint8_t channels_[3][kStrip];
   uint8_t luma_[kStrip], u_[kStrip], v_[kStrip];
 };

@@ -48,6 +48,14 @@ Source::Source(const Job& job)
 
 void Source::SelectColumns(int32_t x, int n) {
   interpolates_ = false;
+  lines_[0].row = lines_[1].row = -1;
+  // Side by side: the first column says it all, and the strip may be of any width.
+  if (palette_ == nullptr && !swappedLuma_ && columnPositions_.Advance(x, n)) {
+    first_.n = n;
+    first_.contiguous = true;
+    first_.Set(0, columnPositions_.At(x).first);
+    return;
+  }
   const int32_t exchange = swappedLuma_ ? 1 : 0;
   for (int i = 0; i < n; ++i) {
     const Taps taps = columnPositions_.At(x + i);
@@ -58,7 +66,6 @@ void Source::SelectColumns(int32_t x, int n) {
   }
   first_.Finish(n);
   second_.Finish(n);
-  lines_[0].row = lines_[1].row = -1;
   // Pixels of RGB are gathered whole.
   if (job_.engine.srcLayout.code == CODE_RGB) return;
   if (!interpolates_) {
@@ -125,24 +132,54 @@ void Source::SelectPixelChroma(int32_t x, int n) {
 }
 
 PixelChroma Source::ChromaOfPixels(int32_t r) {
-  if (pixelChroma_ == PixelChromaRead::kGrey) return {{u_, v_, 0, 1}, 0};
+  if (pixelChroma_ == PixelChromaRead::kGrey) return {{u_, v_, 0, 1, 0, 0, 0}, 0};
   const int32_t row = rowPositions_.At(r, job_.engine.srcSubsample[4]).first;
   const uint8_t* const u = RowStart(1, row);
   const uint8_t* const v = RowStart(2, row);
   const int32_t start = chromaU_.offset[0];
   switch (pixelChroma_) {
     case PixelChromaRead::kInPlace:
-      return {{u + start, v + start, shift_, int32_t(chromaU_.step)}, phase_};
+      return {{u + start, v + start, shift_, int32_t(chromaU_.step), job_.srcPitches[1],
+               job_.srcPitches[2], job_.engine.srcSubsample[4] == 2 ? 1 : 0},
+              phase_};
     case PixelChromaRead::kStrided:
       rows_.readStrided(u_, u + start, chromaU_.step, chromaCount_);
       rows_.readStrided(v_, v + start, chromaU_.step, chromaCount_);
-      return {{u_, v_, shift_, 1}, phase_};
+      return {{u_, v_, shift_, 1, 0, 0, 0}, phase_};
     case PixelChromaRead::kPairs:
       rows_.readPairs(packed_, u, chromaU_.plan);
-      return {{packed_, packed_ + 1, 0, 2}, 0};
+      return {{packed_, packed_ + 1, 0, 2, 0, 0, 0}, 0};
     default:
-      return {{ReadSamples(u_, u, chromaU_), ReadSamples(v_, v, chromaU_), 0, 1}, 0};
+      return {{ReadSamples(u_, u, chromaU_), ReadSamples(v_, v, chromaU_), 0, 1, 0, 0, 0}, 0};
   }
+}
+
+int Source::RowsInPlace(int32_t r, int most) const {
+  const uint32_t factor = job_.engine.srcSubsample[4];
+  if (most < 2 || factor > 2 || job_.engine.stepY != 0x10000 || LumaInPlace(r) == nullptr ||
+      pixelChroma_ != PixelChromaRead::kInPlace) {
+    return 1;
+  }
+  const int32_t first = SourceRow(r, 1);
+  // The second row of a chroma row comes alone, so that pairs can follow.
+  if (factor == 2 && first % 2 != 0) return 1;
+  // Rows advance by one at most: when the last is where it should be, so are all between.
+  int n = most;
+  const int32_t inside = job_.engine.srcRect.bottom - first;
+  if (inside < n) n = inside;
+  if (n < 2) return 1;
+  const int32_t last = r + n - 1;
+  const bool inTurn =
+      SourceRow(last, 1) - first == n - 1 &&
+      SourceRow(last, factor) - SourceRow(r, factor) == int32_t(uint32_t(n - 1) / factor);
+  return inTurn ? n : 1;
+}
+
+bool Source::PixelsLieInPlace(int32_t x, int32_t n) const {
+  const PlaneLayout& layout = job_.engine.srcLayout;
+  return layout.code != CODE_GRAY8 && job_.engine.stepY == 0x10000 &&
+         job_.engine.srcSubsample[1] <= 2 && (chromaU_.step == 1 || chromaPairs() != 0) &&
+         LumaLiesInPlace(x, n);
 }
 
 bool Source::LumaLiesInPlace(int32_t x, int32_t n) const {

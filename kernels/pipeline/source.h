@@ -27,9 +27,9 @@ struct RgbRun {
   const uint8_t* alpha;  // null unless the source has an alpha byte
 };
 
-// Chroma for the pixels of a strip: pixel i has sample (i + phase) >> run.shift.
+// Chroma for the pixels of a strip: pixel i has sample (i + phase) >> rows.shift.
 struct PixelChroma {
-  ChromaRun run;
+  ChromaRows rows;
   int phase;
 };
 
@@ -65,6 +65,11 @@ class Source {
   PixelChroma ChromaOfPixels(int32_t r);
   // Where the luma of the strip lies in the source as it is wanted; null when it does not.
   const uint8_t* LumaInPlace(int32_t r) const;
+  // How many of `most` rows from r on are in place, luma and chroma, each row below its
+  // predecessor, so that they can be converted at once. 1 when it is only this one, or not even it.
+  int RowsInPlace(int32_t r, int most) const;
+  // Whether luma and chroma of n loop columns from x are in place, so that a strip may be as wide.
+  bool PixelsLieInPlace(int32_t x, int32_t n) const;
 
  private:
   // The two source lines, already filtered horizontally, that rows are blended from. An enlarged

@@ -63,21 +63,24 @@ struct YuvToRgb {
   YuvToRgbWide wide;
 };
 
-// Chroma along a run: pixel i has sample (i >> shift) * step of each.
-struct ChromaRun {
-  const uint8_t* u;
-  const uint8_t* v;
-  int32_t shift;  // 0 or 1
-  int32_t step;   // 1, or 2 where samples of U and V take turns: then one is beside the other
-};
-
-// One or two rows of luma that share a row of chroma, and what becomes of them.
+// Rows of luma and what becomes of them.
 struct PixelRows {
   uint8_t* dst;
   ptrdiff_t dstPitch;
   const uint8_t* y;
   ptrdiff_t yPitch;
   int rows;
+};
+
+// Their chroma: pixel i of row r has, in row r >> rowShift, sample (i >> shift) * step of each.
+struct ChromaRows {
+  const uint8_t* u;
+  const uint8_t* v;
+  int32_t shift;  // 0 or 1
+  int32_t step;   // 1, or 2 where samples of U and V take turns: then one is beside the other
+  ptrdiff_t uPitch;
+  ptrdiff_t vPitch;
+  int32_t rowShift;  // 0 or 1
 };
 
 // A map of levels, and the numbers that it is made of: map[i] = (i * gain + offset) >> 16, clamped.
@@ -153,8 +156,8 @@ struct KestrelRowOps {
   //   B = Y + ((113 U - 14516) >> 6), each clamped to 0..255.
   void (*yuvToRgbSixBit)(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u,
                          const uint8_t* v, int n);
-  // Whole packed pixels, one or two rows that share chroma.
-  void (*yuvToPixels)(const kestrel::PixelRows& rows, const kestrel::ChromaRun& chroma,
+  // The same as whole packed pixels.
+  void (*yuvToPixels)(const kestrel::PixelRows& rows, const kestrel::ChromaRows& chroma,
                       const kestrel::YuvToRgb& colour, const kestrel::PixelFormat& format,
                       kestrel::AlphaFill alpha, int n);
   // Y with tables 0..2, U with 3..5, V with 5..7: `tables` is the first of the three.

@@ -308,41 +308,49 @@ void PackRgb(uint8_t* dst, const uint8_t* const rgb[3], const PixelFormat& forma
   }
 }
 
-// Channels of a few pixels, then the pixels: a scalar CPU gains nothing from fusing the two.
-void YuvToPixels(const PixelRows& rows, const ChromaRun& chroma, const YuvToRgb& colour,
-                 const PixelFormat& format, AlphaFill alpha, int n) {
+static void YuvRowToPixels(uint8_t* dst, const uint8_t* y, const uint8_t* u, const uint8_t* v,
+                           const ChromaRows& chroma, const YuvToRgb& colour,
+                           const PixelFormat& format, const FieldShifts& shifts, AlphaFill alpha,
+                           int n) {
+  // Channels of a few pixels, then the pixels: a scalar CPU gains nothing from fusing the two.
   constexpr int kPiece = 64;
-  uint8_t u[kPiece], v[kPiece], channels[3][kPiece];
+  uint8_t pieceU[kPiece], pieceV[kPiece], channels[3][kPiece];
   uint8_t* const rgb[3] = {channels[0], channels[1], channels[2]};
+  for (int x = 0; x < n; x += kPiece) {
+    const int count = n - x < kPiece ? n - x : kPiece;
+    for (int i = 0; i < count; ++i) {
+      const int sample = ((x + i) >> chroma.shift) * chroma.step;
+      pieceU[i] = u[sample];
+      pieceV[i] = v[sample];
+    }
+    switch (colour.form) {
+      case YuvToRgbForm::kWide:
+        YuvToRgbByWideSums(rgb, y + x, pieceU, pieceV, colour.wide, count);
+        break;
+      case YuvToRgbForm::kSixBits:
+        YuvToRgbBySixBits(rgb, y + x, pieceU, pieceV, count);
+        break;
+      default:
+        YuvToRgbByTable(rgb, y + x, pieceU, pieceV, colour.table, count);
+        break;
+    }
+    PackRgb(dst + ptrdiff_t{x} * format.bytes, rgb, format, shifts, alpha, count);
+  }
+}
+
+void YuvToPixels(const PixelRows& rows, const ChromaRows& chroma, const YuvToRgb& colour,
+                 const PixelFormat& format, AlphaFill alpha, int n) {
   FieldShifts shifts;
   for (int c = 0; c < 3; ++c) {
     const int32_t drop = 8 - int32_t(format.size[c]);
     const bool narrowed = format.bytes == 2 && colour.form != YuvToRgbForm::kSixBits;
     shifts.right[c] = narrowed && drop > 0 ? 0 : drop;
   }
-  for (int x = 0; x < n; x += kPiece) {
-    const int count = n - x < kPiece ? n - x : kPiece;
-    for (int i = 0; i < count; ++i) {
-      const int sample = ((x + i) >> chroma.shift) * chroma.step;
-      u[i] = chroma.u[sample];
-      v[i] = chroma.v[sample];
-    }
-    for (int row = 0; row < rows.rows; ++row) {
-      const uint8_t* const y = rows.y + row * rows.yPitch + x;
-      switch (colour.form) {
-        case YuvToRgbForm::kWide:
-          YuvToRgbByWideSums(rgb, y, u, v, colour.wide, count);
-          break;
-        case YuvToRgbForm::kSixBits:
-          YuvToRgbBySixBits(rgb, y, u, v, count);
-          break;
-        default:
-          YuvToRgbByTable(rgb, y, u, v, colour.table, count);
-          break;
-      }
-      PackRgb(rows.dst + row * rows.dstPitch + ptrdiff_t{x} * format.bytes, rgb, format, shifts,
-              alpha, count);
-    }
+  for (int row = 0; row < rows.rows; ++row) {
+    const int chromaRow = row >> chroma.rowShift;
+    YuvRowToPixels(rows.dst + row * rows.dstPitch, rows.y + row * rows.yPitch,
+                   chroma.u + chromaRow * chroma.uPitch, chroma.v + chromaRow * chroma.vPitch,
+                   chroma, colour, format, shifts, alpha, n);
   }
 }
 

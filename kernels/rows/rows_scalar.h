@@ -30,7 +30,7 @@ void YuvToRgbCarry(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u, co
                    const YuvToRgbWide& sums, Carry* carry, int n);
 void YuvToRgbBySixBits(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u, const uint8_t* v,
                        int n);
-void YuvToPixels(const PixelRows& rows, const ChromaRun& chroma, const YuvToRgb& colour,
+void YuvToPixels(const PixelRows& rows, const ChromaRows& chroma, const YuvToRgb& colour,
                  const PixelFormat& format, AlphaFill alpha, int n);
 void RgbToYuv(uint8_t* dst, const uint8_t* const rgb[3], RgbToYuvTables tables, int n);
 void MapLevels(uint8_t* dst, const uint8_t* src, const LevelMap& levels, int n);

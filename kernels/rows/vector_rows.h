@@ -391,87 +391,104 @@ class ColourStage {
   Words greenBase_, lumaWhole_, lumaPart_;
 };
 
-// Chroma for kBytes pixels: its bytes as they lie in memory.
-struct ChromaBytes {
-  const uint8_t* u;
-  const uint8_t* v;
-};
-
 template <YuvToRgbForm kForm, bool kHalf>
 class PixelConverter {
  public:
-  PixelConverter(const PixelRows& rows, const ChromaRun& chroma, const YuvToRgb& colour,
-                 const PixelShape& shape, uint8_t alpha)
-      : rows_(rows),
-        chroma_(chroma),
-        stage_(colour.wide),
+  PixelConverter(const ChromaRows& chroma, const YuvToRgb& colour, const PixelShape& shape,
+                 uint8_t alpha)
+      : stage_(colour.wide),
         shape_(shape),
         alpha_(SetBytes(alpha)),
         unit_(shape.bytes),
+        step_(chroma.step),
         uFirst_(chroma.u < chroma.v) {}
 
-  void Convert(int n) const {
+  // Rows that share chroma, one or two.
+  struct Lines {
+    uint8_t* dst;
+    ptrdiff_t dstPitch;
+    const uint8_t* y;
+    ptrdiff_t yPitch;
+    const uint8_t* u;
+    const uint8_t* v;
+    int count;
+  };
+
+  void Convert(const Lines& lines, int n) const {
     int i = 0;
-    for (; i + kBytes <= n; i += kBytes) ConvertAt(i);
+    for (; i + kBytes <= n; i += kBytes) ConvertVector(At(lines, i));
     if (i == n) return;
     // The last vector reaches back over pixels that are done already, unless it would tear a pair.
     const int last = n - kBytes;
-    if (last >= 0 && (!kHalf || last % 2 == 0)) return ConvertAt(last);
-    ConvertRest(i, n);
+    if (last >= 0 && (!kHalf || last % 2 == 0)) {
+      ConvertVector(At(lines, last));
+    } else {
+      ConvertRest(At(lines, i), n - i);
+    }
   }
 
  private:
-  void ConvertAt(int i) const {
-    const ptrdiff_t sample = ptrdiff_t{kHalf ? i / 2 : i} * chroma_.step;
-    ConvertVector(rows_.dst + ptrdiff_t{i} * unit_, rows_.dstPitch, rows_.y + i, rows_.yPitch,
-                  {chroma_.u + sample, chroma_.v + sample});
+  Lines At(const Lines& lines, int i) const {
+    const ptrdiff_t sample = ptrdiff_t{kHalf ? i / 2 : i} * step_;
+    return {lines.dst + ptrdiff_t{i} * unit_,
+            lines.dstPitch,
+            lines.y + i,
+            lines.yPitch,
+            lines.u + sample,
+            lines.v + sample,
+            lines.count};
   }
 
-  void ConvertRest(int i, int n) const {
+  void ConvertRest(const Lines& lines, int n) const {
     uint8_t y[2][kBytes] = {};
     uint8_t chroma[2][2 * kBytes] = {};
     uint8_t pixels[2][4 * kBytes];
-    for (int row = 0; row < rows_.rows; ++row) {
-      memcpy(y[row], rows_.y + row * rows_.yPitch + i, size_t(n - i));
+    for (int row = 0; row < lines.count; ++row) {
+      memcpy(y[row], lines.y + row * lines.yPitch, size_t(n));
     }
-    const size_t samples = size_t(kHalf ? (n - i + 1) / 2 : n - i);
-    const ptrdiff_t sample = ptrdiff_t{kHalf ? i / 2 : i} * chroma_.step;
-    if (chroma_.step == 1) {
-      memcpy(chroma[0], chroma_.u + sample, samples);
-      memcpy(chroma[1], chroma_.v + sample, samples);
-      ConvertVector(pixels[0], sizeof(pixels[0]), y[0], sizeof(y[0]), {chroma[0], chroma[1]});
+    const size_t samples = size_t(kHalf ? (n + 1) / 2 : n);
+    Lines rest = {pixels[0], sizeof(pixels[0]), y[0],       sizeof(y[0]),
+                  chroma[0], chroma[1],         lines.count};
+    if (step_ == 1) {
+      memcpy(chroma[0], lines.u, samples);
+      memcpy(chroma[1], lines.v, samples);
     } else {
-      memcpy(chroma, (uFirst_ ? chroma_.u : chroma_.v) + sample, 2 * samples);
-      ConvertVector(pixels[0], sizeof(pixels[0]), y[0], sizeof(y[0]),
-                    {chroma[0] + (uFirst_ ? 0 : 1), chroma[0] + (uFirst_ ? 1 : 0)});
+      memcpy(chroma, uFirst_ ? lines.u : lines.v, 2 * samples);
+      rest.u = chroma[0] + (uFirst_ ? 0 : 1);
+      rest.v = chroma[0] + (uFirst_ ? 1 : 0);
     }
-    for (int row = 0; row < rows_.rows; ++row) {
-      memcpy(rows_.dst + row * rows_.dstPitch + ptrdiff_t{i} * unit_, pixels[row],
-             size_t(n - i) * size_t(unit_));
+    ConvertVector(rest);
+    for (int row = 0; row < lines.count; ++row) {
+      memcpy(lines.dst + row * lines.dstPitch, pixels[row], size_t(n) * size_t(unit_));
     }
   }
 
-  void ConvertVector(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* y, ptrdiff_t yPitch,
-                     const ChromaBytes& chroma) const {
+  void ConvertVector(const Lines& lines) const {
     ChromaTerms<kForm> low, high;
-    LoadTerms(chroma, &low, &high);
-    for (int row = 0; row < rows_.rows; ++row) {
-      const WordsPair luma = Widen(LoadBytes(y + row * yPitch));
-      const auto a = stage_.Add(luma.low, low);
-      const auto b = stage_.Add(luma.high, high);
-      StorePixels(dst + row * dstPitch, shape_, Narrow(a.channel[0], b.channel[0]),
-                  Narrow(a.channel[1], b.channel[1]), Narrow(a.channel[2], b.channel[2]), alpha_);
+    LoadTerms(lines.u, lines.v, &low, &high);
+    ConvertLine(lines.dst, lines.y, low, high);
+    if (lines.count == 2) {
+      ConvertLine(lines.dst + lines.dstPitch, lines.y + lines.yPitch, low, high);
     }
   }
 
-  void LoadTerms(const ChromaBytes& chroma, ChromaTerms<kForm>* low,
+  void ConvertLine(uint8_t* dst, const uint8_t* y, const ChromaTerms<kForm>& low,
+                   const ChromaTerms<kForm>& high) const {
+    const WordsPair luma = Widen(LoadBytes(y));
+    const auto a = stage_.Add(luma.low, low);
+    const auto b = stage_.Add(luma.high, high);
+    StorePixels(dst, shape_, Narrow(a.channel[0], b.channel[0]), Narrow(a.channel[1], b.channel[1]),
+                Narrow(a.channel[2], b.channel[2]), alpha_);
+  }
+
+  void LoadTerms(const uint8_t* inU, const uint8_t* inV, ChromaTerms<kForm>* low,
                  ChromaTerms<kForm>* high) const {
-    const uint8_t* const pairs = uFirst_ ? chroma.u : chroma.v;
+    const uint8_t* const pairs = uFirst_ ? inU : inV;
     if constexpr (kHalf) {
       Words u, v;
-      if (chroma_.step == 1) {
-        u = LoadHalf(chroma.u);
-        v = LoadHalf(chroma.v);
+      if (step_ == 1) {
+        u = LoadHalf(inU);
+        v = LoadHalf(inV);
       } else {
         const Words both = LoadWords(pairs);
         const Words first = both & SetWords(0xFF);
@@ -487,13 +504,13 @@ class PixelConverter {
       }
     } else {
       Bytes first, second;
-      if (chroma_.step == 1) {
-        first = LoadBytes(chroma.u);
-        second = LoadBytes(chroma.v);
+      if (step_ == 1) {
+        first = LoadBytes(inU);
+        second = LoadBytes(inV);
       } else {
         Load2(pairs, &first, &second);
       }
-      const bool exchanged = chroma_.step != 1 && !uFirst_;
+      const bool exchanged = step_ != 1 && !uFirst_;
       const WordsPair u = Widen(exchanged ? second : first);
       const WordsPair v = Widen(exchanged ? first : second);
       *low = stage_.Terms(u.low, v.low);
@@ -501,26 +518,40 @@ class PixelConverter {
     }
   }
 
-  const PixelRows rows_;
-  const ChromaRun chroma_;
   const ColourStage<kForm> stage_;
   const PixelShape shape_;
   const Bytes alpha_;
   const int unit_;
+  const int step_;
   const bool uFirst_;
 };
 
-template <YuvToRgbForm kForm>
-void ConvertYuv(const PixelRows& rows, const ChromaRun& chroma, const YuvToRgb& colour,
-                const PixelShape& shape, uint8_t alpha, int n) {
-  if (chroma.shift != 0) {
-    PixelConverter<kForm, true>(rows, chroma, colour, shape, alpha).Convert(n);
-  } else {
-    PixelConverter<kForm, false>(rows, chroma, colour, shape, alpha).Convert(n);
+template <YuvToRgbForm kForm, bool kHalf>
+void ConvertRows(const PixelRows& rows, const ChromaRows& chroma, const YuvToRgb& colour,
+                 const PixelShape& shape, uint8_t alpha, int n) {
+  const PixelConverter<kForm, kHalf> converter(chroma, colour, shape, alpha);
+  const int share = 1 << chroma.rowShift;
+  for (int row = 0; row < rows.rows; row += share) {
+    const int chromaRow = row >> chroma.rowShift;
+    const int count = rows.rows - row < share ? 1 : share;
+    converter.Convert(
+        {rows.dst + row * rows.dstPitch, rows.dstPitch, rows.y + row * rows.yPitch, rows.yPitch,
+         chroma.u + chromaRow * chroma.uPitch, chroma.v + chromaRow * chroma.vPitch, count},
+        n);
   }
 }
 
-void YuvToPixels(const PixelRows& rows, const ChromaRun& chroma, const YuvToRgb& colour,
+template <YuvToRgbForm kForm>
+void ConvertYuv(const PixelRows& rows, const ChromaRows& chroma, const YuvToRgb& colour,
+                const PixelShape& shape, uint8_t alpha, int n) {
+  if (chroma.shift != 0) {
+    ConvertRows<kForm, true>(rows, chroma, colour, shape, alpha, n);
+  } else {
+    ConvertRows<kForm, false>(rows, chroma, colour, shape, alpha, n);
+  }
+}
+
+void YuvToPixels(const PixelRows& rows, const ChromaRows& chroma, const YuvToRgb& colour,
                  const PixelFormat& format, AlphaFill alpha, int n) {
   const PixelShape shape(format);
   const uint8_t fill = AlphaOf(shape, alpha);
