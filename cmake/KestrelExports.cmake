@@ -6,7 +6,12 @@ set(KESTREL_EXPORT_FILES
   colour/exports.def
   kernels/exports.def
   kernels/grey/kernels.def
+  kernels/neon/exports.def
+  kernels/neon/kernels.def
   kernels/planar_yuv/kernels.def
+  kernels/rgb24/kernels.def
+  kernels/rgb32/kernels.def
+  kernels/rgb565/kernels.def
   kernels/yuyv/kernels.def
   jni/exports.def)
 

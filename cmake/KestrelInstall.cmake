@@ -13,7 +13,11 @@ set(KESTREL_PUBLIC_HEADERS
   kernels/all_kernels.def
   kernels/grey/kernels.def
   kernels/kernels.h
+  kernels/neon/kernels.def
   kernels/planar_yuv/kernels.def
+  kernels/rgb24/kernels.def
+  kernels/rgb32/kernels.def
+  kernels/rgb565/kernels.def
   kernels/yuyv/kernels.def)
 
 foreach(header IN LISTS KESTREL_PUBLIC_HEADERS)

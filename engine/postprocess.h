@@ -149,13 +149,16 @@ KESTREL_API KernelFn YUV2YUV_Fast;
 KESTREL_API KernelFn ANY_ANY_C_FAST_R5G6B5;
 KESTREL_API KernelFn I420_To_I422_Fast;
 KESTREL_API KernelFn YUV_YUV_C_FAST;
-KESTREL_API KernelFn YUV_RGB32_C_FAST;
+KESTREL_API KernelFn YUV_RGB32_C_FAST; /* may have drawn although it answers KESTREL_UNSUPPORTED */
 KESTREL_API KernelFn YUYV_RGB32_FAST;
 KESTREL_API KernelFn ANY_ANY_C_FAST_RGB32;
 KESTREL_API KernelFn Gray2Gray_C_FAST;
 
 /* Converts any job; never declines. KESTREL_BAD_ARGUMENT for a null argument. */
 KESTREL_API KernelFn ANY_ANY_C_SLOW;
+
+/* Does nothing. Part of the exported interface, called by nobody. */
+KESTREL_API void NEC_DebugWin32(void);
 
 KESTREL_END_C
 

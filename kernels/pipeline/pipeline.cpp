@@ -134,10 +134,9 @@ class Pipeline {
   // or their chroma interleaved or taken apart, in rows as wide as the job.
   void CopyPlanes() {
     const bool unit = engine_.stepX == 0x10000 && engine_.stepY == 0x10000;
-    if (!unit || engine_.pathKind != PATH_YUV_TO_YUV || job_.mapsLevels() ||
-        job_.has(kPairChroma) || destination_.exchangesLuma()) {
-      return;
-    }
+    const bool keepsYuv = engine_.pathKind == PATH_YUV_TO_YUV && !job_.mapsLevels() &&
+                          !job_.has(kPairChroma) && !destination_.exchangesLuma();
+    if (!unit || !(keepsYuv || KeepsPixels())) return;
     const PlaneRun luma = destination_.LumaRun();
     if (luma.n > 0) {
       if (!source_.LumaLiesInPlace(luma.firstX, luma.n)) return;
@@ -148,6 +147,21 @@ class Pipeline {
     chromaDone_ = !destination_.hasChroma();
     // The block about column 0 is wider than the others.
     if (!chromaDone_ && job_.rect.left >= 0) chromaDone_ = CopyChroma(destination_.ChromaRun());
+  }
+
+  // Whether pixels of RGB keep every bit.
+  bool KeepsPixels() const {
+    const PixelFormat& from = source_.pixelFormat();
+    const PixelFormat& to = destination_.pixelFormat();
+    if (engine_.pathKind != PATH_RGB_TO_RGB || clampedCarry_ || from.bytes != to.bytes)
+      return false;
+    uint32_t bits = from.alphaByte >= 0 ? 8 : 0;
+    for (int c = 0; c < 3; ++c) {
+      const bool same = from.size[c] == to.size[c] && from.position[c] == to.position[c];
+      if (!same || from.size[c] > 8) return false;  // channels have 8 bits
+      bits += from.size[c];
+    }
+    return bits == 8 * uint32_t(from.bytes);
   }
 
   bool CopyChroma(const PlaneRun& run) {
@@ -326,6 +340,15 @@ class Pipeline {
   }
 
   void RgbToRgb(int32_t r) {
+    if (const uint8_t* pixels = clampedCarry_ ? nullptr : source_.Pixels(r)) {
+      const Destination::PixelRun to = destination_.StartPixels(r, 1);
+      if (to.pixels == nullptr) return;
+      const PixelFormat& from = source_.pixelFormat();
+      rows_.repackPixels(to.pixels, pixels + ptrdiff_t{to.first} * from.bytes, from,
+                         destination_.pixelFormat(), to.n);
+      destination_.FinishPixels();
+      return;
+    }
     RgbRun run = source_.Rgb(r);
     if (clampedCarry_) {
       uint8_t* const rgb[3] = {channels_[0], channels_[1], channels_[2]};

@@ -34,7 +34,8 @@ Source::Source(const Job& job)
       pixels_(DescribePixels(job.engine.srcFormat, job.engine.srcChannelSize,
                              job.engine.srcChannelPos)),
       palette_(job.engine.srcFormat.palette),
-      swappedLuma_(HasSwappedLuma(job.engine.srcFormat.code)) {
+      swappedLuma_(HasSwappedLuma(job.engine.srcFormat.code)),
+      wantsAlpha_(pixels_.alphaByte >= 0 && job.engine.pathKind == PATH_RGB_TO_RGB) {
   const PlaneLayout& layout = job.engine.srcLayout;
   // Indexed pixels are addressed by column: several share a byte.
   const bool isRgb = layout.code == CODE_RGB;
@@ -183,7 +184,8 @@ bool Source::PixelsLieInPlace(int32_t x, int32_t n) const {
 }
 
 bool Source::LumaLiesInPlace(int32_t x, int32_t n) const {
-  return first_.step == 1 && !swappedLuma_ && columnPositions_.Advance(x, n);
+  const bool packedYuv = job_.engine.srcLayout.code != CODE_RGB && first_.step != 1;
+  return !packedYuv && palette_ == nullptr && !swappedLuma_ && columnPositions_.Advance(x, n);
 }
 
 bool Source::ChromaLiesInPlace(int32_t firstX, int32_t lastX, int32_t n) const {
@@ -204,7 +206,7 @@ int Source::chromaPairs() const {
 }
 
 const uint8_t* Source::LumaAt(int32_t x, int32_t row) const {
-  return RowStart(0, row) + columnPositions_.At(x).first;
+  return RowStart(0, row) + columnPositions_.At(x).first * first_.step;
 }
 
 const uint8_t* Source::ChromaAt(int plane, int32_t x, int32_t row) const {
@@ -259,7 +261,7 @@ void Source::FillRgbLine(Line* line, int32_t row) {
   ReadPixels(rgb, start, first_);
   for (int c = 0; c < 3; ++c) line->channel[c] = rgb[c];
   line->alpha = nullptr;
-  if (pixels_.alphaByte >= 0) {
+  if (wantsAlpha_) {
     // Alpha is never interpolated.
     const uint8_t* pixels = start + first_.offset[0];
     if (!first_.contiguous) {
@@ -322,6 +324,17 @@ const uint8_t* Source::U(int32_t r) {
 
 const uint8_t* Source::V(int32_t r) {
   return Chroma(2, r, chromaV_, v_);
+}
+
+const uint8_t* Source::Pixels(int32_t r) {
+  const Taps taps = rowPositions_.At(r, 1);
+  if (palette_ != nullptr || interpolates_ || (taps.weight != 0 && taps.first != taps.second)) {
+    return nullptr;
+  }
+  const uint8_t* const row = RowStart(0, taps.first);
+  if (first_.contiguous) return row + first_.offset[0];
+  rows_.gatherPixels(packed_, row, first_.offset, pixels_.bytes, first_.n);
+  return packed_;
 }
 
 RgbRun Source::Rgb(int32_t r) {

@@ -62,6 +62,9 @@ class Source {
   const uint8_t* U(int32_t r);
   const uint8_t* V(int32_t r);
   RgbRun Rgb(int32_t r);
+  // The strip's packed pixels, untouched; null where they are blended or come from a palette.
+  const uint8_t* Pixels(int32_t r);
+  const PixelFormat& pixelFormat() const { return pixels_; }
   PixelChroma ChromaOfPixels(int32_t r);
   // Where the luma of the strip lies in the source as it is wanted; null when it does not.
   const uint8_t* LumaInPlace(int32_t r) const;
@@ -103,6 +106,7 @@ class Source {
   PixelFormat pixels_;
   const uint8_t* palette_;
   bool swappedLuma_;
+  bool wantsAlpha_;            // it is copied to the destination
   bool interpolates_ = false;  // some column of the strip has a weight
 
   // How chroma of pixels is had: the same for every pixel, or lying in the source side by side, or

@@ -172,6 +172,9 @@ struct KestrelRowOps {
   // Channels to packed pixels.
   void (*packRgb)(uint8_t* dst, const uint8_t* const rgb[3], const kestrel::PixelFormat& format,
                   const kestrel::FieldShifts& shifts, kestrel::AlphaFill alpha, int n);
+  // Pixels of one format to pixels of another, with their alpha where both have one, else zero.
+  void (*repackPixels)(uint8_t* dst, const uint8_t* src, const kestrel::PixelFormat& from,
+                       const kestrel::PixelFormat& to, int n);
   // Overwrites byte `alphaByte` of each packed pixel.
   void (*putAlpha)(uint8_t* pixels, const uint8_t* alpha, const kestrel::PixelFormat& format,
                    int n);

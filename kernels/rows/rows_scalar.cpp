@@ -358,6 +358,26 @@ void PutAlpha(uint8_t* pixels, const uint8_t* alpha, const PixelFormat& format, 
   for (int i = 0; i < n; ++i) pixels[i * format.bytes + format.alphaByte] = alpha[i];
 }
 
+void RepackPixels(uint8_t* dst, const uint8_t* src, const PixelFormat& from, const PixelFormat& to,
+                  int n) {
+  constexpr int kPiece = 64;
+  uint8_t channels[4][kPiece];
+  uint8_t* const rgb[3] = {channels[0], channels[1], channels[2]};
+  FieldShifts shifts;
+  for (int c = 0; c < 3; ++c) shifts.right[c] = 8 - int32_t(to.size[c]);
+  for (int x = 0; x < n; x += kPiece) {
+    const int count = n - x < kPiece ? n - x : kPiece;
+    const uint8_t* const in = src + ptrdiff_t{x} * from.bytes;
+    uint8_t* const out = dst + ptrdiff_t{x} * to.bytes;
+    UnpackRgb(rgb, in, from, count);
+    PackRgb(out, rgb, to, shifts, {~0u, 0}, count);
+    if (from.alphaByte >= 0 && to.alphaByte >= 0) {
+      UnpackAlpha(channels[3], in, from, count);
+      PutAlpha(out, channels[3], to, count);
+    }
+  }
+}
+
 template <ptrdiff_t kStep>
 void WriteEvery(uint8_t* dst, const uint8_t* src, int n) {
   for (int i = 0; i < n; ++i) dst[i * kStep] = src[i];
@@ -581,6 +601,7 @@ const RowOps kScalarRows = {"scalar",
                             scalar::MapLevels,
                             scalar::NarrowWithCarry,
                             scalar::PackRgb,
+                            scalar::RepackPixels,
                             scalar::PutAlpha,
                             scalar::Interleave,
                             scalar::Deinterleave,

@@ -38,6 +38,8 @@ void NarrowWithCarry(uint8_t* const dst[3], const uint8_t* const src[3], const F
                      Carry* carry, int n);
 void PackRgb(uint8_t* dst, const uint8_t* const rgb[3], const PixelFormat& format,
              const FieldShifts& shifts, AlphaFill alpha, int n);
+void RepackPixels(uint8_t* dst, const uint8_t* src, const PixelFormat& from, const PixelFormat& to,
+                  int n);
 void PutAlpha(uint8_t* pixels, const uint8_t* alpha, const PixelFormat& format, int n);
 void Interleave(uint8_t* dst, const uint8_t* a, const uint8_t* b, int n);
 void Deinterleave(uint8_t* a, uint8_t* b, const uint8_t* src, int n);

@@ -249,47 +249,69 @@ void PackRgb(uint8_t* dst, const uint8_t* const rgb[3], const PixelFormat& forma
       shape.blueFirst ? b : r, g, shape.blueFirst ? r : b);
 }
 
+// The bytes of kBytes pixels' channels.
+struct PixelBytes {
+  Bytes r, g, b, alpha;
+};
+inline PixelBytes LoadPixels(const uint8_t* src, const PixelShape& shape) {
+  Bytes low, middle, high;
+  Bytes alpha = SetBytes(0);
+  if (shape.bytes == 4) {
+    Bytes channels[4];
+    Load4(src, channels);
+    low = shape.alphaFirst ? channels[1] : channels[0];
+    middle = shape.alphaFirst ? channels[2] : channels[1];
+    high = shape.alphaFirst ? channels[3] : channels[2];
+    alpha = shape.alphaFirst ? channels[0] : channels[3];
+  } else if (shape.bytes == 3) {
+    Bytes channels[3];
+    Load3(src, channels);
+    low = channels[0];
+    middle = channels[1];
+    high = channels[2];
+  } else {
+    const WordsPair w = LoadPixelWords(src);
+    const Words five = SetWords(0xF8);
+    const Words six = SetWords(0xFC);
+    low = Narrow(ShiftLeft<3>(w.low) & five, ShiftLeft<3>(w.high) & five);
+    middle = Narrow(ShiftRightUnsigned<3>(w.low) & six, ShiftRightUnsigned<3>(w.high) & six);
+    high = Narrow(ShiftRightUnsigned<8>(w.low) & five, ShiftRightUnsigned<8>(w.high) & five);
+  }
+  return {shape.blueFirst ? high : low, middle, shape.blueFirst ? low : high, alpha};
+}
+
 void UnpackRgb(uint8_t* const rgb[3], const uint8_t* src, const PixelFormat& format, int n) {
   const PixelShape shape(format);
-  // The channel that is first in memory first.
-  uint8_t* const dsts[] = {rgb[shape.blueFirst ? 2 : 0], rgb[1], rgb[shape.blueFirst ? 0 : 2]};
-  const Units pixels = {src, shape.bytes};
-  if (shape.bytes == 4) {
-    const int first = shape.alphaFirst ? 1 : 0;
-    ForRun<1>(
-        dsts, n,
-        [=](uint8_t* const* out, const uint8_t* in) {
-          Bytes channels[4];
-          Load4(in, channels);
-          for (int c = 0; c < 3; ++c)
-            StoreBytes(out[c], first == 0 ? channels[c] : channels[c + 1]);
-        },
-        pixels);
-  } else if (shape.bytes == 3) {
-    ForRun<1>(
-        dsts, n,
-        [](uint8_t* const* out, const uint8_t* in) {
-          Bytes channels[3];
-          Load3(in, channels);
-          for (int c = 0; c < 3; ++c) StoreBytes(out[c], channels[c]);
-        },
-        pixels);
-  } else if (shape.bytes == 2) {
-    ForRun<1>(
-        dsts, n,
-        [](uint8_t* const* out, const uint8_t* in) {
-          const WordsPair w = LoadPixelWords(in);
-          const Words five = SetWords(0xF8);
-          const Words six = SetWords(0xFC);
-          StoreBytes(out[0], Narrow(ShiftLeft<3>(w.low) & five, ShiftLeft<3>(w.high) & five));
-          StoreBytes(out[1], Narrow(ShiftRightUnsigned<3>(w.low) & six,
-                                    ShiftRightUnsigned<3>(w.high) & six));
-          StoreBytes(out[2], Narrow(ShiftRightUnsigned<8>(w.low) & five,
-                                    ShiftRightUnsigned<8>(w.high) & five));
-        },
-        pixels);
+  if (shape.bytes == 0) return scalar::UnpackRgb(rgb, src, format, n);
+  uint8_t* const dsts[] = {rgb[0], rgb[1], rgb[2]};
+  ForRun<1>(
+      dsts, n,
+      [&](uint8_t* const* out, const uint8_t* in) {
+        const PixelBytes pixels = LoadPixels(in, shape);
+        StoreBytes(out[0], pixels.r);
+        StoreBytes(out[1], pixels.g);
+        StoreBytes(out[2], pixels.b);
+      },
+      Units{src, shape.bytes});
+}
+
+void RepackPixels(uint8_t* dst, const uint8_t* src, const PixelFormat& from, const PixelFormat& to,
+                  int n) {
+  const PixelShape in(from);
+  const PixelShape out(to);
+  if (in.bytes == 0 || out.bytes == 0) return scalar::RepackPixels(dst, src, from, to, n);
+  uint8_t* const dsts[] = {dst};
+  const auto repack = [&](uint8_t* const* pixelsOut, const uint8_t* pixelsIn) {
+    const PixelBytes pixels = LoadPixels(pixelsIn, in);
+    StorePixels(pixelsOut[0], out, pixels.r, pixels.g, pixels.b, pixels.alpha);
+  };
+  const Units pixels = {src, in.bytes};
+  if (out.bytes == 4) {
+    ForRun<4>(dsts, n, repack, pixels);
+  } else if (out.bytes == 3) {
+    ForRun<3>(dsts, n, repack, pixels);
   } else {
-    scalar::UnpackRgb(rgb, src, format, n);
+    ForRun<2>(dsts, n, repack, pixels);
   }
 }
 
@@ -710,6 +732,7 @@ constexpr RowOps VectorRows(const char* name) {
           MapLevels,
           scalar::NarrowWithCarry,
           PackRgb,
+          RepackPixels,
           scalar::PutAlpha,
           Interleave,
           Deinterleave,

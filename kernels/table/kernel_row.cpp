@@ -3,7 +3,15 @@
 namespace kestrel {
 namespace {
 
-bool PairingHolds(Pairing pairing, uint32_t source, uint32_t destination) {
+bool HasByteChannels(uint32_t layout, const uint32_t* sizes, const uint32_t* positions) {
+  if ((layout & (kRgb24 | kRgb32)) == 0) return true;
+  for (int i = 0; i < 3; ++i) {
+    if (sizes[i] != 8 || positions[i] % 8 != 0) return false;
+  }
+  return true;
+}
+
+bool PairingHolds(Pairing pairing, uint32_t source, uint32_t destination, const EngineContext& c) {
   switch (pairing) {
     case Pairing::kSame:
       return source == destination;
@@ -11,6 +19,10 @@ bool PairingHolds(Pairing pairing, uint32_t source, uint32_t destination) {
       return source != destination;
     case Pairing::kOneIsI420:
       return (source == kI420) != (destination == kI420);
+    case Pairing::k601Full:
+      return YuvSide(c).colourStandard == CS_BT601_FULL &&
+             HasByteChannels(source, c.srcChannelSize, c.srcChannelPos) &&
+             HasByteChannels(destination, c.dstChannelSize, c.dstChannelPos);
     default:
       return true;
   }
@@ -18,18 +30,23 @@ bool PairingHolds(Pairing pairing, uint32_t source, uint32_t destination) {
 
 bool ScaleHolds(Scale scale, const EngineContext& c) {
   const bool unit = c.unitStep != 0;
+  const bool unitSteps = c.stepX == 0x10000 && c.stepY == 0x10000;
   const bool bilinear = c.bilinear != 0;
   switch (scale) {
     case Scale::kUnit:
       return unit;
     case Scale::kUnitSteps:
-      return c.stepX == 0x10000 && c.stepY == 0x10000;
+      return unitSteps;
     case Scale::kNotUnit:
       return !unit;
     case Scale::kNearest:
       return !unit && !bilinear;
     case Scale::kNotBilinear:
       return !bilinear;
+    case Scale::kUnitOrNearest:
+      return unitSteps || !bilinear;
+    case Scale::kUnitOrBilinear:
+      return unitSteps || bilinear;
     case Scale::kBilinear:
       return !unit && bilinear;
     case Scale::kBilinearFlag:
@@ -58,6 +75,8 @@ bool TransformHolds(Transform transform, const EngineContext& c) {
       return flags == 5;
     case Transform::kRotate180:
       return flags == 6;
+    case Transform::kRotate90MirrorY:
+      return flags == 7;
     case Transform::kNoSwapNoMirrorX:
       return (flags & 3) == 0;
     case Transform::kSwapMirrorX:
@@ -136,7 +155,7 @@ bool Accepts(const KernelRow& row, const EngineContext& engine) {
   const uint32_t source = FormatOf(engine.srcFormat);
   const uint32_t destination = FormatOf(engine.dstFormat);
   return (row.sources & source) != 0 && (row.destinations & destination) != 0 &&
-         PairingHolds(row.pairing, source, destination) && ScaleHolds(row.scale, engine) &&
+         PairingHolds(row.pairing, source, destination, engine) && ScaleHolds(row.scale, engine) &&
          TransformHolds(row.transform, engine) && BlockHolds(row.block, engine.blockMode);
 }
 

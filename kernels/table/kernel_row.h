@@ -36,7 +36,20 @@ enum FormatSet : uint32_t {
 // The set with just this side's layout; 0 for a layout that no table names.
 uint32_t FormatOf(const FormatDesc& format);
 
-enum class Pairing : uint8_t { kAny, kSame, kDifferent, kOneIsI420 };
+// The side whose colour standard rules a conversion: the source, unless that is RGB.
+inline const FormatDesc& YuvSide(const EngineContext& c) {
+  return c.srcFormat.code == CODE_RGB ? c.dstFormat : c.srcFormat;
+}
+
+// How the two sides must relate.
+enum class Pairing : uint8_t {
+  kAny,
+  kSame,
+  kDifferent,
+  kOneIsI420,
+  k601Full,  // YUV samples are BT.601 full range; 24- and 32-bit pixels have channels of whole
+             // bytes
+};
 
 enum class Scale : uint8_t {
   kAny,
@@ -45,8 +58,10 @@ enum class Scale : uint8_t {
   kNotUnit,    // unitStep is clear
   kNearest,    // neither unitStep nor bilinear
   kNotBilinear,
-  kBilinear,      // bilinear, and unitStep is clear
-  kBilinearFlag,  // bilinear, also where a crop ended at 1:1
+  kUnitOrNearest,   // 1:1 by its steps, whatever bilinear says, or not bilinear
+  kUnitOrBilinear,  // 1:1 by its steps, or bilinear
+  kBilinear,        // bilinear, and unitStep is clear
+  kBilinearFlag,    // bilinear, also where a crop ended at 1:1
 };
 
 // Tests of the three transform flags, or of the whole code, whose high bits flags do not see.
@@ -59,6 +74,7 @@ enum class Transform : uint8_t {
   kMirrorY,
   kRotate270,
   kRotate180,
+  kRotate90MirrorY,
   kNoSwapNoMirrorX,
   kSwapMirrorX,  // mirrorY is not looked at
   kSwapMirrorY,  // mirrorX is not looked at

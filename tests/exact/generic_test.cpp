@@ -632,10 +632,19 @@ TEST(ErrorCarry, RestartsAtTheBandOf32RowsButNotInBandsOf64) {
   EXPECT_EQ(tall[33] >> 11, 12u);
 }
 
+// In the generic converter: one kernel carries the remainders of 24-bit RGB at 1:1.
 TEST(ErrorCarry, IsForYuvSourcesOnly) {
   Bytes source(9, 103);
-  EXPECT_EQ(Convert({FORMAT_RGB565, 3, 1}, 6, {FORMAT_RGB888, 3, 1}, 9, source, Param().Dither()),
-            (Bytes{0x2C, 0x63, 0x2C, 0x63, 0x2C, 0x63}));
+  const Engine engine({FORMAT_RGB565, 3, 1}, {FORMAT_RGB888, 3, 1}, Param().Dither());
+  Bytes pixels(6);
+  const MRECT rect = {0, 0, 3, 1};
+  const int32_t dstPitches[3] = {6, 0, 0};
+  const int32_t srcPitches[3] = {9, 0, 0};
+  uint8_t* const dstPlanes[3] = {pixels.data(), nullptr, nullptr};
+  const uint8_t* const srcPlanes[3] = {source.data(), nullptr, nullptr};
+  EXPECT_EQ(ANY_ANY_C_SLOW(&rect, dstPitches, srcPitches, dstPlanes, srcPlanes, &engine.context()),
+            KESTREL_OK);
+  EXPECT_EQ(pixels, (Bytes{0x2C, 0x63, 0x2C, 0x63, 0x2C, 0x63}));
 }
 
 TEST(ErrorCarry, UsesTheWidthOfEachChannelWhateverTheOrder) {

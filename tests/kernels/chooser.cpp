@@ -107,30 +107,36 @@ class Grid {
  public:
   // The list as text; empty when the chain and the model disagree.
   std::string Write() {
+    Groups sources;
     for (const NamedFormat& src : kFormats) {
-      std::string untouched;
+      Groups destinations;
       for (const NamedFormat& dst : kFormats) {
-        if (!WritePair(src, dst)) {
-          untouched += std::string(" ") + dst.name;
-        }
+        Add(LinesOf(src, dst), dst.name, &destinations);
       }
-      if (!untouched.empty()) {
-        lines_ += std::string(src.name) + " always 0:" + untouched + "\n";
+      std::string lines;
+      for (const auto& [ofPair, names] : destinations) {
+        lines += Prefixed(names + " ", ofPair);
       }
+      Add(lines, src.name, &sources);
+    }
+    std::string lines;
+    for (const auto& [ofSource, names] : sources) {
+      lines += Prefixed(names + " ", ofSource);
     }
     if (disagreements_ != 0) {
       return std::string();
     }
     std::string text =
         "# Which kernel answers, for every pair of formats. Written by tests/kernels/chooser.cpp.\n"
-        "#   source destination scale settings : kernels\n"
+        "#   sources destinations scales settings : kernels\n"
         "# settings: standards of both sides (v video range, f full range, r from full to video\n"
         "# range), a adjusted, d dithered. kernels: for transform codes 0 to 7 the kernels of\n"
-        "# block modes 1,2,3,4; one number when all four are the same, *n for n equal codes.\n";
+        "# block modes 1,2,3,4; one number when all four are the same, *n for n equal codes.\n"
+        "# \"over\": what a kernel has drawn before is drawn once more.\n";
     for (size_t i = 0; i < names_.size(); ++i) {
       text += std::to_string(i) + " = " + names_[i] + "\n";
     }
-    return text + lines_;
+    return text + lines;
   }
 
   uint64_t engines() const { return engines_; }
@@ -138,15 +144,36 @@ class Grid {
  private:
   using Cells = std::string;
 
-  // False when the generic converter does all of it.
-  bool WritePair(const NamedFormat& src, const NamedFormat& dst) {
+  // Texts, and the names of all that have the same one.
+  using Groups = std::vector<std::pair<std::string, std::string>>;
+
+  static void Add(const std::string& text, const std::string& name, Groups* groups) {
+    for (auto& group : *groups) {
+      if (group.first == text) {
+        group.second += "," + name;
+        return;
+      }
+    }
+    groups->emplace_back(text, name);
+  }
+
+  static std::string Prefixed(const std::string& prefix, const std::string& lines) {
+    std::string text;
+    std::istringstream in(lines);
+    for (std::string line; std::getline(in, line);) {
+      text += prefix + line + "\n";
+    }
+    return text;
+  }
+
+  std::string LinesOf(const NamedFormat& src, const NamedFormat& dst) {
     const bool hasLevels = HasStandard(src.code) && HasStandard(dst.code);
     const bool hasStandard = HasStandard(src.code) || HasStandard(dst.code);
     const bool mayDither = dst.code >> 24 == 0x15;
     bool touched = false;
-    std::string lines;
+    Groups scales;
     for (const Scale& scale : kScales) {
-      std::vector<std::pair<Cells, std::string>> groups;
+      Groups groups;
       for (const Standards& standards : kStandards) {
         if ((standards.letter == 'r' && !hasLevels) || (standards.letter == 'f' && !hasStandard)) {
           continue;
@@ -162,24 +189,17 @@ class Grid {
           Add(cells, label, &groups);
         }
       }
+      std::string lines;
       for (const auto& [cells, labels] : groups) {
-        lines += std::string(src.name) + " " + dst.name + " " + scale.name + " " + labels + " : " +
-                 cells + "\n";
+        lines.append(labels).append(" : ").append(cells).append("\n");
       }
+      Add(lines, scale.name, &scales);
     }
-    lines_ += touched ? lines : "";
-    return touched;
-  }
-
-  static void Add(const Cells& cells, const std::string& label,
-                  std::vector<std::pair<Cells, std::string>>* groups) {
-    for (auto& group : *groups) {
-      if (group.first == cells) {
-        group.second += "," + label;
-        return;
-      }
+    std::string lines;
+    for (const auto& [ofScale, names] : scales) {
+      lines += Prefixed(names + " ", ofScale);
     }
-    groups->emplace_back(cells, label);
+    return touched ? lines : "always 0\n";
   }
 
   Cells CellsOf(const NamedFormat& src, const NamedFormat& dst, const Scale& scale,
@@ -233,16 +253,19 @@ class Grid {
     }
     const std::unique_ptr<MPPHandle, FreeEngine> engine(handle);
     const Answer answer = AskChain(engine->pass[0]->context);
-    const std::string got = NameOf(answer.dispatcher, answer.kernel);
-    const std::string expected = NameOf(choice.dispatcher, choice.kernel);
+    const std::string got = NameOf(answer);
+    const std::string expected = NameOf(choice);
     if (got != expected) {
       Disagree(dst, src, params, "choice", got, expected);
     }
     return NumberOf(got);
   }
 
-  static std::string NameOf(const char* dispatcher, const char* kernel) {
-    return kernel ? std::string(dispatcher) + " " + kernel : std::string(dispatcher);
+  template <typename Answering>
+  static std::string NameOf(const Answering& answering) {
+    std::string name = answering.dispatcher;
+    name += answering.kernel ? std::string(" ") + answering.kernel : "";
+    return name + (answering.overwritten ? std::string(" over ") + answering.overwritten : "");
   }
 
   int NumberOf(const std::string& name) {
@@ -268,7 +291,6 @@ class Grid {
   const uint8_t palette_[1024] = {};
   std::vector<std::string> names_{"ANY_ANY_C_SLOW"};
   std::map<std::string, int> numbers_{{"ANY_ANY_C_SLOW", 0}};
-  std::string lines_;
   uint64_t engines_ = 0;
   uint64_t disagreements_ = 0;
 };

@@ -1,4 +1,4 @@
-// The places where decisions and samples of the planar, YUYV and grey kernels are easily wrong.
+// The places where decisions and samples of the kernel families are easily wrong.
 #include <gtest/gtest.h>
 
 #include <algorithm>
@@ -18,6 +18,7 @@ using kestrel::test::OnePlane;
 using kestrel::test::Param;
 using kestrel::test::Planes;
 using kestrel::test::Process;
+using kestrel::test::Side;
 using kestrel::test::ThreePlanes;
 using kestrel::test::VFirst;
 
@@ -36,12 +37,18 @@ Bytes Counting(size_t size, int start = 0) {
 }
 
 // Asks one dispatcher with a rectangle that holds no pixels.
-Observed Ask(KernelFn* dispatcher, const EngineContext& context) {
+Observed Ask(KernelFn* dispatcher, const EngineContext& context,
+             const MRECT& nothing = {0, 0, 0, 0}) {
   uint8_t bytes[8] = {};
   uint8_t* const planes[3] = {bytes, bytes + 4, bytes + 5};
   const int32_t pitches[3] = {2, 2, 2};
-  const MRECT nothing = {0, 0, 0, 0};
   return Observe(dispatcher, &nothing, pitches, pitches, planes, planes, &context);
+}
+
+void ExpectDeclined(KernelFn* dispatcher, const EngineContext& context) {
+  const Observed observed = Ask(dispatcher, context);
+  EXPECT_EQ(observed.answer, KESTREL_UNSUPPORTED);
+  EXPECT_EQ(observed.kernel, nullptr) << "ran before it answered";
 }
 
 TEST(PlanarEdgeCases, ChangedLevelsAreDeclinedWhateverTheFormats) {
@@ -303,6 +310,330 @@ TEST(PlanarEdgeCases, TheFirstKernelOfTheListTakesEveryBlockMode) {
     const Engine engine({FORMAT_I420, 5, 3}, {FORMAT_I422, 5, 3}, Param().Pass(mode));
     EXPECT_STREQ(Ask(YUV2YUV_Fast, engine.context()).kernel, "I422_TO_I420_NORESAMPLE_4x4");
   }
+}
+
+constexpr uint32_t kPlanarCodes[] = {FORMAT_I420, FORMAT_I422, FORMAT_I440, FORMAT_I444};
+constexpr uint32_t kModes[] = {1, 2, 3};
+
+TEST(Rgb16EdgeCases, DitheredPlanarYuvIsNotBlockedIntoBgr565) {
+  for (const uint32_t src : kPlanarCodes) {
+    const Engine dithered({FORMAT_BGR565, 16, 16}, {src, 16, 16}, Param().Pass(3).Dither());
+    ExpectDeclined(ANY_ANY_C_FAST_R5G6B5, dithered.context());
+    const Engine plain({FORMAT_BGR565, 16, 16}, {src, 16, 16}, Param().Pass(3));
+    EXPECT_STREQ(Ask(ANY_ANY_C_FAST_R5G6B5, plain.context()).kernel,
+                 "YUV2RGBFast_NORESAMPLE_B5G6R5_4x4");
+    const Engine unaligned({FORMAT_BGR565, 16, 16}, {src, 16, 16}, Param().Dither());
+    EXPECT_STREQ(Ask(ANY_ANY_C_FAST_R5G6B5, unaligned.context()).kernel,
+                 "YUV2RGBFast_NORESAMPLE_B5G6R5");
+  }
+}
+
+TEST(Rgb16EdgeCases, Nv21TurnedBy270WithoutBlocksGoesToTheCatchAll) {
+  const auto kernelOf = [](uint32_t mode) {
+    const Engine engine({FORMAT_RGB565, 16, 16}, {FORMAT_NV21, 16, 16},
+                        Param().Pass(mode).Transform(5));
+    return Ask(ANY_ANY_C_FAST_R5G6B5, engine.context()).kernel;
+  };
+  EXPECT_STREQ(kernelOf(1), "NV21_TO_RGBFast_R5G6B5_Nearest");
+  EXPECT_STREQ(kernelOf(2), "NV21_To_RGB565_NoResample_2x2_R270");
+  EXPECT_STREQ(kernelOf(3), "NV21_To_RGB565_NoResample_4x4_R270");
+}
+
+// One step of 1.0 is not 1:1, and keeps the catch-all from equal steps.
+TEST(Rgb16EdgeCases, TheCatchAllOfNv21WantsEqualStepsOrTwoOtherThanOne) {
+  const auto answerOf = [](int32_t width, int32_t height, const Param& param) {
+    const Engine engine({FORMAT_RGB565, 16, 16}, {FORMAT_NV21, width, height}, param);
+    return Ask(ANY_ANY_C_FAST_R5G6B5, engine.context()).answer;
+  };
+  EXPECT_EQ(answerOf(24, 12, Param()), KESTREL_OK);
+  EXPECT_EQ(answerOf(16, 12, Param()), KESTREL_UNSUPPORTED);
+  EXPECT_EQ(answerOf(24, 16, Param()), KESTREL_UNSUPPORTED);
+  EXPECT_EQ(answerOf(24, 12, Param().Bilinear()), KESTREL_UNSUPPORTED);
+  EXPECT_EQ(answerOf(24, 24, Param().Bilinear().Dither().Transform(3)), KESTREL_OK);
+}
+
+TEST(Rgb16EdgeCases, The565OrdersAreNotConvertedIntoEachOther) {
+  for (const uint32_t mode : kModes) {
+    for (uint32_t transform = 0; transform < 8; ++transform) {
+      for (const int32_t size : {16, 24}) {
+        for (const bool bilinear : {false, true}) {
+          Param param = Param().Pass(mode).Transform(transform);
+          param.resampleFlags = bilinear ? MPP_BILINEAR : MPP_NEAREST;
+          ExpectDeclined(
+              ANY_ANY_C_FAST_R5G6B5,
+              Engine({FORMAT_BGR565, 16, 16}, {FORMAT_RGB565, size, size}, param).context());
+          ExpectDeclined(
+              ANY_ANY_C_FAST_R5G6B5,
+              Engine({FORMAT_RGB565, 16, 16}, {FORMAT_BGR565, size, size}, param).context());
+        }
+      }
+    }
+  }
+  const Engine engine({FORMAT_BGR565, 2, 1}, {FORMAT_RGB565, 2, 1});
+  Bytes src = {0x00, 0xF8, 0x1F, 0x00}, dst(4);  // red, blue
+  ASSERT_EQ(Process(engine, OnePlane(dst, 4), OnePlane(src, 4)), KESTREL_OK);
+  EXPECT_EQ(dst, (Bytes{0x1F, 0x00, 0x00, 0xF8}));
+}
+
+// Bitmaps of Android, in both codes for them.
+TEST(Rgb32EdgeCases, ABitmapBecomesNv21InTheFamilyThatItsBlocksAllow) {
+  for (const uint32_t src : {FORMAT_XBGR8888, FORMAT_BGRX8888}) {
+    const Engine unaligned({FORMAT_NV21 | FORMAT_BT601_FULL, 16, 16}, {src, 16, 16});
+    EXPECT_STREQ(AskChain(&unaligned.context()).kernel, "RGB32toNV21_Fast_NORESAMPLE");
+    const Engine blocked({FORMAT_NV21 | FORMAT_BT601_FULL, 16, 16}, {src, 16, 16}, Param().Pass(3));
+    EXPECT_STREQ(AskChain(&blocked.context()).kernel, "NEC_BGR32toNVXX_NoResize");
+    EXPECT_STREQ(Ask(YUYV_RGB32_FAST, blocked.context()).kernel, "RGB32toNV21_Fast_NORESAMPLE_4x4")
+        << "it comes too late";
+    const Engine video({FORMAT_NV21, 16, 16}, {src, 16, 16}, Param().Pass(3));
+    EXPECT_STREQ(AskChain(&video.context()).kernel, "RGB32toNV21_Fast_NORESAMPLE_4x4");
+  }
+}
+
+TEST(Rgb32EdgeCases, SemiPlanarYuvScaledByEqualStepsIsDeclined) {
+  for (const uint32_t src : {FORMAT_NV21, FORMAT_NV12}) {
+    for (const uint32_t mode : kModes) {
+      const Engine equal({FORMAT_XRGB8888, 16, 16}, {src, 24, 24}, Param().Bilinear().Pass(mode));
+      ExpectDeclined(ANY_ANY_C_FAST_RGB32, equal.context());
+      const Engine nearest({FORMAT_XRGB8888, 16, 16}, {src, 24, 24}, Param().Pass(mode));
+      ExpectDeclined(ANY_ANY_C_FAST_RGB32, nearest.context());
+      const Engine other({FORMAT_XRGB8888, 16, 16}, {src, 24, 20}, Param().Bilinear().Pass(mode));
+      EXPECT_STREQ(Ask(ANY_ANY_C_FAST_RGB32, other.context()).kernel, "NV21toRGB32_Fast_BilNear");
+    }
+  }
+}
+
+TEST(Rgb32EdgeCases, AnotherPlaceOfBlueIsDeclined) {
+  constexpr uint32_t kBlueHighest = 0x170017F7;  // green is 16 bits wide
+  for (const uint32_t mode : kModes) {
+    const Engine engine({FORMAT_XBGR8888, 16, 16}, {kBlueHighest, 24, 24}, Param().Pass(mode));
+    const uint32_t* const positions = engine.context().srcChannelPos;
+    ASSERT_EQ(std::vector<uint32_t>(positions, positions + 3), (std::vector<uint32_t>{0, 8, 24}));
+    ExpectDeclined(ANY_ANY_C_FAST_RGB32, engine.context());
+    const Engine same({FORMAT_XBGR8888, 16, 16}, {FORMAT_XBGR8888, 24, 24}, Param().Pass(mode));
+    EXPECT_EQ(Ask(ANY_ANY_C_FAST_RGB32, same.context()).answer, KESTREL_OK);
+  }
+}
+
+TEST(Rgb32EdgeCases, TransformedYuyvIsTakenIntoBgr32Only) {
+  for (const uint32_t mode : kModes) {
+    for (uint32_t transform = 0; transform < 8; ++transform) {
+      const Param param = Param().Pass(mode).Transform(transform);
+      const Engine engine({FORMAT_XBGR8888, 16, 16}, {FORMAT_YUYV, 16, 16}, param);
+      EXPECT_STREQ(Ask(YUYV_RGB32_FAST, engine.context()).kernel, "YUYVtoBGR32_Fast_NORESAMPLE");
+      const Engine other({FORMAT_XRGB8888, 16, 16}, {FORMAT_YUYV, 16, 16}, param);
+      const bool isTaken = mode == 3 && transform == 0;
+      EXPECT_EQ(Ask(YUYV_RGB32_FAST, other.context()).answer,
+                isTaken ? KESTREL_OK : KESTREL_UNSUPPORTED);
+    }
+  }
+}
+
+TEST(Rgb32EdgeCases, MirroredYuyvComesOutMirrored) {
+  const Engine engine({FORMAT_XBGR8888, 4, 1}, {FORMAT_YUYV, 4, 1},
+                      Param().Transform(MPP_MIRROR_X));
+  ASSERT_STREQ(AskChain(&engine.context()).kernel, "YUYVtoBGR32_Fast_NORESAMPLE");
+  Bytes src = {50, 128, 80, 128, 110, 128, 140, 128}, dst(16);
+  ASSERT_EQ(Process(engine, OnePlane(dst, 16), OnePlane(src, 8)), KESTREL_OK);
+  const Engine upright({FORMAT_XBGR8888, 4, 1}, {FORMAT_YUYV, 4, 1});
+  Bytes again(16);
+  ASSERT_EQ(Process(upright, OnePlane(again, 16), OnePlane(src, 8)), KESTREL_OK);
+  for (size_t x = 0; x < 4; ++x) {
+    EXPECT_TRUE(std::equal(&dst[4 * x], &dst[4 * x] + 4, &again[4 * (3 - x)])) << "column " << x;
+    EXPECT_GT(again[4 * x], x == 0 ? 0 : again[4 * (x - 1)]) << "brighter from column to column";
+  }
+}
+
+// The dispatcher draws and answers 3 all the same; the chain goes on to the generic converter.
+TEST(Rgb32EdgeCases, APictureOfI420IsDrawnTwice) {
+  const Engine engine({FORMAT_XRGB8888, 4, 4}, {FORMAT_I420, 4, 4}, Param().Alpha(9));
+  const Answer answer = AskChain(&engine.context());
+  EXPECT_STREQ(answer.dispatcher, "ANY_ANY_C_SLOW");
+  EXPECT_STREQ(answer.overwritten, "I420toRGB32_Fast_NORESAMPLE_1x1");
+
+  Bytes srcY = Counting(16, 60), srcU = Counting(4, 100), srcV = Counting(4, 140);
+  const Planes src = ThreePlanes(srcY, 4, srcU, srcV, 2);
+  Bytes whole(64);
+  ASSERT_EQ(Process(engine, OnePlane(whole, 16), src), KESTREL_OK);
+
+  const auto draw = [&](KernelFn* dispatcher, Bytes* picture) {
+    uint8_t* const starts[3] = {picture->data(), picture->data(), picture->data()};
+    const int32_t pitches[3] = {16, 16, 16};
+    const MRECT rect = {0, 0, 4, 4};
+    return Observe(dispatcher, &rect, pitches, src.pitch, starts, src.plane, &engine.context());
+  };
+  Bytes first(64), second(64);
+  const Observed observed = draw(YUV_RGB32_C_FAST, &first);
+  EXPECT_EQ(observed.answer, KESTREL_UNSUPPORTED);
+  EXPECT_STREQ(observed.kernel, "I420toRGB32_Fast_NORESAMPLE_1x1");
+  EXPECT_EQ(draw(ANY_ANY_C_SLOW, &second).answer, KESTREL_OK);
+  EXPECT_EQ(first, whole) << "both draw the same picture";
+  EXPECT_EQ(second, whole);
+  EXPECT_EQ(whole[3], 9);
+}
+
+// Rectangles off the grid of 8 x 8 go to the kernel that takes any; both end the chain.
+TEST(Rgb32EdgeCases, BlockedI420LooksAtTheRectangle) {
+  const Engine engine({FORMAT_XRGB8888, 64, 64}, {FORMAT_I420, 64, 64}, Param().Pass(3));
+  const auto kernelOf = [&engine](const MRECT& rect) {
+    const Observed observed = Ask(YUV_RGB32_C_FAST, engine.context(), rect);
+    EXPECT_EQ(observed.answer, KESTREL_OK);
+    return observed.kernel;
+  };
+  EXPECT_STREQ(kernelOf({8, 16, 8, 24}), "I420toRGB32_Fast_NORESAMPLE");
+  EXPECT_STREQ(kernelOf({4, 16, 4, 24}), "I420toRGB32_Any_Fast_1x1");
+  EXPECT_STREQ(kernelOf({8, 20, 8, 24}), "I420toRGB32_Any_Fast_1x1");
+  EXPECT_STREQ(kernelOf({16, 16, 12, 24}), "I420toRGB32_Any_Fast_1x1");
+  EXPECT_STREQ(kernelOf({8, 16, 8, 12}), "I420toRGB32_Any_Fast_1x1");
+}
+
+// What was asked for, not what came of it: mode 4 is asked for and becomes block mode 3.
+TEST(Rgb32EdgeCases, TheBlended4x4KernelWantsPassModeThree) {
+  const auto kernelOf = [](uint32_t mode) {
+    const Engine engine({FORMAT_XRGB8888, 16, 16}, {FORMAT_I420, 24, 24},
+                        Param().Bilinear().Pass(mode));
+    EXPECT_EQ(engine.context().blockMode, mode == 4 ? 3 : mode);
+    return AskChain(&engine.context()).kernel;
+  };
+  EXPECT_STREQ(kernelOf(3), "I420toRGB32_R0_Fast_BilNear_4x4");
+  EXPECT_STREQ(kernelOf(4), "I420toRGB32_Fast_BilNear");
+  EXPECT_STREQ(kernelOf(2), "I420toRGB32_Fast_BilNear");
+}
+
+TEST(Rgb24EdgeCases, BlocksOf2x2HaveNoKernelOfTheirOwnIntoI420) {
+  const auto kernelOf = [](uint32_t mode) {
+    const Engine engine({FORMAT_I420, 16, 16}, {FORMAT_RGB888, 16, 16}, Param().Pass(mode));
+    return AskChain(&engine.context()).kernel;
+  };
+  EXPECT_STREQ(kernelOf(2), "RGB2YUVFast_NORESAMPLE");
+  EXPECT_STREQ(kernelOf(1), "RGB2YUVFast_NORESAMPLE");
+  EXPECT_STREQ(kernelOf(3), "RGB2YUVFast_NORESAMPLE_NOROTATE_R8G8B8_4x4");
+}
+
+TEST(Rgb24EdgeCases, MirroredResizesGoToTheGeneral4x4Kernel) {
+  constexpr const char* kByTransform[] = {
+      "RGB2RGBFast_RGB888_N_RESIZE_4x4_R0",       "RGB2RGBFast_RGB888_N_RESIZE_4x4_SwapXY",
+      "RGB2RGBFast_RGB888_N_RESIZE_4x4",          "RGB2RGBFast_RGB888_N_RESIZE_4x4",
+      "RGB2RGBFast_RGB888_N_RESIZE_4x4_VERTICAL", "RGB2RGBFast_RGB888_N_RESIZE_4x4_R270",
+      "RGB2RGBFast_RGB888_N_RESIZE_4x4",          "RGB2RGBFast_RGB888_N_RESIZE_4x4"};
+  for (uint32_t transform = 0; transform < 8; ++transform) {
+    const Engine engine({FORMAT_RGB888, 16, 16}, {FORMAT_RGB888, 24, 24},
+                        Param().Pass(3).Transform(transform));
+    EXPECT_STREQ(AskChain(&engine.context()).kernel, kByTransform[transform]) << transform;
+  }
+}
+
+// No engine dithers 24 bits; its context is made to.
+TEST(Rgb24EdgeCases, DitheredNv21IsDeclined) {
+  const Engine engine({FORMAT_RGB888, 16, 16}, {FORMAT_NV21, 16, 16}, Param().Dither());
+  EXPECT_EQ(engine.context().dither, 0u);
+  EXPECT_STREQ(Ask(ANY_ANY_C_FAST_R8G8B8, engine.context()).kernel,
+               "NV21_To_RGB888_NoResample_1x1");
+  engine.context().dither = 1;
+  ExpectDeclined(ANY_ANY_C_FAST_R8G8B8, engine.context());
+}
+
+TEST(Rgb24EdgeCases, ResizedRgb32IsDeclined) {
+  for (const uint32_t mode : kModes) {
+    for (uint32_t transform = 0; transform < 8; ++transform) {
+      const Param param = Param().Pass(mode).Transform(transform);
+      const Engine copied({FORMAT_RGB888, 16, 16}, {FORMAT_XRGB8888, 16, 16}, param);
+      EXPECT_STREQ(Ask(ANY_ANY_C_FAST_R8G8B8, copied.context()).kernel,
+                   "RGB2RGBFast_RGB32_TO_RGB24_NORESAMPLE");
+      const Engine nearest({FORMAT_RGB888, 16, 16}, {FORMAT_XRGB8888, 24, 16}, param);
+      ExpectDeclined(ANY_ANY_C_FAST_R8G8B8, nearest.context());
+      const Engine blended({FORMAT_RGB888, 16, 16}, {FORMAT_XRGB8888, 16, 24},
+                           Param(param).Bilinear());
+      ExpectDeclined(ANY_ANY_C_FAST_R8G8B8, blended.context());
+    }
+  }
+}
+
+constexpr uint32_t kAllCodes[] = {
+    FORMAT_RGB565, FORMAT_BGR565, FORMAT_RGB888, FORMAT_BGR888, FORMAT_XRGB8888, FORMAT_XBGR8888,
+    FORMAT_YUYV,   FORMAT_YUV444, FORMAT_I420,   FORMAT_I422,   FORMAT_I440,     FORMAT_I444,
+    FORMAT_YV12,   FORMAT_NV21,   FORMAT_NV12,   FORMAT_NV61,   FORMAT_GRAY8,
+};
+
+TEST(VectorEdgeCases, OnlyFullRange601SourcesAreTaken) {
+  int taken = 0;
+  for (const uint32_t standard :
+       {FORMAT_BT601_VIDEO, FORMAT_BT601_FULL, FORMAT_BT709_VIDEO, FORMAT_BT709_FULL}) {
+    for (const uint32_t dst : kAllCodes) {
+      for (const uint32_t mode : kModes) {
+        for (uint32_t transform = 0; transform < 8; ++transform) {
+          for (const int32_t size : {16, 24}) {
+            const Engine engine({dst, 16, 16}, {FORMAT_NV21 | standard, size, size},
+                                Param().Bilinear().Pass(mode).Transform(transform));
+            if (standard != FORMAT_BT601_FULL) {
+              ExpectDeclined(NEC_ALL, engine.context());
+            } else {
+              taken += Ask(NEC_ALL, engine.context()).answer == KESTREL_OK ? 1 : 0;
+            }
+          }
+        }
+      }
+    }
+  }
+  // 1:1 into 2 layouts of each depth, blended into 24 and 32 bits and I420, turned into 32 bits.
+  EXPECT_EQ(taken, 3 * 2 + 2 * 2 + 1 + 2);
+  const Engine video({FORMAT_XBGR8888, 16, 16}, {FORMAT_NV21, 16, 16}, Param().Pass(3));
+  EXPECT_STREQ(AskChain(&video.context()).kernel, "NV21_TO_RGB32Fast_NORESAMPLE_4x4");
+}
+
+TEST(VectorEdgeCases, BlocksOf2x2AreDeclined) {
+  for (const uint32_t dst : {FORMAT_XRGB8888, FORMAT_XBGR8888}) {
+    for (const uint32_t mode : kModes) {
+      const Engine engine({dst, 16, 16}, {FORMAT_NV21 | FORMAT_BT601_FULL, 16, 16},
+                          Param().Pass(mode));
+      EXPECT_STREQ(Ask(NEC_ALL, engine.context()).kernel,
+                   mode == 3 ? "NEC_NV21YCbCr601toBGR32_NoResize" : nullptr);
+    }
+  }
+}
+
+TEST(VectorEdgeCases, OfTheTurnsOnlyABlended90IsTaken) {
+  for (uint32_t transform = 1; transform < 8; ++transform) {
+    const Param param = Param().Pass(3).Transform(transform);
+    const Side dst = {FORMAT_XBGR8888, 16, 16};
+    const Engine blended(dst, {FORMAT_NV21 | FORMAT_BT601_FULL, 24, 24}, Param(param).Bilinear());
+    if (transform == 3) {
+      EXPECT_STREQ(Ask(NEC_ALL, blended.context()).kernel, "NEC_NV21toBGR32_Fast_BilNear_R90");
+    } else {
+      ExpectDeclined(NEC_ALL, blended.context());
+    }
+    for (const int32_t size : {16, 24}) {  // 1:1, nearest
+      const Engine other(dst, {FORMAT_NV21 | FORMAT_BT601_FULL, size, size}, param);
+      ExpectDeclined(NEC_ALL, other.context());
+    }
+    const Engine nv12(dst, {FORMAT_NV12 | FORMAT_BT601_FULL, 24, 24}, Param(param).Bilinear());
+    ExpectDeclined(NEC_ALL, nv12.context());
+  }
+}
+
+// No flag sees the fourth bit of a transform code; this family looks at the whole code.
+TEST(VectorEdgeCases, CodesBeyondTheFlagsAreDeclined) {
+  for (const uint32_t dst : kAllCodes) {
+    for (const int32_t size : {16, 24}) {
+      for (const uint32_t code : {0u, 3u}) {
+        const Engine engine({dst, 16, 16}, {FORMAT_NV21 | FORMAT_BT601_FULL, size, size},
+                            Param().Bilinear().Pass(3).Transform(8 | code));
+        ASSERT_EQ(engine.context().swapXY != 0, code == 3);
+        ExpectDeclined(NEC_ALL, engine.context());
+      }
+    }
+  }
+}
+
+// Creation has turned both standards of such an engine into video range.
+TEST(VectorEdgeCases, AdjustedFullRangeYuvIsDeclined) {
+  const Side dst = {FORMAT_I420 | FORMAT_BT601_FULL, 16, 16};
+  const Side src = {FORMAT_NV21 | FORMAT_BT601_FULL, 24, 24};
+  const Engine plain(dst, src, Param().Bilinear().Pass(3));
+  EXPECT_STREQ(Ask(NEC_ALL, plain.context()).kernel, "NEC_NV21toI420_Fast_BilNear");
+  const Engine adjusted(dst, src, Param().Bilinear().Pass(3).Adjust(10, 0, 0));
+  ExpectDeclined(NEC_ALL, adjusted.context());
+  const Engine narrowed({FORMAT_I420, 16, 16}, src, Param().Bilinear().Pass(3).Adjust(10, 0, 0));
+  EXPECT_STREQ(Ask(NEC_ALL, narrowed.context()).kernel, "NEC_NV21toI420_Fast_BilNear");
 }
 
 }  // namespace

@@ -16,34 +16,111 @@ struct PublicCode {
   uint32_t code;
 };
 
+constexpr uint32_t kRgb = kestrel::kRgb16 | kestrel::kRgb24 | kestrel::kRgb32;
+
+// RGB in all channel orders, and in layouts without a name: narrower, wider and shifted fields.
 constexpr PublicCode kCodes[] = {
-    {kestrel::kRgb24, FORMAT_RGB888},  {kestrel::kRgb24, FORMAT_BGR888},
-    {kestrel::kRgb24, FORMAT_RGB666},  {kestrel::kRgb24, FORMAT_BGR666},
-    {kestrel::kRgb24, 0x16000565},     {kestrel::kRgb24, 0x36001676},
-    {kestrel::kGrey, FORMAT_GRAY8},    {kestrel::kI420, FORMAT_I420},
-    {kestrel::kI440, FORMAT_I440},     {kestrel::kI422, FORMAT_I422},
-    {kestrel::kI444, FORMAT_I444},     {kestrel::kYv12, FORMAT_YV12},
-    {kestrel::kNv21, FORMAT_NV21},     {kestrel::kNv12, FORMAT_NV12},
-    {kestrel::kNv61, FORMAT_NV61},     {kestrel::kYuyv, FORMAT_YUYV},
-    {kestrel::kYuv444, FORMAT_YUV444},
+    {kestrel::kRgb16, FORMAT_RGB565},   {kestrel::kRgb16, FORMAT_BGR565},
+    {kestrel::kRgb16, 0x15000444},      {kestrel::kRgb16, 0x35001454},
+    {kestrel::kRgb32, FORMAT_XRGB8888}, {kestrel::kRgb32, FORMAT_XBGR8888},
+    {kestrel::kRgb32, FORMAT_RGBX8888}, {kestrel::kRgb32, FORMAT_BGRX8888},
+    {kestrel::kRgb32, 0x37010777},      {kestrel::kRgb32, 0x37011777},
+    {kestrel::kRgb32, 0x17001999},      {kestrel::kRgb24, FORMAT_RGB888},
+    {kestrel::kRgb24, FORMAT_BGR888},   {kestrel::kRgb24, FORMAT_RGB666},
+    {kestrel::kRgb24, FORMAT_BGR666},   {kestrel::kRgb24, 0x16000565},
+    {kestrel::kRgb24, 0x36001676},      {kestrel::kGrey, FORMAT_GRAY8},
+    {kestrel::kI420, FORMAT_I420},      {kestrel::kI440, FORMAT_I440},
+    {kestrel::kI422, FORMAT_I422},      {kestrel::kI444, FORMAT_I444},
+    {kestrel::kYv12, FORMAT_YV12},      {kestrel::kNv21, FORMAT_NV21},
+    {kestrel::kNv12, FORMAT_NV12},      {kestrel::kNv61, FORMAT_NV61},
+    {kestrel::kYuyv, FORMAT_YUYV},      {kestrel::kYuv444, FORMAT_YUV444},
 };
 
-uint32_t DrawCode(Random* random, uint32_t layouts) {
+uint32_t DrawStandard(Random* random) {
+  return uint32_t(random->Between(0, 3)) << 12;
+}
+
+PublicCode DrawCode(Random* random, uint32_t layouts) {
   PublicCode code;
   do {
     code = random->Pick(kCodes);
   } while ((code.layout & layouts) == 0);
-  const bool hasStandard = code.layout != kestrel::kRgb24;
-  return code.code |
-         (hasStandard && random->Percent(60) ? uint32_t(random->Between(0, 3)) << 12 : 0);
+  if ((code.layout & kRgb) == 0 && random->Percent(60)) {
+    code.code |= DrawStandard(random);
+  }
+  return code;
+}
+
+void DrawFormats(Random* random, const kestrel::KernelRow& row, Case* drawn) {
+  PublicCode src = DrawCode(random, row.sources);
+  const bool same = row.pairing == kestrel::Pairing::kSame;
+  PublicCode dst = DrawCode(random, same ? src.layout : row.destinations);
+  if (row.pairing == kestrel::Pairing::k601Full && random->Percent(80)) {
+    PublicCode* const yuv = (src.layout & kRgb) != 0 ? &dst : &src;
+    yuv->code = (yuv->code & ~FORMAT_STANDARD_MASK) | FORMAT_BT601_FULL;
+  }
+  if (same && (src.layout & kRgb) == 0) {
+    dst.code = (src.code & ~FORMAT_STANDARD_MASK) | DrawStandard(random);
+  } else if (src.layout == dst.layout && random->Percent(40)) {
+    dst = src;
+  }
+  drawn->src.record.format = src.code;
+  drawn->dst.record.format = dst.code;
+}
+
+uint32_t DrawTransform(Random* random, kestrel::Transform wanted) {
+  using kestrel::Transform;
+  if (random->Percent(50)) {
+    switch (wanted) {
+      case Transform::kNone:
+      case Transform::kCode0:
+        return 0;
+      case Transform::kRotate90:
+      case Transform::kCode3:
+        return 3;
+      case Transform::kRotate270:
+      case Transform::kCode5:
+        return 5;
+      case Transform::kRotate90MirrorY:
+        return 7;
+      default:
+        break;
+    }
+  }
+  // No flag sees the fourth bit, tests of the whole code do.
+  return uint32_t(random->Between(0, 7)) | (random->Percent(8) ? 8 : 0);
+}
+
+uint32_t DrawPassMode(Random* random, kestrel::Block wanted) {
+  if (wanted == kestrel::Block::k4x4 && random->Percent(50)) {
+    return 3;
+  }
+  return uint32_t(random->Between(1, 4));
+}
+
+int32_t DrawAdjustment(Random* random) {
+  constexpr int32_t kExtremes[] = {-128, 0, 128};
+  return random->Percent(40) ? random->Pick(kExtremes) : random->Between(-128, 128);
 }
 
 int32_t DrawLength(Random* random) {
   return random->Between(1, random->Percent(60) ? 20 : 70);
 }
 
-bool TakesUnitScale(kestrel::Scale scale) {
-  return scale == kestrel::Scale::kUnit || scale == kestrel::Scale::kUnitSteps;
+// What is drawn for rows that take 1:1 and something else.
+kestrel::Scale DrawScale(Random* random, kestrel::Scale scale) {
+  using kestrel::Scale;
+  const bool unit = random->Percent(50);
+  switch (scale) {
+    case Scale::kUnitSteps:
+      return Scale::kUnit;
+    case Scale::kUnitOrNearest:
+      return unit ? Scale::kUnit : Scale::kNearest;
+    case Scale::kUnitOrBilinear:
+      return unit ? Scale::kUnit : Scale::kBilinear;
+    default:
+      return scale;
+  }
 }
 
 void DrawSizes(Random* random, kestrel::Scale scale, Case* drawn) {
@@ -52,7 +129,7 @@ void DrawSizes(Random* random, kestrel::Scale scale, Case* drawn) {
   src.height = DrawLength(random);
   int32_t width = src.width;
   int32_t height = src.height;
-  const bool takesUnit = TakesUnitScale(scale);
+  const bool takesUnit = scale == kestrel::Scale::kUnit;
   const int32_t kind = random->Between(1, 100);
   if (takesUnit && kind <= 10 && height > 1) {  // 1:1 after cropping, and bilinear all the same
     height = random->Between(1, height - 1);
@@ -91,28 +168,23 @@ EngineHandle CreateEngine(const MPPFORMAT& dst, const MPPFORMAT& src, const MPPP
 
 Case DrawForKernel(Random* random, const kestrel::KernelRow& row) {
   Case drawn{};
-  drawn.src.record.format = DrawCode(random, row.sources);
-  const bool same = row.pairing == kestrel::Pairing::kSame;
-  drawn.dst.record.format = same ? (drawn.src.record.format & ~FORMAT_STANDARD_MASK) |
-                                       uint32_t(random->Between(0, 3)) << 12
-                                 : DrawCode(random, row.destinations);
+  DrawFormats(random, row, &drawn);
   MPPPARAM& params = drawn.params;
-  const bool mayBlend = !TakesUnitScale(row.scale) && row.scale != kestrel::Scale::kNearest &&
-                        row.scale != kestrel::Scale::kNotBilinear;
+  const kestrel::Scale scale = DrawScale(random, row.scale);
+  const bool mayBlend = scale != kestrel::Scale::kNearest && scale != kestrel::Scale::kNotBilinear;
   params.resampleFlags = mayBlend && random->Percent(85) ? MPP_BILINEAR : MPP_NEAREST;
-  params.transformCode = uint32_t(random->Between(0, 7));
-  if (random->Percent(8)) {
-    params.transformCode |= 8;  // no flag sees it, tests of the whole code do
-  }
-  params.passMode = uint32_t(random->Between(1, 4));
+  params.transformCode = DrawTransform(random, row.transform);
+  params.passMode = DrawPassMode(random, row.block);
   params.bandSelector = uint32_t(random->Between(0, 5));
   params.aspectMode = random->Percent(80) ? 0 : uint32_t(random->Between(1, 2));
-  if (random->Percent(20)) {
-    params.brightness = random->Between(-128, 128);
-    params.contrast = random->Between(-128, 128);
-    params.saturation = random->Between(-128, 128);
+  params.dither = random->Percent(50) ? uint32_t(random->Between(1, 3)) : 0;
+  params.alpha = random->Percent(80) ? uint32_t(random->Between(0, 255)) : uint32_t(random->Next());
+  if (random->Percent((row.destinations & kRgb) != 0 ? 40 : 20)) {
+    params.brightness = DrawAdjustment(random);
+    params.contrast = DrawAdjustment(random);
+    params.saturation = DrawAdjustment(random);
   }
-  DrawSizes(random, row.scale, &drawn);
+  DrawSizes(random, scale, &drawn);
   if (random->Percent(50)) {
     params.srcOriginX = random->Between(0, 5);
     params.srcOriginY = random->Between(0, 5);

@@ -13,6 +13,7 @@ using differential::Random;
 
 constexpr int kJobs = KESTREL_KERNEL_JOBS;
 constexpr int kRefusals = kJobs / 4 + 1;
+constexpr uint32_t kRgb = kestrel::kRgb16 | kestrel::kRgb24 | kestrel::kRgb32;
 
 // Engines are cheap, but a kernel whose engines are never met is not tested.
 constexpr int kMostDraws = 2000 * kJobs;
@@ -123,12 +124,14 @@ TEST_P(EveryKernel, DrawsNothingIntoAnEmptyRectangle) {
 // A departure that no job shows would not be tested by comparing jobs.
 TEST_P(EveryKernel, DepartsVisibly) {
   constexpr bool reference::Quirks::*kFlags[] = {
-      &reference::Quirks::storedLevels, &reference::Quirks::chromaOfPairs,
-      &reference::Quirks::edgesOfPairs, &reference::Quirks::sharedLowerLine,
-      &reference::Quirks::noEdgeColumns};
+      &reference::Quirks::storedLevels,  &reference::Quirks::chromaOfPairs,
+      &reference::Quirks::edgesOfPairs,  &reference::Quirks::sharedLowerLine,
+      &reference::Quirks::noEdgeColumns, &reference::Quirks::sixBitMatrix,
+      &reference::Quirks::noDither,      &reference::Quirks::nearestOnly,
+      &reference::Quirks::clampedCarry,  &reference::Quirks::carriesAlways};
   const reference::Quirks quirks = reference::QuirksOf(row().name);
   const bool isGrey = row().sources == kestrel::kGrey;  // the same chroma everywhere
-  const bool isRgb = row().sources == kestrel::kRgb24;  // has no levels to change
+  const bool isRgb = (row().sources & kRgb) != 0;       // has no levels to change
   for (bool reference::Quirks::*const flag : kFlags) {
     reference::Quirks without = quirks;
     without.*flag = false;
@@ -162,7 +165,12 @@ TEST_P(EveryKernel, DepartsWhereItsLineSays) {
   EXPECT_EQ(has(kestrel::kPairEdges), quirks.edgesOfPairs);
   EXPECT_EQ(has(kestrel::kSharedLowerLine), quirks.sharedLowerLine);
   EXPECT_EQ(has(kestrel::kNoEdgeColumns), quirks.noEdgeColumns);
-  const bool hasLevels = (row().sources & kestrel::kRgb24) == 0;
+  EXPECT_EQ(has(kestrel::kSixBitMatrix), quirks.sixBitMatrix);
+  EXPECT_EQ(has(kestrel::kNearestOnly), quirks.nearestOnly);
+  EXPECT_EQ(has(kestrel::kClampedCarry), quirks.clampedCarry);
+  EXPECT_EQ(has(kestrel::kClampedCarry) && !has(kestrel::kCarryIfAsked), quirks.carriesAlways);
+  EXPECT_EQ(has(kestrel::kNoDither) && !has(kestrel::kSixBitMatrix), quirks.noDither);
+  const bool hasLevels = ((row().sources | row().destinations) & kRgb) == 0;
   if (hasLevels) {
     EXPECT_EQ(has(kestrel::kNoLevelMap), quirks.storedLevels);
   }

@@ -30,6 +30,11 @@ constexpr SetName kQuirks[] = {
     {kPairEdges, "edge columns tested in pairs"},
     {kSharedLowerLine, "rows of a pair share the lower line"},
     {kNoEdgeColumns, "no edge columns"},
+    {kClampedCarry, "dithers from clamped channels"},
+    {kCarryIfAsked, "if asked"},
+    {kNoDither, "never dithered"},
+    {kNearestOnly, "always nearest"},
+    {kSixBitMatrix, "6-bit matrix, never adjusted"},
 };
 
 template <size_t kSize>
@@ -49,6 +54,8 @@ const char* Text(Pairing pairing) {
       return " (different on the two sides)";
     case Pairing::kOneIsI420:
       return " (exactly one side I420)";
+    case Pairing::k601Full:
+      return " (BT.601 full range; 24- and 32-bit RGB of 8-bit channels)";
     default:
       return "";
   }
@@ -66,6 +73,10 @@ const char* Text(Scale scale) {
       return "nearest";
     case Scale::kNotBilinear:
       return "1:1 or nearest";
+    case Scale::kUnitOrNearest:
+      return "1:1 (by its steps) or nearest";
+    case Scale::kUnitOrBilinear:
+      return "1:1 (by its steps) or bilinear";
     case Scale::kBilinear:
       return "bilinear";
     case Scale::kBilinearFlag:
@@ -91,6 +102,8 @@ const char* Text(Transform transform) {
       return "270 degrees";
     case Transform::kRotate180:
       return "180 degrees";
+    case Transform::kRotate90MirrorY:
+      return "90 degrees and mirror Y";
     case Transform::kNoSwapNoMirrorX:
       return "none or mirror Y";
     case Transform::kSwapMirrorX:

@@ -2,7 +2,9 @@
 // older than the decision, and stays: callers know it. Each such place is listed with its reason.
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cstring>
+#include <initializer_list>
 #include <set>
 #include <string>
 
@@ -27,6 +29,12 @@ constexpr const char* kAnyAtUnitScale =
 constexpr const char* kBothOrders = "the order of chroma in a pair is a matter of addresses";
 constexpr const char* kBothWays = "converts in either direction";
 
+constexpr const char* kOneToOneIsNearest = "1:1 is nearest as well";
+constexpr const char* kBlended = "chosen for blended jobs";
+constexpr const char* kBoth2x2And4x4 = "4x4 engines are made of 2x2 blocks too";
+constexpr const char* kNoBlocks = "takes any rectangle";
+constexpr const char* kPassMode = "its dispatcher looks at the pass mode that was asked for";
+
 constexpr Exception kExceptions[] = {
     {"I422_TO_I420_NORESAMPLE*", "source", kBothWays},
     {"I422_TO_I420_NORESAMPLE*", "destination", kBothWays},
@@ -47,16 +55,15 @@ constexpr Exception kExceptions[] = {
     {"NV12_TO_NV21_*", "source", kBothWays},
     {"NV12_TO_NV21_*", "destination", kBothWays},
     {"YUVtoNV21Fast_*", "destination", kBothOrders},
-    {"NV21toI420Fast_Nearest_RESAMPLE_R0_4x4", "scale", "1:1 is nearest as well"},
-    {"NV12_To_NV12_Fast_R90_2x2", "block", "rows of 4x4 engines are made of 2x2 blocks too"},
-    {"NV12_To_NV12_Fast_Bilinear_R90_2x2", "block",
-     "rows of 4x4 engines are made of 2x2 blocks too"},
+    {"NV21toI420Fast_Nearest_RESAMPLE_R0_4x4", "scale", kOneToOneIsNearest},
+    {"NV12_To_NV12_Fast_R90_2x2", "block", kBoth2x2And4x4},
+    {"NV12_To_NV12_Fast_Bilinear_R90_2x2", "block", kBoth2x2And4x4},
     {"NV21_To_NV21_REAMPLE_NOROTATE_BILINEAR_Fast_2x2", "block", "chosen for 4x4 engines"},
     {"YUVtoNV21Fast_NORESAMPLE_R0_4x4", "transform", "looks at the whole transform code"},
     {"YUYVtoYUYVFast_N_RESAMPLE_R0_4x4", "block", "chosen for 2x2 engines"},
     {"I420_To_I422_Fast_90", "transform", "its dispatcher has looked at the transform"},
-    {"YUV_To_YUV_NOREAMPLE_ROTATE_Fast_4x4", "block", "takes any rectangle"},
-    {"I420_To_I420_REAMPLE_NOROTATE_BILINEAR_Fast_4x4", "block", "takes any rectangle"},
+    {"YUV_To_YUV_NOREAMPLE_ROTATE_Fast_4x4", "block", kNoBlocks},
+    {"I420_To_I420_REAMPLE_NOROTATE_BILINEAR_Fast_4x4", "block", kNoBlocks},
     {"I420_To_YUYV_Fast_*90", "transform", "looks at the whole transform code"},
     {"MCC_I420_*90", "transform", "looks at the whole transform code"},
     {"MCC_I420_*270", "transform", "looks at the whole transform code"},
@@ -64,7 +71,7 @@ constexpr Exception kExceptions[] = {
     {"Gray2Gray_C_RESAMPLE_NOROTATE_FAST", "transform", "mirrorY is a matter of pitches"},
     {"Gray2Gray_C_RESAMPLE_BILINEAR_NOROTATE_*", "transform", "mirrorY is a matter of pitches"},
     {"Gray2Gray_C_RESAMPLE_BILINEAR_NOROTATE_FAST", "source", "also takes the luma of planar YUV"},
-    {"Gray2Gray_C_NORESAMPLE_FAST_4x4", "block", "takes any rectangle"},
+    {"Gray2Gray_C_NORESAMPLE_FAST_4x4", "block", kNoBlocks},
     {"RGB24_To_YUYV_Fast_*2x2*", "block", "pairs of columns: any rectangle will do"},
     {"Gray_To_YUYV_Fast_*2x2*", "block", "pairs of columns: any rectangle will do"},
     {"I420_To_YUYV_Fast_*2x2*", "block", "pairs of columns: any rectangle will do"},
@@ -74,7 +81,48 @@ constexpr Exception kExceptions[] = {
     {"I420toYUYVFast_NORESAMPLE_90", "transform", kAnyAtUnitScale},
     {"I420_To_YUYV_*", "source", "reads any subsampling of planar YUV"},
     {"I420toYUYVFast*", "source", "reads any subsampling of planar YUV"},
-    {"YUV2NV21_LookupTable_R0_4x4", "block", "takes any rectangle"},
+    {"YUV2NV21_LookupTable_R0_4x4", "block", kNoBlocks},
+
+    {"NEC_NV21YCbCr601toBGR32_NoResize", "source", kBothOrders},
+    {"NEC_NV21toBGR32_Fast_BilNear", "source", kBothOrders},
+    {"NEC_NV21toBGR32_Fast_BilNear_R90", "transform", "looks at the whole transform code"},
+
+    {"RGB2RGBFast_RGB888_N_RESIZE_2x2", "scale", kBlended},
+    {"RGB2RGBFast_RGB888_N_RESIZE_4x4_R90", "block", kNoBlocks},
+    {"RGB2RGBFast_RGB888_N_RESIZE_4x4_R180", "block", kNoBlocks},
+    {"RGB2RGBFast_RGB888_N_RESIZE_4x4_HORIZONTAL", "block", kNoBlocks},
+    {"RGB2YUVFast_NORESAMPLE_NOROTATE_R8G8B8_2x2", "block", kNoBlocks},
+
+    {"NV21_TO_RGBFast_*", "source", kBothOrders},
+    {"NV21_TO_RGBFast_R5G6B5_Nearest", "scale", "the catch-all, also of blended and 1:1 jobs"},
+    {"YUV2RGBFast_R5G6B5_Nearest_2x2", "block", "chosen for 4x4 engines"},
+    {"RGB2RGBFast_NORESAMPLE_R5G6B5_2x2_R90", "block", kBoth2x2And4x4},
+    {"RGB888Fast_R5G6B5", "scale", "chosen for nearest jobs without a transform"},
+    {"NV21_To_RGB565_NoResample_4x4", "block", kNoBlocks},
+
+    {"I420toBGR32_Any_Fast_1x1", "source", "reads 4:2:2 as well"},
+    {"I420toRGB32_Any_Fast_1x1", "source", "reads 4:2:2 and V-first planes as well"},
+    {"I420toBGR32_Fast_BilNear", "source", "blends 4:2:2 as well"},
+    {"I420toRGB32_Fast_BilNear", "source", "blends 4:2:2 as well"},
+    {"I420toRGB32_Fast_BilNear", "scale", "also chosen for nearest jobs of 4:2:2"},
+    {"I420toRGB32_R0_Fast_BilNear_4x4", "block", kPassMode},
+    {"YV12toRGB32_Fast_NORESAMPLE_4x4", "block", kPassMode},
+    {"RGB2RGBFast_RGBA_N_RESIZE_4x4", "block", kPassMode},
+    {"GreytoBGR32_Fast_BilNear", "scale", "chosen for grey at any scale"},
+    {"NV21toBGR32_Fast_NoResize_R90_2x2", "scale", "chosen for all turns without blending"},
+    {"NV21toBGR32_Fast_NoResize_R90_2x2", "block", kNoBlocks},
+    {"I422HtoBGR32_Fast_4x4", "block", kNoBlocks},
+    {"RGB2RGBFast_RGB24_TO_RGB32__BILINEARN_RESIZE_2x2", "scale", "also chosen for turns at 1:1"},
+    {"RGB2RGBFast_RGB32_TO_RGB24_N_RESIZE_*", "scale", kBlended},
+    {"RGB2RGBFast_RGB32_TO_RGB24_N_RESIZE_2x2", "block", kBoth2x2And4x4},
+    {"RGB2RGBFast_RGB32_TO_RGB32__BILINEARN_RESIZE_4x4", "block", "also chosen for 2x2 engines"},
+    {"RGB2RGBFast_BGR32_TO_BGR24_N_RESIZE_4x4", "scale", kOneToOneIsNearest},
+    {"RGB2RGBFast_BGR32_N_RESIZE_*", "scale", kOneToOneIsNearest},
+    {"RGB2RGBFast_RGB32_N_RESIZE", "scale", kOneToOneIsNearest},
+    {"NV*_TO_RGB32Fast_NORESAMPLE*", "source",
+     "the name tells the order of channels, not of chroma"},
+    {"NV*_TO_RGB32Fast_NORESAMPLE_4x4", "block", "also chosen for 2x2 engines"},
+    {"NV21toRGB32_Fast_BilNear", "source", kBothOrders},
 };
 
 // An asterisk of the pattern stands for any characters.
@@ -99,16 +147,34 @@ constexpr Word kWords[] = {
     {"I444", kestrel::kI444},
     {"YV12", kestrel::kYv12},
     {"NV21V", kestrel::kNv21},
+    {"NV21YCbCr601", kestrel::kNv21},
     {"NV21", kestrel::kNv21},
     {"NV12", kestrel::kNv12},
     {"NVXY", kestrel::kSemiPlanar},
     {"YUV422SP", kestrel::kNv61},
     {"YUV422", kestrel::kNv61},
     {"YUYV", kestrel::kYuyv},
+    {"NVXX", kestrel::kSemiPlanar},
+    {"NV", kestrel::kSemiPlanar},
+    {"I4XX", kestrel::kI420 | kestrel::kI422},
+    {"RGB565", kestrel::kRgb16},
+    {"RGB16", kestrel::kRgb16},
+    {"BGR16", kestrel::kRgb16},
+    {"RGB888", kestrel::kRgb24},
+    {"BGR888", kestrel::kRgb24},
     {"RGB24", kestrel::kRgb24},
+    {"BGR24", kestrel::kRgb24},
+    {"RGB32", kestrel::kRgb32},
+    {"BGR32", kestrel::kRgb32},
+    {"RGBA", kestrel::kRgb32},
     {"Gray", kestrel::kGrey},
+    {"Grey", kestrel::kGrey},
     {"YUV", kestrel::kPlanar | kestrel::kYv12 | kestrel::kGrey | kestrel::kYuv444},
 };
+
+// RGB by itself: what a channel order later in the name says, or else 24 bits.
+constexpr Word kRgb16Order = {"RGB", kestrel::kRgb16};
+constexpr Word kRgb24Order = {"RGB", kestrel::kRgb24};
 
 // Takes the first of these that the name begins with off its front.
 template <size_t n>
@@ -122,13 +188,21 @@ const char* TakeOff(std::string* name, const char* const (&starts)[n]) {
   return nullptr;
 }
 
+bool Contains(const std::string& name, const char* part) {
+  return name.find(part) != std::string::npos;
+}
+
+const Word* OrderOf(const std::string& name) {
+  return Contains(name, "R5G6B5") || Contains(name, "B5G6R5") ? &kRgb16Order : &kRgb24Order;
+}
+
 const Word* TakeOffWord(std::string* name) {
   for (const Word& word : kWords) {
     if (TakeOff(name, {word.text})) {
       return &word;
     }
   }
-  return nullptr;
+  return TakeOff(name, {"RGB", "BGR"}) ? OrderOf(*name) : nullptr;
 }
 
 bool FormatsAgree(const Word& word, uint32_t layouts) {
@@ -136,29 +210,38 @@ bool FormatsAgree(const Word& word, uint32_t layouts) {
   return isAnyYuv ? layouts != 0 && (layouts & ~word.layouts) == 0 : layouts == word.layouts;
 }
 
-bool Contains(const std::string& name, const char* part) {
-  return name.find(part) != std::string::npos;
-}
-
 bool EndsWith(const std::string& name, const char* end) {
   const size_t length = std::strlen(end);
   return name.size() >= length && name.compare(name.size() - length, length, end) == 0;
 }
 
+bool ContainsOneOf(const std::string& name, std::initializer_list<const char*> parts) {
+  return std::any_of(parts.begin(), parts.end(),
+                     [&name](const char* part) { return Contains(name, part); });
+}
+
+bool StartsWithOneOf(const std::string& name, std::initializer_list<const char*> starts) {
+  return std::any_of(starts.begin(), starts.end(), [&name](const char* start) {
+    return name.compare(0, std::strlen(start), start) == 0;
+  });
+}
+
 bool ScaleAgrees(const std::string& name, Scale scale) {
-  if (Contains(name, "NORESAMPLE") || Contains(name, "NOREAMPLE") || Contains(name, "NoResample")) {
+  if (ContainsOneOf(name, {"NORESAMPLE", "NOREAMPLE", "NoResample", "NoResize", "NO_NO"})) {
     return scale == Scale::kUnit || scale == Scale::kUnitSteps;
   }
-  if (Contains(name, "BILINEAR") || Contains(name, "Bilinear")) {
+  if (ContainsOneOf(name, {"BILINEAR", "Bilinear", "BILINAR", "BilNear"})) {
     return scale == Scale::kBilinear || scale == Scale::kBilinearFlag;
   }
-  if (Contains(name, "Resample")) {
+  if (StartsWithOneOf(name, {"MCC_"}) && Contains(name, "Resample")) {
     return scale == Scale::kNotUnit;
   }
-  if (Contains(name, "RESAMPLE") || Contains(name, "REAMPLE") || Contains(name, "Nearest")) {
+  if (ContainsOneOf(name, {"RESAMPLE", "REAMPLE", "Nearest", "Resample", "N_RESIZE", "N_Resize"})) {
     return scale == Scale::kNearest;
   }
-  return true;
+  // The RGB families blend where they do not say how they scale.
+  return !StartsWithOneOf(name, {"YUV2RGB", "RGB2YUV", "RGB2RGB", "RGB888"}) ||
+         scale == Scale::kBilinear;
 }
 
 bool BlockAgrees(const std::string& name, Block block) {
@@ -181,10 +264,13 @@ bool TransformAgrees(const std::string& name, Transform transform) {
   if (Contains(name, "R270") || EndsWith(name, "_270")) {
     return transform == Transform::kRotate270;
   }
+  if (Contains(name, "R90AndVertical")) {
+    return transform == Transform::kRotate90MirrorY;
+  }
   if (Contains(name, "R90")) {
     return transform == Transform::kRotate90;
   }
-  if (EndsWith(name, "_90")) {
+  if (EndsWith(name, "_90") || EndsWith(name, "_90_1x1")) {
     return transform == Transform::kSwapMirrorX;
   }
   if (Contains(name, "Rotate")) {
@@ -193,10 +279,10 @@ bool TransformAgrees(const std::string& name, Transform transform) {
   if (Contains(name, "ROTATE")) {
     return transform == Transform::kAny;
   }
-  if (Contains(name, "H_Flip") || Contains(name, "MLR")) {
+  if (ContainsOneOf(name, {"H_Flip", "HFlip", "MLR", "HORIZONTAL"})) {
     return transform == Transform::kMirrorX;
   }
-  if (Contains(name, "V_Flip")) {
+  if (Contains(name, "V_Flip") || EndsWith(name, "_VERTICAL")) {
     return transform == Transform::kMirrorY;
   }
   if (Contains(name, "SwapXY") || Contains(name, "SXY")) {
@@ -210,14 +296,21 @@ std::set<std::string> Disagreements(const KernelRow& row) {
   const std::string name = row.name;
   std::set<std::string> columns;
   std::string rest = name;
-  TakeOff(&rest, {"MCC_"});
+  TakeOff(&rest, {"MCC_", "NEC_"});
+  // These say it twice, and more exactly the second time.
+  if (StartsWithOneOf(rest, {"RGB2RGBFast_RGB", "RGB2RGBFast_BGR", "BGR2RGBFast_RGB"})) {
+    TakeOff(&rest, {"RGB2RGBFast_", "BGR2RGBFast_"});
+  }
   const Word* const source = TakeOffWord(&rest);
   if (!source) {
     return {"formats"};
   }
   TakeOff(&rest, {"_TO_", "_To_", "to", "2", "_Bewteen_", "_"});
-  const Word* const named = TakeOffWord(&rest);
-  const Word* const destination = named ? named : source;  // one layout: into itself
+  const Word* destination = TakeOffWord(&rest);
+  if (!destination) {  // a channel order, or one layout: into itself
+    const bool isOrder = Contains(rest, "R5G6B5") && Contains(name, "888");
+    destination = isOrder ? &kRgb16Order : source;
+  }
   if (!FormatsAgree(*source, row.sources)) {
     columns.insert("source");
   }
@@ -257,12 +350,12 @@ TEST(KernelNames, AgreeWithTheTableButForTheListedExceptions) {
   }
 }
 
-TEST(KernelNames, AreUniqueAndAll151) {
+TEST(KernelNames, AreUniqueAndAll317) {
   std::set<std::string> names;
   for (const KernelRow& row : kestrel::kKernels) {
     names.insert(row.name);
   }
-  EXPECT_EQ(names.size(), 151u);
+  EXPECT_EQ(names.size(), 317u);
   EXPECT_EQ(int(names.size()), int(kestrel::kernel_id::kCount));
 }
 

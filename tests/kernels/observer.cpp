@@ -61,14 +61,18 @@ Answer AskChain(const EngineContext* context) {
   const uint8_t* const srcPlanes[3] = {bytes + 32, bytes + 48, bytes + 49};
   const int32_t pitches[3] = {4, 4, 4};
   const MRECT nothing = {0, 0, 0, 0};
+  const char* overwritten = nullptr;
   for (const Member& member : kChain) {
     const Observed observed =
         Observe(member.entry, &nothing, pitches, pitches, dstPlanes, srcPlanes, context);
     if (observed.answer == KESTREL_OK) {
-      return {member.name, observed.kernel};
+      return {member.name, observed.kernel, overwritten};
+    }
+    if (observed.kernel) {
+      overwritten = observed.kernel;
     }
   }
-  return {nullptr, nullptr};
+  return {nullptr, nullptr, overwritten};
 }
 
 }  // namespace kernel_tests

@@ -22,6 +22,7 @@ Observed Observe(KernelFn* dispatcher, const MRECT* rect, const int32_t* dstPitc
 struct Answer {
   const char* dispatcher;
   const char* kernel;
+  const char* overwritten;  // a kernel that ran before for a member that answered 3 all the same
 };
 
 // Asks the members of the chain in turn, with a rectangle that holds no pixels.

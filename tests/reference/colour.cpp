@@ -123,7 +123,7 @@ YuvToRgb::Carry YuvToRgb::StartCarry(bool dither) const {
   return carry;
 }
 
-Triple YuvToRgb::Convert(const Triple& yuv, Carry* carry) const {
+Triple YuvToRgb::Index(const Triple& yuv) const {
   const int64_t luma = (yuv[kY] * yGain_) * 16;
   const int64_t highV = (offset_[kRed] + yuv[kV] * vToRed_) >> 12;
   const int64_t lowV = (offset_[kGreen] + yuv[kV] * vToGreen_) >> 12;
@@ -135,12 +135,54 @@ Triple YuvToRgb::Convert(const Triple& yuv, Carry* carry) const {
   index[kRed] = (highV * 65536 + (lowV & 0xFFFF) + luma) >> 20;
   index[kGreen] = ((lowU + lowV) * 65536 + luma) >> 20;
   index[kBlue] = (highU * 65536 + (lowU & 0xFFFF) + luma) >> 20;
+  return index;
+}
 
+Triple YuvToRgb::Convert(const Triple& yuv, Carry* carry) const {
+  Triple index = Index(yuv);
   Triple rgb;
   for (int c = 0; c < 3; ++c) {
     index[c] += carry->accumulator[c];
     carry->accumulator[c] = index[c] & carry->mask[c];
     rgb[c] = std::clamp<int64_t>((index[c] >> droppedBits_[c]) - base_[c], 0, maximum_[c]);
+  }
+  return rgb;
+}
+
+Triple YuvToRgb::ConvertTo8Bits(const Triple& yuv) const {
+  Triple rgb = Index(yuv);
+  for (int c = 0; c < 3; ++c) {
+    rgb[c] = ClampToByte(rgb[c] - Zero(c));
+  }
+  return rgb;
+}
+
+ClampedCarry::ClampedCarry(const Format& destination) {
+  for (int c = 0; c < 3; ++c) {
+    droppedBits_[c] = std::max(8 - int(destination.maskSize[c]), 0);
+    remainder_[c] = ((1 << droppedBits_[c]) - 1) / 2;  // 3 of 5 bits, 1 of 6 bits
+  }
+}
+
+Triple ClampedCarry::Narrow(const Triple& rgb) {
+  Triple fields;
+  for (int c = 0; c < 3; ++c) {
+    const int64_t sum = rgb[c] + remainder_[c];
+    fields[c] = ClampToByte(sum) >> droppedBits_[c];
+    remainder_[c] = sum % (1 << droppedBits_[c]);
+  }
+  return fields;
+}
+
+Triple SixBitYuvToRgb(const Triple& yuv) {
+  const int64_t luma = 64 * yuv[kY];
+  const int64_t u = yuv[kU] - 128;
+  const int64_t v = yuv[kV] - 128;
+  // The offsets are no roundings: whites come out as 255, 254, 254.
+  const Triple sums = {luma + 90 * v + 35, luma - 46 * v - 22 * u - 35, luma + 113 * u - 52};
+  Triple rgb;
+  for (int c = 0; c < 3; ++c) {
+    rgb[c] = std::clamp<int64_t>(sums[c], 0, 16320) / 64;
   }
   return rgb;
 }

@@ -39,13 +39,34 @@ class YuvToRgb {
   // bits), every other destination 8-bit values.
   Triple Convert(const Triple& yuv, Carry* carry) const;
 
+  // 8-bit values for every destination, clamped before they are narrowed.
+  Triple ConvertTo8Bits(const Triple& yuv) const;
+
  private:
+  // Position of each channel among the values that narrowing starts from; value 0 is at Zero().
+  Triple Index(const Triple& yuv) const;
+  int64_t Zero(int channel) const { return base_[channel] << droppedBits_[channel]; }
+
   int64_t yGain_ = 0, vToRed_ = 0, vToGreen_ = 0, uToGreen_ = 0, uToBlue_ = 0;
   Triple offset_{};
   std::array<int, 3> droppedBits_{};
   Triple base_{};
   Triple maximum_{};
 };
+
+// The other rule for narrow channels: remainders of 8-bit values, clamped after carrying.
+class ClampedCarry {
+ public:
+  explicit ClampedCarry(const Format& destination);
+  Triple Narrow(const Triple& rgb);
+
+ private:
+  std::array<int, 3> droppedBits_{};
+  Triple remainder_{};
+};
+
+// Full range BT.601 with factors of 1/64, whatever the standard and the adjustments. 8-bit values.
+Triple SixBitYuvToRgb(const Triple& yuv);
 
 // RGB to YUV; adjustments have no part in it. Results are truncated to 8 bits.
 Triple RgbToYuv(const Triple& rgb, uint32_t standard);

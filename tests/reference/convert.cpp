@@ -31,7 +31,8 @@ class Source {
         format_(engine.src),
         pitches_(pitches),
         planes_(planes),
-        quirks_(quirks) {}
+        quirks_(quirks),
+        blends_(engine.bilinear && !quirks.nearestOnly) {}
 
   Place Row(int64_t loopRow) const {
     Place place = OwnRow(loopRow);
@@ -46,8 +47,8 @@ class Source {
   }
 
   Place Column(int64_t loopColumn) const {
-    const int64_t position = Position(engine_.bilinear, engine_.srcOriginX, engine_.stepX,
-                                      loopColumn - engine_.loopOriginX);
+    const int64_t position =
+        Position(blends_, engine_.srcOriginX, engine_.stepX, loopColumn - engine_.loopOriginX);
     const int64_t first = engine_.srcRect.left;
     const int64_t last = engine_.srcRect.right - 1;
     const int64_t tested =
@@ -166,7 +167,7 @@ class Source {
   // Two stages, each truncated; a neighbour of weight 0 is not looked at.
   template <typename SampleAt>
   int64_t Interpolated(const Place& column, const Place& row, SampleAt sampleAt) const {
-    if (!engine_.bilinear) {
+    if (!blends_) {
       return sampleAt(column.index, row.index);
     }
     const auto along = [&](int64_t y) {
@@ -187,6 +188,7 @@ class Source {
   const int32_t* pitches_;
   const uint8_t* const* planes_;
   const Quirks quirks_;
+  const bool blends_;
 };
 
 class Destination {
@@ -352,8 +354,13 @@ void ConvertLoopRect(const Engine& engine, const Rect& loopRect, const int32_t* 
   if (!destination.StartsInside()) {
     return;
   }
-  YuvToRgb::Carry carry = engine.yuvToRgb.StartCarry(engine.dither);
-  const bool narrowed = engine.path == ColourPath::kYuvToRgb && engine.dst.bitsPerPixel == 16;
+  const bool toRgb16 = engine.dst.IsRgb() && engine.dst.bitsPerPixel == 16;
+  const bool carriesClamped =
+      toRgb16 && quirks.clampedCarry && (quirks.carriesAlways || engine.dither);
+  ClampedCarry clampedCarry(engine.dst);
+  YuvToRgb::Carry carry = engine.yuvToRgb.StartCarry(engine.dither && !quirks.noDither);
+  const bool narrowed =
+      carriesClamped || (engine.path == ColourPath::kYuvToRgb && toRgb16 && !quirks.sixBitMatrix);
 
   for (int64_t y = loopRect.top; y < loopRect.bottom; ++y) {
     const Place row = source.Row(y);
@@ -369,11 +376,16 @@ void ConvertLoopRect(const Engine& engine, const Rect& loopRect, const int32_t* 
           destination.WriteYuv(x, RgbToYuv(pixel, engine.dst.standard));
           break;
         case ColourPath::kYuvToRgb:
-          pixel = engine.yuvToRgb.Convert(pixel, &carry);
+          pixel = quirks.sixBitMatrix ? SixBitYuvToRgb(pixel)
+                  : carriesClamped    ? clampedCarry.Narrow(engine.yuvToRgb.ConvertTo8Bits(pixel))
+                                      : engine.yuvToRgb.Convert(pixel, &carry);
           destination.WriteRgb(x, pixel, narrowed,
                                engine.dst.bitsPerPixel == 32 ? engine.alpha : -1);
           break;
         case ColourPath::kRgbToRgb: {
+          if (carriesClamped) {
+            pixel = clampedCarry.Narrow(pixel);
+          }
           const bool copiesSpare = engine.dst.bitsPerPixel == 32 && engine.src.bitsPerPixel == 32;
           destination.WriteRgb(x, pixel, narrowed,
                                copiesSpare ? source.SpareByte(column, row) : -1);

@@ -64,6 +64,16 @@ void Crop(int64_t newLength, int64_t block, Span* span) {
   span->length -= 2 * margin;
 }
 
+// Two codes stand for others while an engine is built.
+MPPFORMAT Normalised(MPPFORMAT record) {
+  if (record.format == FORMAT_BGRX8888) {
+    record.format = FORMAT_XBGR8888;
+  } else if (record.format == FORMAT_RGBX8888) {
+    record.format = FORMAT_XRGB8888;
+  }
+  return record;
+}
+
 ColourPath PathOf(const Format& dst, const Format& src) {
   if (src.IsRgb()) {
     return dst.IsRgb() ? ColourPath::kRgbToRgb : ColourPath::kRgbToYuv;
@@ -83,16 +93,17 @@ uint32_t BuildEngine(const MPPFORMAT& dst, const MPPFORMAT& src, const MPPPARAM&
     return kBadArgument;
   }
   *engine = Engine();
-  if (const uint32_t code = DecodeFormat(dst, &engine->dst); code != kOk) {
+  if (const uint32_t code = DecodeFormat(Normalised(dst), &engine->dst); code != kOk) {
     return code;
   }
-  if (const uint32_t code = DecodeFormat(src, &engine->src); code != kOk) {
+  if (const uint32_t code = DecodeFormat(Normalised(src), &engine->src); code != kOk) {
     return code;
   }
   if (dst.width < 0 || dst.height < 0 || src.width < 0 || src.height < 0) {
     return kBadArgument;  // their steps are below 0, which comes after the formats
   }
   engine->path = PathOf(engine->dst, engine->src);
+  engine->passMode = passMode;
   engine->transformCode = params.transformCode;
   engine->swapXY = (params.transformCode & 1) != 0;
   engine->mirrorX = (params.transformCode & 2) != 0;
@@ -182,12 +193,17 @@ uint32_t BuildEngine(const MPPFORMAT& dst, const MPPFORMAT& src, const MPPPARAM&
                                 clampAdjustment(params.saturation)};
   if (engine->path == ColourPath::kYuvToRgb) {
     engine->yuvToRgb = YuvToRgb(engine->src, engine->dst, adjustments);
-    engine->dither = params.dither != 0 && (dst.format & 0xFF000000) == 0x15000000;
   }
+  engine->dither = params.dither != 0 && (dst.format & 0xFF000000) == 0x15000000;
   if (engine->path == ColourPath::kYuvToYuv) {
     engine->changesLevels =
         !adjustments.IsNeutral() || ((engine->src.standard ^ engine->dst.standard) & 3) != 0;
     engine->levels = LevelChange(engine->src.standard, engine->dst.standard, adjustments);
+    if (engine->changesLevels && ((engine->src.standard ^ engine->dst.standard) & 3) == 0) {
+      // Levels that change within one range make both sides video range from here on.
+      engine->src.standard = (engine->src.standard & ~3u) | 1;
+      engine->dst.standard = (engine->dst.standard & ~3u) | 1;
+    }
   }
   if (IsUnitScale(*engine)) {
     engine->blockMode = std::min(engine->blockMode, 3u);

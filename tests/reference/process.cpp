@@ -139,16 +139,6 @@ void RunTiled(const Engine* passes, const Job& job) {
   runStrip(inner.right != outer.right, {inner.right, inner.top, outer.right, inner.bottom});
 }
 
-// Two codes stand for others while an engine is built.
-MPPFORMAT Normalised(MPPFORMAT record) {
-  if (record.format == FORMAT_BGRX8888) {
-    record.format = FORMAT_XBGR8888;
-  } else if (record.format == FORMAT_RGBX8888) {
-    record.format = FORMAT_XRGB8888;
-  }
-  return record;
-}
-
 }  // namespace
 
 bool PrepareCall(const Engine& engine, const Job& job, const Rect& band, KernelCall* call) {
@@ -184,13 +174,11 @@ bool PrepareCall(const Engine& engine, const Job& job, const Rect& band, KernelC
 }
 
 uint32_t Convert(const Job& job) {
-  const MPPFORMAT dst = Normalised(job.dst);
-  const MPPFORMAT src = Normalised(job.src);
   const bool tiled = job.params.passMode == MPP_PASS_TILED;
   Engine passes[3];
   for (int i = 0; i < (tiled ? 3 : 1); ++i) {
     const uint32_t passMode = tiled ? uint32_t(i) + 1 : job.params.passMode;
-    if (const uint32_t code = BuildEngine(dst, src, job.params, passMode, &passes[i]);
+    if (const uint32_t code = BuildEngine(job.dst, job.src, job.params, passMode, &passes[i]);
         code != kOk) {
       return code;
     }

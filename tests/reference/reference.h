@@ -43,6 +43,7 @@ enum class ColourPath { kYuvToYuv, kYuvToRgb, kRgbToRgb, kRgbToYuv };
 struct Engine {
   Format dst;
   Format src;
+  uint32_t passMode = 1;  // as asked for; blockMode is what came of it
   uint32_t blockMode = 1;
   uint32_t transformCode = 0;
   ColourPath path = ColourPath::kYuvToYuv;
@@ -86,6 +87,11 @@ struct Quirks {
   bool edgesOfPairs = false;     // edge columns are told by the first column of each pair
   bool sharedLowerLine = false;  // rows in pairs, blended toward the line below the first one's
   bool noEdgeColumns = false;    // columns outside the covered rectangle are sampled like others
+  bool sixBitMatrix = false;     // YUV to RGB by SixBitYuvToRgb, without dithering
+  bool noDither = false;         // narrow channels are truncated although the engine dithers
+  bool nearestOnly = false;      // no blending, columns aligned to corners; rows of the engine
+  bool clampedCarry = false;     // dithers by ClampedCarry, also RGB to RGB
+  bool carriesAlways = false;    // ... although the engine does not dither
 };
 
 // The generic converter on its own, or changed by quirks, under the contract that all conversion

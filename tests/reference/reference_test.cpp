@@ -128,6 +128,38 @@ TEST(ReferenceColour, DitherCarriesRemainders) {
   EXPECT_EQ(converter.Convert(grey, &carry), (Triple{17, 32, 17}));
 }
 
+TEST(ReferenceColour, ValuesOf8BitsForNarrowChannels) {
+  const YuvToRgb converter(Decoded(kFull), Decoded(FORMAT_RGB565), {});
+  EXPECT_EQ(converter.ConvertTo8Bits({130, 128, 128}), (Triple{130, 130, 130}));
+  EXPECT_EQ(converter.ConvertTo8Bits({250, 128, 255}), (Triple{255, 159, 250}));  // red is 428
+}
+
+// Of 4 and 4 bits narrowed to 5 and 6: the sums run 7, 11, 7, 11 and 5, 5, 5, 5.
+TEST(ReferenceColour, ClampedCarryOfSmallValues) {
+  ClampedCarry carry(Decoded(FORMAT_RGB565));
+  const Triple four{4, 4, 4};
+  EXPECT_EQ(carry.Narrow(four), (Triple{0, 1, 0}));
+  EXPECT_EQ(carry.Narrow(four), (Triple{1, 1, 1}));
+  EXPECT_EQ(carry.Narrow(four), (Triple{0, 1, 0}));
+  EXPECT_EQ(carry.Narrow(four), (Triple{1, 1, 1}));
+}
+
+// 255 + 3 is 31 of 5 bits and leaves 2, 255 + 1 is 63 of 6 bits and leaves 0.
+TEST(ReferenceColour, ClampedCarryKeepsTheRemainderOfTheUnclampedSum) {
+  ClampedCarry carry(Decoded(FORMAT_BGR565));
+  EXPECT_EQ(carry.Narrow({255, 255, 255}), (Triple{31, 63, 31}));
+  EXPECT_EQ(carry.Narrow({5, 3, 6}), (Triple{0, 0, 1}));
+  EXPECT_EQ(carry.Narrow({1, 1, 0}), (Triple{1, 1, 0}));
+}
+
+TEST(ReferenceColour, SixBitMatrix) {
+  EXPECT_EQ(SixBitYuvToRgb({255, 128, 128}), (Triple{255, 254, 254}));
+  EXPECT_EQ(SixBitYuvToRgb({128, 128, 128}), (Triple{128, 127, 127}));
+  EXPECT_EQ(SixBitYuvToRgb({0, 128, 128}), (Triple{0, 0, 0}));
+  EXPECT_EQ(SixBitYuvToRgb({100, 138, 148}), (Triple{128, 81, 116}));
+  EXPECT_EQ(SixBitYuvToRgb({255, 0, 255}), (Triple{255, 207, 28}));
+}
+
 TEST(ReferenceColour, RgbToYuvTruncates) {
   EXPECT_EQ(RgbToYuv({255, 255, 255}, CS_BT601_FULL), (Triple{255, 128, 128}));
   EXPECT_EQ(RgbToYuv({0, 0, 0}, CS_BT601_FULL), (Triple{0, 128, 128}));
@@ -298,6 +330,23 @@ TEST(ReferenceSampling, OnlyLumaIsInterpolated) {
   picture.job.params.resampleFlags = MPP_BILINEAR;
   EXPECT_EQ(picture.Run(0), (Bytes{0, 25, 75, 100}));
   EXPECT_EQ(picture.Plane(1), (Bytes{0, 0, 0, 100}));
+}
+
+// Columns as nearest sampling has them, rows at the positions of bilinear sampling: -0.25, 0.25,
+// 0.75, 1.25.
+TEST(ReferenceSampling, NearestOfABilinearEngine) {
+  Picture picture = Greys(4, 4, 2, 2, {0, 50, 100, 150});
+  picture.job.params.resampleFlags = MPP_BILINEAR;
+  Engine engine;
+  ASSERT_EQ(BuildEngine(picture.job.dst, picture.job.src, picture.job.params, 1, &engine), 0u);
+  KernelCall call;
+  ASSERT_TRUE(PrepareCall(engine, picture.job, engine.dstRegion, &call));
+  Quirks quirks;
+  quirks.nearestOnly = true;
+  ConvertLoopRect(engine, call.loopRect, call.dstPitches, call.srcPitches, call.dstStarts,
+                  call.srcPlanes, quirks);
+  EXPECT_EQ(picture.Plane(0),
+            (Bytes{0, 0, 50, 50, 0, 0, 50, 50, 0, 0, 50, 50, 100, 100, 150, 150}));
 }
 
 TEST(ReferenceSampling, SourceRectangleEdgesRepeat) {
