@@ -1,0 +1,288 @@
+// Every pair of public formats at every kind of scale and turn, so that no pair is left on a cliff:
+// nanoseconds of CPU time per destination pixel, the worst ten, and the worst against the median of
+// its class (pairs of one scale and turn).
+#include <algorithm>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <string>
+#include <vector>
+
+#include "benchmarks/common/engine.h"
+#include "benchmarks/common/json.h"
+#include "benchmarks/common/machine.h"
+#include "benchmarks/common/picture.h"
+#include "benchmarks/common/stopwatch.h"
+
+namespace bench {
+namespace {
+
+struct Named {
+  const char* name;
+  uint32_t value;
+};
+
+constexpr Named kFormats[] = {
+    {"RGB565", FORMAT_RGB565},
+    {"BGR565", FORMAT_BGR565},
+    {"RGB666", FORMAT_RGB666},
+    {"BGR666", FORMAT_BGR666},
+    {"RGB888", FORMAT_RGB888},
+    {"BGR888", FORMAT_BGR888},
+    {"XRGB8888", FORMAT_XRGB8888},
+    {"XBGR8888", FORMAT_XBGR8888},
+    {"RGBX8888", FORMAT_RGBX8888},
+    {"BGRX8888", FORMAT_BGRX8888},
+    {"INDEX1", FORMAT_INDEX1},
+    {"INDEX4", FORMAT_INDEX4},
+    {"INDEX8", FORMAT_INDEX8},
+    {"YUYV", FORMAT_YUYV},
+    {"YVYU", FORMAT_YVYU},
+    {"UYVY", FORMAT_UYVY},
+    {"VYUY", FORMAT_VYUY},
+    {"YUYV_SWAPPED_LUMA", FORMAT_YUYV_SWAPPED_LUMA},
+    {"YVYU_SWAPPED_LUMA", FORMAT_YVYU_SWAPPED_LUMA},
+    {"UYVY_SWAPPED_LUMA", FORMAT_UYVY_SWAPPED_LUMA},
+    {"VYUY_SWAPPED_LUMA", FORMAT_VYUY_SWAPPED_LUMA},
+    {"YUV444", FORMAT_YUV444},
+    {"YVU444", FORMAT_YVU444},
+    {"UVY444", FORMAT_UVY444},
+    {"VUY444", FORMAT_VUY444},
+    {"I420", FORMAT_I420},
+    {"I422", FORMAT_I422},
+    {"I440", FORMAT_I440},
+    {"I444", FORMAT_I444},
+    {"YV12", FORMAT_YV12},
+    {"YV16", FORMAT_YV16},
+    {"YV440", FORMAT_YV440},
+    {"YV24", FORMAT_YV24},
+    {"GRAY8", FORMAT_GRAY8},
+    {"NV21", FORMAT_NV21},
+    {"NV12", FORMAT_NV12},
+    {"NV61", FORMAT_NV61},
+    {"NV16", FORMAT_NV16},
+    {"YUV_SPECIAL8", FORMAT_YUV_SPECIAL8},
+    {"YUV_SPECIAL9", FORMAT_YUV_SPECIAL9},
+};
+
+constexpr Size kSource = {640, 480};
+constexpr Size kReduced = {480, 360};
+
+constexpr size_t kPaletteBytes = 1024;
+constexpr double kSliceNanoseconds = 2e5;
+
+struct Scale {
+  const char* name;
+  Size dst;
+  uint32_t resample;
+};
+
+constexpr Scale kScales[] = {
+    {"1:1", kSource, MPP_NEAREST},
+    {"bilinear down", kReduced, MPP_BILINEAR},
+    {"nearest down", kReduced, MPP_NEAREST},
+};
+
+constexpr Named kTurns[] = {
+    {"as is", 0},
+    {"90 degrees", MPP_SWAP_XY | MPP_MIRROR_X},
+    {"mirrored", MPP_MIRROR_X},
+};
+
+struct Options {
+  int rounds = 5;
+  std::string jsonPath;
+  std::string csvPath;
+};
+
+struct Pair {
+  const char* src;
+  const char* dst;
+  double nanoseconds;  // per destination pixel
+};
+
+struct Class {
+  const char* scale;
+  const char* turn;
+  std::vector<Pair> pairs;  // slowest first
+
+  double MedianNanoseconds() const {
+    std::vector<double> all;
+    for (const Pair& pair : pairs) all.push_back(pair.nanoseconds);
+    return Median(all);
+  }
+  double WorstRatio() const { return pairs.front().nanoseconds / MedianNanoseconds(); }
+};
+
+uint32_t InFullRange(uint32_t format) {
+  return format >> 28 >= 5 ? format | FORMAT_BT601_FULL : format;
+}
+
+void FillWithNoise(uint8_t* bytes, size_t count) {
+  uint32_t state = 1;
+  for (size_t i = 0; i < count; ++i) {
+    state = state * 1664525u + 1013904223u;
+    bytes[i] = uint8_t(state >> 24);
+  }
+}
+
+class Pairs {
+ public:
+  explicit Pairs(int rounds) : rounds_(rounds), palette_(kPaletteBytes) {
+    FillWithNoise(palette_.data(), palette_.size());
+    for (const Named& format : kFormats) {
+      sources_.emplace_back(InFullRange(format.value), kSource);
+      FillWithNoise(sources_.back().block[0].start, sources_.back().ByteCount());
+    }
+  }
+
+  Class Measure(const Scale& scale, const Named& turn) const {
+    Class result = {scale.name, turn.name, {}};
+    const bool swap = (turn.value & MPP_SWAP_XY) != 0;
+    for (const Named& format : kFormats) {
+      const Picture dst(InFullRange(format.value), swap ? scale.dst.Turned() : scale.dst);
+      FillWithNoise(dst.block[0].start, dst.ByteCount());
+      for (size_t i = 0; i < sources_.size(); ++i) {
+        const double time = Time(sources_[i], dst, scale, turn.value);
+        if (time < 0) continue;
+        result.pairs.push_back({kFormats[i].name, format.name, time / double(dst.size.Pixels())});
+      }
+    }
+    std::sort(result.pairs.begin(), result.pairs.end(),
+              [](const Pair& a, const Pair& b) { return a.nanoseconds > b.nanoseconds; });
+    return result;
+  }
+
+ private:
+  // Nanoseconds of one run; below 0 when the pair is not accepted.
+  double Time(const Picture& src, const Picture& dst, const Scale& scale,
+              uint32_t transform) const {
+    MPPPARAM params = {};
+    params.resampleFlags = scale.resample;
+    params.transformCode = transform;
+    params.passMode = MPP_PASS_TILED;
+    params.alpha = 255;
+    const Engine engine({dst.format, dst.size.width, dst.size.height, nullptr},
+                        {src.format, src.size.width, src.size.height, palette_.data()}, params);
+    if (!engine.IsAccepted()) return -1;
+    const auto run = [&] { engine.Run(src, dst); };
+    const int repetitions = 1 + int(kSliceNanoseconds / TimePerCall(1, run));
+    std::vector<double> times(static_cast<size_t>(rounds_));
+    for (double& time : times) time = TimePerCall(repetitions, run);
+    return Median(times);
+  }
+
+  int rounds_;
+  std::vector<uint8_t> palette_;
+  std::vector<Picture> sources_;
+};
+
+void Print(const std::vector<Class>& classes) {
+  struct Place {
+    const Class* of;
+    const Pair* pair;
+  };
+  std::vector<Place> places;
+  std::printf("%-14s %-11s %6s %12s %12s %6s\n", "scale", "turn", "pairs", "median ns/px",
+              "worst ns/px", "ratio");
+  for (const Class& c : classes) {
+    std::printf("%-14s %-11s %6zu %12.3f %12.3f %6.2f  %s to %s\n", c.scale, c.turn, c.pairs.size(),
+                c.MedianNanoseconds(), c.pairs.front().nanoseconds, c.WorstRatio(),
+                c.pairs.front().src, c.pairs.front().dst);
+    for (const Pair& pair : c.pairs) places.push_back({&c, &pair});
+  }
+  std::sort(places.begin(), places.end(), [](const Place& a, const Place& b) {
+    return a.pair->nanoseconds > b.pair->nanoseconds;
+  });
+  std::printf("\nworst ten of all:\n");
+  for (size_t i = 0; i < std::min<size_t>(10, places.size()); ++i) {
+    std::printf("%8.3f ns/px  %s to %s, %s, %s\n", places[i].pair->nanoseconds, places[i].pair->src,
+                places[i].pair->dst, places[i].of->scale, places[i].of->turn);
+  }
+}
+
+bool WriteJson(const std::vector<Class>& classes, const Options& options) {
+  Json json;
+  json.Open('{').Key("context").Open('{');
+  DescribeMachine(&json);
+  json.Entry("rounds", double(options.rounds));
+  json.Close('}').Key("formats").Open('[');
+  for (const Named& format : kFormats) json.Value(format.name);
+  json.Close(']').Key("classes").Open('[');
+  for (const Class& c : classes) {
+    json.Open('{');
+    json.Entry("scale", c.scale).Entry("turn", c.turn);
+    json.Entry("median_ns_per_pixel", c.MedianNanoseconds()).Entry("worst_ratio", c.WorstRatio());
+    json.Key("pairs").Open('[');
+    for (const Pair& pair : c.pairs) {
+      json.Open('{').Entry("src", pair.src).Entry("dst", pair.dst);
+      json.Entry("ns_per_pixel", pair.nanoseconds).Close('}');
+    }
+    json.Close(']').Close('}');
+  }
+  json.Close(']').Close('}');
+  return json.Write(options.jsonPath);
+}
+
+bool WriteCsv(const std::vector<Class>& classes, const std::string& path) {
+  std::FILE* file = std::fopen(path.c_str(), "w");
+  if (file == nullptr) {
+    std::perror(path.c_str());
+    return false;
+  }
+  std::fprintf(file, "scale,turn,source,destination,ns_per_pixel\n");
+  for (const Class& c : classes) {
+    for (const Pair& pair : c.pairs) {
+      std::fprintf(file, "%s,%s,%s,%s,%.4f\n", c.scale, c.turn, pair.src, pair.dst,
+                   pair.nanoseconds);
+    }
+  }
+  if (std::fclose(file) == 0) return true;
+  std::perror(path.c_str());
+  return false;
+}
+
+[[noreturn]] void Usage() {
+  std::fprintf(stderr, "usage: all_pairs [--rounds N] [--json FILE] [--csv FILE] [--quick]\n");
+  std::exit(2);
+}
+
+Options ParseOptions(int argc, char** argv) {
+  Options options;
+  for (int i = 1; i < argc; ++i) {
+    const bool hasValue = i + 1 < argc;
+    if (std::strcmp(argv[i], "--quick") == 0) {
+      options.rounds = 1;
+    } else if (std::strcmp(argv[i], "--rounds") == 0 && hasValue) {
+      options.rounds = std::atoi(argv[++i]);
+    } else if (std::strcmp(argv[i], "--json") == 0 && hasValue) {
+      options.jsonPath = argv[++i];
+    } else if (std::strcmp(argv[i], "--csv") == 0 && hasValue) {
+      options.csvPath = argv[++i];
+    } else {
+      Usage();
+    }
+  }
+  if (options.rounds < 1) Usage();
+  return options;
+}
+
+int Main(int argc, char** argv) {
+  const Options options = ParseOptions(argc, argv);
+  const Pairs pairs(options.rounds);
+  std::vector<Class> classes;
+  for (const Scale& scale : kScales) {
+    for (const Named& turn : kTurns) classes.push_back(pairs.Measure(scale, turn));
+  }
+  Print(classes);
+  bool written = options.jsonPath.empty() || WriteJson(classes, options);
+  if (!options.csvPath.empty()) written = WriteCsv(classes, options.csvPath) && written;
+  return written ? 0 : 1;
+}
+
+}  // namespace
+}  // namespace bench
+
+int main(int argc, char** argv) {
+  return bench::Main(argc, argv);
+}
