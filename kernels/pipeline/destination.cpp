@@ -222,6 +222,14 @@ bool Destination::WritesChroma(int32_t r, bool ofLastRow) const {
   return decides && planes_[1].rows.Contains(ChromaRow(r));
 }
 
+bool Destination::AllInPlace() const {
+  const int writers = !hasChroma_ ? 1 : chromaPairs_ != 0 ? 2 : 3;
+  for (int i = 0; i < writers; ++i) {
+    if (!writers_[i].inPlace()) return false;
+  }
+  return true;
+}
+
 void Destination::SelectColumns(int32_t x, int n) {
   x_ = x;
   n_ = n;

@@ -58,6 +58,7 @@ class PlaneWriter {
     rows_ = rows;
   }
   bool tiles() const { return tiles_; }
+  int unit() const { return unit_; }
   // Whether runs lie in memory as they are packed; Start then gives the destination itself.
   bool inPlace() const { return !tiles_ && plane_.columnStep == unit_; }
   // Whether runs can join the tile as it stands.
@@ -98,6 +99,13 @@ class PlaneWriter {
 
 class Destination {
  public:
+  // Memory for samples or pixels of the strip's columns [first, first + n).
+  struct PixelRun {
+    uint8_t* pixels;
+    ptrdiff_t pitch;
+    int first, n;
+  };
+
   explicit Destination(const Job& job);
 
   // Loop columns to select at once.
@@ -115,6 +123,9 @@ class Destination {
   const int32_t* vColumns() const { return vColumns_; }
   int chromaCount() const { return chromaCount_; }
   void PutLuma(int32_t r, const uint8_t* luma);
+  // Memory for a row of luma, for the strip columns that it says; not where luma is exchanged.
+  PixelRun StartLuma(int32_t r) { return StartPixels(r, 1); }
+  void FinishLuma() { writers_[0].Finish(); }
   // Either may be null.
   void PutChroma(int32_t r, const uint8_t* u, const uint8_t* v);
 
@@ -136,14 +147,10 @@ class Destination {
   int chromaPairs() const { return chromaPairs_; }
   bool exchangesLuma() const { return exchange_ != LumaExchange::kNone; }
   PlaneWriter& writer(int plane) { return writers_[plane]; }
+  // Whether runs of every plane lie in memory as they are packed.
+  bool AllInPlace() const;
 
-  // RGB. Memory for the pixels of some rows; null when they are outside the image. The
-  // pixels are those of strip columns [first, first + n).
-  struct PixelRun {
-    uint8_t* pixels;
-    ptrdiff_t pitch;
-    int first, n;
-  };
+  // RGB. Memory for the pixels of some rows; null when they are outside the image.
   PixelRun StartPixels(int32_t r, int rows);
   // How many of `most` rows from r on one StartPixels can be for.
   int RoomForRows(int32_t r, int most) const;

@@ -1,5 +1,7 @@
 #include "kernels/pipeline/pipeline.h"
 
+#include <string.h>
+
 #include "kernels/pipeline/destination.h"
 #include "kernels/pipeline/source.h"
 
@@ -35,6 +37,7 @@ class Pipeline {
     } else {
       CopyPlanes();
       if (lumaDone_ && chromaDone_) return;
+      if (ConvertRgbInPlace()) return;
       // Nothing needs a buffer where pixels are in place on both sides: strips are whole rows then.
       const bool whole = engine_.pathKind == PATH_YUV_TO_RGB && destination_.writer(0).inPlace() &&
                          source_.PixelsLieInPlace(job_.rect.left, Width());
@@ -119,6 +122,8 @@ class Pipeline {
       }
       uStep_ = CommonStep(uColumns_, destination_.chromaCount());
       vStep_ = CommonStep(vColumns_, destination_.chromaCount());
+      chromaOfSeconds_ = !job_.has(kPairChroma) && uStep_ >= 1 && uStep_ <= 2 &&
+                         (destination_.chromaCount() == 0 || uColumns_[0] + 1 >= uStep_);
     }
   }
 
@@ -134,9 +139,10 @@ class Pipeline {
   // or their chroma interleaved or taken apart, in rows as wide as the job.
   void CopyPlanes() {
     const bool unit = engine_.stepX == 0x10000 && engine_.stepY == 0x10000;
-    const bool keepsYuv = engine_.pathKind == PATH_YUV_TO_YUV && !job_.mapsLevels() &&
-                          !job_.has(kPairChroma) && !destination_.exchangesLuma();
+    const bool keepsYuv = engine_.pathKind == PATH_YUV_TO_YUV && !job_.has(kPairChroma) &&
+                          !destination_.exchangesLuma();
     if (!unit || !(keepsYuv || KeepsPixels())) return;
+    if (job_.mapsLevels() && !destination_.AllInPlace()) return;
     const PlaneRun luma = destination_.LumaRun();
     if (luma.n > 0) {
       if (!source_.LumaLiesInPlace(luma.firstX, luma.n)) return;
@@ -180,9 +186,7 @@ class Pipeline {
       if (from == 0) CopyPlane(2, run);
       return true;
     }
-    if (!destination_.writer(1).inPlace() || (to == 0 && !destination_.writer(2).inPlace())) {
-      return false;
-    }
+    if (job_.mapsLevels() || !destination_.AllInPlace()) return false;
     for (int32_t r = job_.rect.top; r < job_.rect.bottom; ++r) {
       PlaneRow row;
       if (LocateRow(1, r, &row)) RearrangeChroma(run, row, from, to);
@@ -250,6 +254,14 @@ class Pipeline {
                                       : source_.ChromaAt(plane, run.firstX, first.source);
     // Chroma pairs are written as plane 1, whichever comes first.
     PlaneWriter& writer = destination_.writer(plane == 2 && pairsWriter() ? 1 : plane);
+    if (job_.mapsLevels()) {
+      const LevelMap levels = LevelsOf(plane == 0 ? 0 : 1);
+      for (int i = 0; i < rows; ++i) {
+        uint8_t* const row = writer.Start(run.column, first.destination + i, run.n);
+        rows_.mapLevels(row, start + i * source_.pitch(plane), levels, run.n * writer.unit());
+      }
+      return;
+    }
     writer.WriteBlock(run.column, first.destination, start, source_.pitch(plane), run.n, rows);
   }
   bool pairsWriter() const { return destination_.chromaPairs() != 0; }
@@ -273,13 +285,14 @@ class Pipeline {
     }
   }
 
-  const uint8_t* MapLevels(uint8_t* buffer, const uint8_t* run, int map, int n) const {
+  LevelMap LevelsOf(int kind) const {
+    return {static_cast<const uint8_t*>(engine_.table) + ptrdiff_t{256} * kind,
+            engine_.levelSums.gain[kind], engine_.levelSums.offset[kind]};
+  }
+
+  const uint8_t* MapLevels(uint8_t* buffer, const uint8_t* run, int kind, int n) const {
     if (!job_.mapsLevels()) return run;
-    const uint8_t* maps = static_cast<const uint8_t*>(engine_.table);
-    rows_.mapLevels(
-        buffer, run,
-        {maps + ptrdiff_t{256} * map, engine_.levelSums.gain[map], engine_.levelSums.offset[map]},
-        n);
+    rows_.mapLevels(buffer, run, LevelsOf(kind), n);
     return buffer;
   }
 
@@ -308,20 +321,55 @@ class Pipeline {
     destination_.PutRgb(r, rgb, nullptr, engine_.dstFormat.colourStandard == 16);
   }
 
-  // The number of rows done: rows that are in place on both sides are converted at once.
+  // The number of rows done: rows that are in place on both sides are converted at once, and short
+  // ones that are not are collected, because preparing to convert costs as much as many pixels.
   int YuvToRgb(int32_t r) {
     const int room = destination_.RoomForRows(r, job_.rect.bottom - r);
-    const int rows = source_.RowsInPlace(r, room);
-    const uint8_t* y = source_.LumaInPlace(r);
-    ConvertPixels(r, y != nullptr ? y : source_.Luma(r), rows);
-    return rows;
+    const uint8_t* const y = source_.LumaInPlace(r);
+    if (y != nullptr && source_.ChromaIsInPlace()) {
+      const int rows = source_.RowsInPlace(r, room);
+      ConvertPixels(r, {nullptr, 0, y, source_.pitch(0), rows}, source_.ChromaOfPixels(r));
+      return rows;
+    }
+    const int collected = kStrip / n_ < room ? kStrip / n_ : room;
+    if (collected < 2) {
+      ConvertPixels(r, {nullptr, 0, y != nullptr ? y : source_.Luma(r), 0, 1},
+                    source_.ChromaOfPixels(r));
+      return 1;
+    }
+    PixelChroma chroma = {};
+    for (int i = 0; i < collected; ++i) {
+      memcpy(luma_ + i * n_, source_.Luma(r + i), size_t(n_));
+      chroma = CollectChroma(source_.ChromaOfPixels(r + i), i);
+    }
+    ConvertPixels(r, {nullptr, 0, luma_, n_, collected}, chroma);
+    return collected;
   }
 
-  void ConvertPixels(int32_t r, const uint8_t* y, int rows) {
-    const Destination::PixelRun run = destination_.StartPixels(r, rows);
+  // Chroma of a strip as row i of those collected in channels_.
+  PixelChroma CollectChroma(const PixelChroma& strip, int i) {
+    const ChromaRows& from = strip.rows;
+    const int samples = ((n_ - 1 + strip.phase) >> from.shift) + 1;
+    if (from.step == 2) {
+      uint8_t* const pairs = channels_[0];  // and [1]
+      const bool uFirst = from.u < from.v;
+      memcpy(pairs + ptrdiff_t{2} * i * samples, uFirst ? from.u : from.v, size_t(2) * samples);
+      return {{pairs + (uFirst ? 0 : 1), pairs + (uFirst ? 1 : 0), from.shift, 2,
+               ptrdiff_t{2} * samples, ptrdiff_t{2} * samples, 0},
+              strip.phase};
+    }
+    memcpy(channels_[0] + i * samples, from.u, size_t(samples));
+    memcpy(channels_[1] + i * samples, from.v, size_t(samples));
+    return {{channels_[0], channels_[1], from.shift, 1, samples, samples, 0}, strip.phase};
+  }
+
+  // Fills in where the pixels of `rows` go.
+  void ConvertPixels(int32_t r, PixelRows rows, const PixelChroma& chroma) {
+    const Destination::PixelRun run = destination_.StartPixels(r, rows.rows);
     if (run.pixels == nullptr) return;
-    const PixelChroma chroma = source_.ChromaOfPixels(r);
     const PixelFormat& format = destination_.pixelFormat();
+    rows.dstPitch = run.pitch;
+    const uint8_t* const y = rows.y + run.first;
     // A run may begin with the second of two pixels that share a sample.
     int i = 0;
     while (i < run.n) {
@@ -331,9 +379,9 @@ class Pipeline {
       ChromaRows part = chroma.rows;
       part.u += sample;
       part.v += sample;
-      rows_.yuvToPixels({run.pixels + ptrdiff_t{i} * format.bytes, run.pitch, y + run.first + i,
-                         source_.pitch(0), rows},
-                        part, colour_, format, destination_.alphaFill(), n);
+      rows.dst = run.pixels + ptrdiff_t{i} * format.bytes;
+      rows.y = y + i;
+      rows_.yuvToPixels(rows, part, colour_, format, destination_.alphaFill(), n);
       i += n;
     }
     destination_.FinishPixels();
@@ -359,6 +407,8 @@ class Pipeline {
   }
 
   void RgbToYuv(int32_t r) {
+    const uint8_t* const pixels = destination_.exchangesLuma() ? nullptr : source_.Pixels(r);
+    if (pixels != nullptr && chromaOfSeconds_) return PixelsToYuv(r, pixels);
     const RgbRun run = source_.Rgb(r);
     const auto tables = static_cast<RgbToYuvTables>(engine_.table);
     rows_.rgbToYuv(luma_, run.channel, tables, n_);
@@ -371,6 +421,86 @@ class Pipeline {
     if (writesU) Chroma(u_, run, uColumns_, uStep_, tables + 3, n);
     if (writesV) Chroma(v_, run, vColumns_, vStep_, tables + 5, n);
     destination_.PutChroma(r, writesU ? u_ : nullptr, writesV ? v_ : nullptr);
+  }
+
+  // The usual case: both components of each pixel, or of the second of each pair of pixels.
+  void PixelsToYuv(int32_t r, const uint8_t* pixels) {
+    const PixelFormat& format = source_.pixelFormat();
+    const Destination::PixelRun run = destination_.StartLuma(r);
+    if (run.pixels != nullptr) {
+      rows_.pixelsToYuv(run.pixels, pixels + ptrdiff_t{run.first} * format.bytes, format,
+                        yuvTables(), run.n);
+      destination_.FinishLuma();
+    }
+    const int n = destination_.chromaCount();
+    if (n == 0 || !destination_.WritesU(r)) return;
+    const uint8_t* const first = pixels + ptrdiff_t{uColumns_[0]} * format.bytes;
+    PixelsToChroma(u_, first, 1, uStep_, n);
+    PixelsToChroma(v_, first, 2, uStep_, n);
+    destination_.PutChroma(r, u_, v_);
+  }
+
+  RgbToYuvTables yuvTables() const { return static_cast<RgbToYuvTables>(engine_.table); }
+
+  // Chroma of every pixel from `first` on, or of every other one.
+  void PixelsToChroma(uint8_t* samples, const uint8_t* first, int plane, int step, int n) {
+    const PixelFormat& format = source_.pixelFormat();
+    const auto convert = step == 1 ? rows_.pixelsToYuv : rows_.pixelPairsToYuv;
+    convert(samples, first - ptrdiff_t{step - 1} * format.bytes, format,
+            yuvTables() + (plane == 1 ? 3 : 5), n);
+  }
+
+  // Pixels of RGB that are in place on both sides become YUV in rows as wide as the job: strips
+  // would read a large picture in short pieces, far apart. False where they are not in place.
+  bool ConvertRgbInPlace() {
+    const bool unit = engine_.stepX == 0x10000 && engine_.stepY == 0x10000;
+    if (!unit || engine_.pathKind != PATH_RGB_TO_YUV || job_.has(kPairChroma) ||
+        destination_.exchangesLuma() || job_.rect.left < 0 || !destination_.AllInPlace()) {
+      return false;
+    }
+    const PlaneRun luma = destination_.LumaRun();
+    if (luma.n <= 0 || !source_.LumaLiesInPlace(luma.firstX, luma.n)) return false;
+    PlaneRun chroma = {0, 0, 0, 0};
+    int step = 0;
+    if (destination_.hasChroma()) {
+      chroma = destination_.ChromaRun();
+      step = int(engine_.dstSubsample[1]);
+      const bool inTurn = chroma.n > 0 && step <= 2 && chroma.firstX >= luma.firstX + step - 1 &&
+                          chroma.lastX - chroma.firstX == (chroma.n - 1) * step &&
+                          chroma.lastX <= luma.lastX;
+      if (!inTurn) return false;
+    }
+    for (int32_t r = job_.rect.top; r < job_.rect.bottom; ++r) {
+      const int32_t row = source_.SourceRow(r, 1);
+      if (destination_.ContainsLumaRow(r)) {
+        uint8_t* const samples =
+            destination_.writer(0).Start(luma.column, int64_t(r) - job_.rect.top, luma.n);
+        rows_.pixelsToYuv(samples, source_.LumaAt(luma.firstX, row), source_.pixelFormat(),
+                          yuvTables(), luma.n);
+      }
+      if (chroma.n > 0 && destination_.WritesU(r)) {
+        ConvertChromaInPlace(r, source_.LumaAt(chroma.firstX, row), chroma, step);
+      }
+    }
+    return true;
+  }
+
+  void ConvertChromaInPlace(int32_t r, const uint8_t* first, const PlaneRun& run, int step) {
+    const int64_t row = destination_.ChromaRow(r);
+    uint8_t* const samples = destination_.writer(1).Start(run.column, row, run.n);
+    if (!pairsWriter()) {
+      PixelsToChroma(samples, first, 1, step, run.n);
+      PixelsToChroma(destination_.writer(2).Start(run.column, row, run.n), first, 2, step, run.n);
+      return;
+    }
+    const bool uFirst = destination_.chromaPairs() == 1;
+    for (int i = 0; i < run.n; i += kStrip) {
+      const int n = run.n - i < kStrip ? run.n - i : kStrip;
+      const uint8_t* const pixel = first + ptrdiff_t{i} * step * source_.pixelFormat().bytes;
+      PixelsToChroma(u_, pixel, 1, step, n);
+      PixelsToChroma(v_, pixel, 2, step, n);
+      rows_.interleave(samples + ptrdiff_t{2} * i, uFirst ? u_ : v_, uFirst ? v_ : u_, n);
+    }
   }
 
   void Chroma(uint8_t* samples, const RgbRun& run, const int32_t* columns, int step,
@@ -400,6 +530,7 @@ class Pipeline {
   bool lumaDone_ = false, chromaDone_ = false;   // by CopyPlanes
   int32_t uColumns_[kStrip], vColumns_[kStrip];  // loop columns, or columns of the strip
   int uStep_ = 0, vStep_ = 0;                    // from each of them to the next; 0 when it varies
+  bool chromaOfSeconds_ = false;                 // every pixel, or the second of each two, decides
   uint8_t channels_[3][kStrip];
   uint8_t luma_[kStrip], u_[kStrip], v_[kStrip];
 };

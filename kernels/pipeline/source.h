@@ -68,6 +68,7 @@ class Source {
   PixelChroma ChromaOfPixels(int32_t r);
   // Where the luma of the strip lies in the source as it is wanted; null when it does not.
   const uint8_t* LumaInPlace(int32_t r) const;
+  bool ChromaIsInPlace() const { return pixelChroma_ == PixelChromaRead::kInPlace; }
   // How many of `most` rows from r on are in place, luma and chroma, each row below its
   // predecessor, so that they can be converted at once. 1 when it is only this one, or not even it.
   int RowsInPlace(int32_t r, int most) const;

@@ -262,6 +262,32 @@ void MapLevels(uint8_t* dst, const uint8_t* src, const LevelMap& levels, int n) 
   for (int i = 0; i < n; ++i) dst[i] = levels.map[src[i]];
 }
 
+template <int kStep>
+void SomePixelsToYuv(uint8_t* dst, const uint8_t* src, const PixelFormat& format,
+                     RgbToYuvTables tables, int n) {
+  constexpr int kPiece = 64;
+  uint8_t channels[3][kPiece * kStep];
+  uint8_t* const rgb[3] = {channels[0], channels[1], channels[2]};
+  for (int x = 0; x < n; x += kPiece) {
+    const int count = n - x < kPiece ? n - x : kPiece;
+    UnpackRgb(rgb, src + ptrdiff_t{x} * kStep * format.bytes, format, count * kStep);
+    for (int i = 0; i < count && kStep > 1; ++i) {
+      for (uint8_t* channel : rgb) channel[i] = channel[kStep * i + kStep - 1];
+    }
+    RgbToYuv(dst + x, rgb, tables, count);
+  }
+}
+
+void PixelsToYuv(uint8_t* dst, const uint8_t* src, const PixelFormat& format, RgbToYuvTables tables,
+                 int n) {
+  SomePixelsToYuv<1>(dst, src, format, tables, n);
+}
+
+void PixelPairsToYuv(uint8_t* dst, const uint8_t* src, const PixelFormat& format,
+                     RgbToYuvTables tables, int n) {
+  SomePixelsToYuv<2>(dst, src, format, tables, n);
+}
+
 template <int kBytes>
 void PackFields(uint8_t* dst, const uint8_t* const rgb[3], const PixelFormat& format,
                 const FieldShifts& shifts, AlphaFill alpha, int n) {
@@ -598,6 +624,8 @@ const RowOps kScalarRows = {"scalar",
                             scalar::YuvToRgbBySixBits,
                             scalar::YuvToPixels,
                             scalar::RgbToYuv,
+                            scalar::PixelsToYuv,
+                            scalar::PixelPairsToYuv,
                             scalar::MapLevels,
                             scalar::NarrowWithCarry,
                             scalar::PackRgb,

@@ -130,7 +130,8 @@ inline void Load2(const uint8_t* p, Bytes* first, Bytes* second) {
   *second = {pairs.val[1]};
 }
 inline void Store2(uint8_t* p, Bytes first, Bytes second) {
-  vst2q_u8(p, {{first.v, second.v}});
+  const uint8x16x2_t pairs = {{first.v, second.v}};
+  vst2q_u8(p, pairs);
 }
 inline void StorePixelWords(uint8_t* p, WordsPair w) {
   StoreWords(p, w.low);
@@ -144,14 +145,16 @@ inline void Load4(const uint8_t* p, Bytes (&channels)[4]) {
   for (int c = 0; c < 4; ++c) channels[c] = {pixels.val[c]};
 }
 inline void Store4(uint8_t* p, Bytes a, Bytes b, Bytes c, Bytes d) {
-  vst4q_u8(p, {{a.v, b.v, c.v, d.v}});
+  const uint8x16x4_t pixels = {{a.v, b.v, c.v, d.v}};
+  vst4q_u8(p, pixels);
 }
 inline void Load3(const uint8_t* p, Bytes (&channels)[3]) {
   const uint8x16x3_t pixels = vld3q_u8(p);
   for (int c = 0; c < 3; ++c) channels[c] = {pixels.val[c]};
 }
 inline void Store3(uint8_t* p, Bytes a, Bytes b, Bytes c) {
-  vst3q_u8(p, {{a.v, b.v, c.v}});
+  const uint8x16x3_t pixels = {{a.v, b.v, c.v}};
+  vst3q_u8(p, pixels);
 }
 
 // ---- Order of bytes
@@ -181,6 +184,11 @@ inline uint8x8_t GatherFour(const uint8_t* window, const uint8_t* shuffle) {
 inline Words GatherPairs(const uint8_t* src, const int32_t* windows, const uint8_t (*shuffles)[8]) {
   return {vreinterpretq_u16_u8(vcombine_u8(GatherFour(src + windows[0], shuffles[0]),
                                            GatherFour(src + windows[1], shuffles[1])))};
+}
+
+// The odd bytes of two vectors.
+inline Bytes Seconds(Bytes a, Bytes b) {
+  return {vuzpq_u8(a.v, b.v).val[1]};
 }
 
 // ---- RGB to YUV
@@ -218,6 +226,31 @@ class WeightedSum {
   uint16x4_t magnitude_[3];
   bool positive_[3];
   int32_t offset_;
+};
+
+// The sums of kBytes pixels of four bytes, or of the second ones of as many pairs.
+class PixelSum {
+ public:
+  PixelSum(const WeightedSum& sum, bool blueFirst, bool alphaFirst)
+      : sum_(sum), blueFirst_(blueFirst), alphaFirst_(alphaFirst) {}
+  template <bool kSeconds>
+  Bytes Of(const uint8_t* p) const {
+    Bytes channels[4];
+    Load4(p, channels);
+    if (kSeconds) {
+      Bytes more[4];
+      Load4(p + 4 * kBytes, more);
+      for (int c = 0; c < 4; ++c) channels[c] = Seconds(channels[c], more[c]);
+    }
+    const Bytes low = alphaFirst_ ? channels[1] : channels[0];
+    const Bytes middle = alphaFirst_ ? channels[2] : channels[1];
+    const Bytes high = alphaFirst_ ? channels[3] : channels[2];
+    return sum_.Of(blueFirst_ ? high : low, middle, blueFirst_ ? low : high);
+  }
+
+ private:
+  WeightedSum sum_;
+  bool blueFirst_, alphaFirst_;
 };
 
 }  // namespace

@@ -25,7 +25,7 @@ class Rest {
   const uint8_t* bytes() const { return bytes_; }
 
  private:
-  uint8_t bytes_[4 * kBytes] = {};
+  uint8_t bytes_[8 * kBytes] = {};
 };
 
 // Calls block(destinations, sources...) for each kBytes units of a run; the last ones go through
@@ -591,15 +591,19 @@ void YuvToPixels(const PixelRows& rows, const ChromaRows& chroma, const YuvToRgb
 }
 
 // ---- RGB to YUV, levels
-void RgbToYuv(uint8_t* dst, const uint8_t* const rgb[3], RgbToYuvTables tables, int n) {
-  // The tables are straight lines.
+// The tables are straight lines.
+WeightedSum SumOf(RgbToYuvTables tables) {
   int32_t weights[3];
   int32_t offset = 0;
   for (int c = 0; c < 3; ++c) {
     weights[c] = tables[c][1] - tables[c][0];
     offset += tables[c][0];
   }
-  const WeightedSum sum(weights, offset);
+  return WeightedSum(weights, offset);
+}
+
+void RgbToYuv(uint8_t* dst, const uint8_t* const rgb[3], RgbToYuvTables tables, int n) {
+  const WeightedSum sum = SumOf(tables);
   uint8_t* const dsts[] = {dst};
   ForRun<1>(
       dsts, n,
@@ -607,6 +611,49 @@ void RgbToYuv(uint8_t* dst, const uint8_t* const rgb[3], RgbToYuvTables tables, 
         StoreBytes(out[0], sum.Of(LoadBytes(r), LoadBytes(g), LoadBytes(b)));
       },
       Units{rgb[0], 1}, Units{rgb[1], 1}, Units{rgb[2], 1});
+}
+
+template <bool kSeconds>
+void SomePixelsToYuv(uint8_t* dst, const uint8_t* src, const PixelFormat& format,
+                     RgbToYuvTables tables, int n) {
+  const PixelShape shape(format);
+  const WeightedSum sum = SumOf(tables);
+  const int unit = kSeconds ? 2 * shape.bytes : shape.bytes;
+  uint8_t* const dsts[] = {dst};
+  if (shape.bytes == 4) {
+    const PixelSum pixels(sum, shape.blueFirst, shape.alphaFirst);
+    ForRun<1>(
+        dsts, n,
+        [&](uint8_t* const* out, const uint8_t* in) {
+          StoreBytes(out[0], pixels.Of<kSeconds>(in));
+        },
+        Units{src, unit});
+    return;
+  }
+  ForRun<1>(
+      dsts, n,
+      [&](uint8_t* const* out, const uint8_t* in) {
+        PixelBytes pixels = LoadPixels(in, shape);
+        if (kSeconds) {
+          const PixelBytes more = LoadPixels(in + kBytes * shape.bytes, shape);
+          pixels = {Seconds(pixels.r, more.r), Seconds(pixels.g, more.g), Seconds(pixels.b, more.b),
+                    pixels.alpha};
+        }
+        StoreBytes(out[0], sum.Of(pixels.r, pixels.g, pixels.b));
+      },
+      Units{src, unit});
+}
+
+void PixelsToYuv(uint8_t* dst, const uint8_t* src, const PixelFormat& format, RgbToYuvTables tables,
+                 int n) {
+  if (PixelShape(format).bytes == 0) return scalar::PixelsToYuv(dst, src, format, tables, n);
+  SomePixelsToYuv<false>(dst, src, format, tables, n);
+}
+
+void PixelPairsToYuv(uint8_t* dst, const uint8_t* src, const PixelFormat& format,
+                     RgbToYuvTables tables, int n) {
+  if (PixelShape(format).bytes == 0) return scalar::PixelPairsToYuv(dst, src, format, tables, n);
+  SomePixelsToYuv<true>(dst, src, format, tables, n);
 }
 
 void MapLevels(uint8_t* dst, const uint8_t* src, const LevelMap& levels, int n) {
@@ -729,6 +776,8 @@ constexpr RowOps VectorRows(const char* name) {
           scalar::YuvToRgbBySixBits,
           YuvToPixels,
           RgbToYuv,
+          PixelsToYuv,
+          PixelPairsToYuv,
           MapLevels,
           scalar::NarrowWithCarry,
           PackRgb,

@@ -336,6 +336,16 @@ inline Words GatherPairs(const uint8_t* src, const int32_t* windows, const uint8
 #endif
 }
 
+// The odd bytes of two vectors.
+inline Bytes Seconds(Bytes a, Bytes b) {
+  const Bytes narrow = Narrow(ShiftRightUnsigned<8>(Words{a.v}), ShiftRightUnsigned<8>(Words{b.v}));
+#ifdef __AVX2__
+  return {_mm256_permute4x64_epi64(narrow.v, 0xD8)};
+#else
+  return narrow;
+#endif
+}
+
 // ---- RGB to YUV
 // (offset + r * w0 + g * w1 + b * w2) >> 16 of bytes.
 class WeightedSum {
@@ -350,38 +360,77 @@ class WeightedSum {
     offset_ = KESTREL_SIMD(set1_epi32)(offset);
   }
   Bytes Of(Bytes r, Bytes g, Bytes b) const {
-    return negated_ ? Sum<true>(r, g, b) : Sum<false>(r, g, b);
+    const Words low =
+        Eight(KESTREL_SIMD(unpacklo_epi8)(r.v, b.v), KESTREL_SIMD(unpacklo_epi8)(g.v, g.v));
+    const Words high =
+        Eight(KESTREL_SIMD(unpackhi_epi8)(r.v, b.v), KESTREL_SIMD(unpackhi_epi8)(g.v, g.v));
+    return Narrow(low, high);
+  }
+  // Of words: red and blue in turn, and green twice; one sum of 32 bits for each pair.
+  Register Sums(Register redBlue, Register green) const {
+    const Register sum = KESTREL_SIMD(add_epi32)(KESTREL_SIMD(madd_epi16)(redBlue, redBlue_),
+                                                 KESTREL_SIMD(madd_epi16)(green, green_));
+    return KESTREL_SIMD(srai_epi32)(
+        negated_ ? KESTREL_SIMD(sub_epi32)(offset_, sum) : KESTREL_SIMD(add_epi32)(offset_, sum),
+        16);
   }
 
  private:
   static Register Pair(int32_t low, int32_t high) {
     return KESTREL_SIMD(set1_epi32)(int32_t((uint32_t(low) & 0xFFFF) | uint32_t(high) << 16));
   }
-  template <bool kNegated>
-  Register Four(Register redBlue, Register green) const {
-    const Register sum = KESTREL_SIMD(add_epi32)(KESTREL_SIMD(madd_epi16)(redBlue, redBlue_),
-                                                 KESTREL_SIMD(madd_epi16)(green, green_));
-    return KESTREL_SIMD(srai_epi32)(
-        kNegated ? KESTREL_SIMD(sub_epi32)(offset_, sum) : KESTREL_SIMD(add_epi32)(offset_, sum),
-        16);
-  }
-  template <bool kNegated>
   Words Eight(Register redBlue, Register green) const {
     const WordsPair rb = Widen({redBlue});
     const WordsPair gg = Widen({green});
-    return {KESTREL_SIMD(packs_epi32)(Four<kNegated>(rb.low.v, gg.low.v),
-                                      Four<kNegated>(rb.high.v, gg.high.v))};
-  }
-  template <bool kNegated>
-  Bytes Sum(Bytes r, Bytes g, Bytes b) const {
-    return Narrow(Eight<kNegated>(KESTREL_SIMD(unpacklo_epi8)(r.v, b.v),
-                                  KESTREL_SIMD(unpacklo_epi8)(g.v, g.v)),
-                  Eight<kNegated>(KESTREL_SIMD(unpackhi_epi8)(r.v, b.v),
-                                  KESTREL_SIMD(unpackhi_epi8)(g.v, g.v)));
+    return {KESTREL_SIMD(packs_epi32)(Sums(rb.low.v, gg.low.v), Sums(rb.high.v, gg.high.v))};
   }
 
   Register redBlue_, green_, offset_;
   bool negated_;
+};
+
+// The sums of kBytes pixels of four bytes, or of the second ones of as many pairs.
+class PixelSum {
+ public:
+  PixelSum(const WeightedSum& sum, bool blueFirst, bool alphaFirst) : sum_(sum) {
+    const int first = alphaFirst ? 1 : 0;
+    const int red = blueFirst ? first + 2 : first;
+    const int blue = blueFirst ? first : first + 2;
+    redBlue_ = Pick(red, blue);
+    green_ = Pick(first + 1, first + 1);
+  }
+  template <bool kSeconds>
+  Bytes Of(const uint8_t* p) const {
+    Register sums[4];
+    for (int i = 0; i < 4; ++i) {
+      const Register pixels =
+          kSeconds ? Odd(LoadLanes(p, 2 * i, 8), LoadLanes(p, 2 * i + 1, 8)) : LoadLanes(p, i, 4);
+      sums[i] = sum_.Sums(KESTREL_SIMD(shuffle_epi8)(pixels, redBlue_),
+                          KESTREL_SIMD(shuffle_epi8)(pixels, green_));
+    }
+    return Narrow({KESTREL_SIMD(packs_epi32)(sums[0], sums[1])},
+                  {KESTREL_SIMD(packs_epi32)(sums[2], sums[3])});
+  }
+
+ private:
+  // Bytes a and b of each pixel as words.
+  static Register Pick(int a, int b) {
+    return KESTREL_SIMD(add_epi8)(
+        KESTREL_SIMD(set1_epi32)(int32_t(uint32_t(a) | 0x8000u | uint32_t(b) << 16 | 0x80000000u)),
+        Broadcast(_mm_setr_epi32(0, 0x00040004, 0x00080008, 0x000C000C)));
+  }
+  // The second pixels of pairs.
+  static Register Odd(Register a, Register b) {
+#ifdef __AVX2__
+    return _mm256_castps_si256(
+        _mm256_shuffle_ps(_mm256_castsi256_ps(a), _mm256_castsi256_ps(b), 0xDD));
+#else
+    return _mm_castps_si128(_mm_shuffle_ps(_mm_castsi128_ps(a), _mm_castsi128_ps(b), 0xDD));
+#endif
+  }
+
+  WeightedSum sum_;
+  Register redBlue_, green_;
 };
 
 }  // namespace
