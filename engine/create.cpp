@@ -345,7 +345,6 @@ uint32_t Decide(const MPPFORMAT& dst, const MPPFORMAT& src, const MPPPARAM& para
   c->dstOriginX = SaturateToInt32(geometry.x.dstOrigin);
   c->dstOriginY = SaturateToInt32(geometry.y.dstOrigin);
 
-  c->rows = SelectRowOps();
   BuildConversionTables(c);
   SettleUnitScale(c);
   OrientDestination(c);
@@ -383,16 +382,40 @@ uint32_t BuiltAs(uint32_t format) {
   }
 }
 
+uint32_t BuildPass(const MPPFORMAT& dst, const MPPFORMAT& src, const MPPPARAM& params,
+                   const KestrelRowOps* rows, PassEngine** out) {
+  if (dst.width == 0 || dst.height == 0 || src.width == 0 || src.height == 0) {
+    return KESTREL_BAD_ARGUMENT;
+  }
+  PassEngine* engine = AllocateZeroed<PassEngine>();
+  if (engine == nullptr) return KESTREL_OUT_OF_MEMORY;
+  EngineContext* context = AllocateZeroed<EngineContext>();
+  if (context == nullptr) {
+    MMemFree(nullptr, engine);
+    return KESTREL_OUT_OF_MEMORY;
+  }
+  context->rows = rows;
+  const uint32_t result = Decide(dst, src, params, context, engine);
+  if (result != KESTREL_OK) {
+    FreeContext(context);
+    MMemFree(nullptr, engine);
+    return result;
+  }
+  *out = engine;
+  return KESTREL_OK;
+}
+
 uint32_t BuildPasses(const MPPFORMAT& dst, const MPPFORMAT& src, const MPPPARAM& params,
                      MPPHandle* handle) {
+  const KestrelRowOps* const rows = SelectRowOps();
   if (params.passMode != MPP_PASS_TILED) {
-    return MPPBuildEngine(&dst, &src, &params, &handle->pass[0]);
+    return BuildPass(dst, src, params, rows, &handle->pass[0]);
   }
   MPPPARAM pass = params;
   uint32_t result = KESTREL_OK;
   for (uint32_t i = 0; i < 3 && result == KESTREL_OK; ++i) {
     pass.passMode = i + 1;
-    result = MPPBuildEngine(&dst, &src, &pass, &handle->pass[i]);
+    result = BuildPass(dst, src, pass, rows, &handle->pass[i]);
   }
   return result;
 }
@@ -406,26 +429,10 @@ extern "C" {
 
 uint32_t MPPBuildEngine(const MPPFORMAT* dstFormat, const MPPFORMAT* srcFormat,
                         const MPPPARAM* params, PassEngine** outEngine) {
-  if (dstFormat == nullptr || srcFormat == nullptr || params == nullptr || outEngine == nullptr ||
-      dstFormat->width == 0 || dstFormat->height == 0 || srcFormat->width == 0 ||
-      srcFormat->height == 0) {
+  if (dstFormat == nullptr || srcFormat == nullptr || params == nullptr || outEngine == nullptr) {
     return KESTREL_BAD_ARGUMENT;
   }
-  PassEngine* engine = AllocateZeroed<PassEngine>();
-  if (engine == nullptr) return KESTREL_OUT_OF_MEMORY;
-  EngineContext* context = AllocateZeroed<EngineContext>();
-  if (context == nullptr) {
-    MMemFree(nullptr, engine);
-    return KESTREL_OUT_OF_MEMORY;
-  }
-  const uint32_t result = Decide(*dstFormat, *srcFormat, *params, context, engine);
-  if (result != KESTREL_OK) {
-    FreeContext(context);
-    MMemFree(nullptr, engine);
-    return result;
-  }
-  *outEngine = engine;
-  return KESTREL_OK;
+  return BuildPass(*dstFormat, *srcFormat, *params, SelectRowOps(), outEngine);
 }
 
 uint32_t MPPCreate(MPPFORMAT* dstFormat, MPPFORMAT* srcFormat, MPPPARAM* params,

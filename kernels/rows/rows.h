@@ -54,7 +54,10 @@ enum class YuvToRgbForm : uint8_t {
   kWide,       // sums can leave the clamp tables: in numbers that cannot wrap
   kTable,      // by table reads, or by sums of 16 bits
   kWholeLuma,  // the same with a luma gain of exactly 65536: luma adds no fraction to the sums
-  kSixBits,    // by factors of six fractional bits, see yuvToRgbSixBit
+  // By factors of six fractional bits, for full range BT.601, never adjusted:
+  //   R = Y + ((90 V - 11485) >> 6), G = Y + ((8669 - 46 V - 22 U) >> 6),
+  //   B = Y + ((113 U - 14516) >> 6), each clamped to 0..255.
+  kSixBits,
 };
 
 struct YuvToRgb {
@@ -145,18 +148,11 @@ struct KestrelRowOps {
   void (*unpackIndexed)(uint8_t* const rgb[3], const uint8_t* row, const int32_t* columns,
                         uint32_t bits, const uint8_t* palette, int n);
 
-  void (*yuvToRgb)(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u, const uint8_t* v,
-                   const kestrel::YuvToRgbTable& table, int n);
   void (*yuvToRgbWide)(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u, const uint8_t* v,
                        const kestrel::YuvToRgbWide& sums, int n);
   void (*yuvToRgbCarry)(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u, const uint8_t* v,
                         const kestrel::YuvToRgbWide& sums, kestrel::Carry* carry, int n);
-  // By factors of six fractional bits, for full range BT.601, never adjusted:
-  //   R = Y + ((90 V - 11485) >> 6), G = Y + ((8669 - 46 V - 22 U) >> 6),
-  //   B = Y + ((113 U - 14516) >> 6), each clamped to 0..255.
-  void (*yuvToRgbSixBit)(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u,
-                         const uint8_t* v, int n);
-  // The same as whole packed pixels.
+  // Whole packed pixels.
   void (*yuvToPixels)(const kestrel::PixelRows& rows, const kestrel::ChromaRows& chroma,
                       const kestrel::YuvToRgb& colour, const kestrel::PixelFormat& format,
                       kestrel::AlphaFill alpha, int n);

@@ -2,16 +2,51 @@
 #include "engine/engine_internal.h"
 #include "kernels/rows/rows.h"
 
+#if defined(__x86_64__)
+#include <cpuid.h>
+#endif
+
 namespace kestrel {
+namespace {
+
+#if defined(__x86_64__)
+
+// Bits of CPUID and of XGETBV.
+constexpr uint32_t kLeaf1Sse41 = 1u << 19;
+constexpr uint32_t kLeaf1SystemSavesState = 1u << 27;
+constexpr uint32_t kLeaf7Avx2 = 1u << 5;
+constexpr uint32_t kStateOfSseAndAvx = 6;
+
+struct CpuFeatures {
+  bool sse41, avx2;
+};
+
+// Asked for every engine, since the library keeps no state. It takes microseconds where the CPU is
+// a virtual one, for which an engine of several passes asks once.
+CpuFeatures AskCpu() {
+  uint32_t a, b, c, d;
+  CpuFeatures found = {false, false};
+  if (__get_cpuid(1, &a, &b, &c, &d) == 0) return found;
+  found.sse41 = (c & kLeaf1Sse41) != 0;
+  if ((c & kLeaf1SystemSavesState) == 0) return found;
+  uint32_t state, high;
+  __asm__("xgetbv" : "=a"(state), "=d"(high) : "c"(0));
+  if ((state & kStateOfSseAndAvx) != kStateOfSseAndAvx) return found;
+  found.avx2 = __get_cpuid_count(7, 0, &a, &b, &c, &d) != 0 && (b & kLeaf7Avx2) != 0;
+  return found;
+}
+
+#endif
+
+}  // namespace
 
 RowOpsList AvailableRowOps() {
   RowOpsList list = {};
   int n = 0;
 #if defined(__x86_64__)
-  // The compiler's own library asks the CPU once, when it is loaded: asking takes microseconds
-  // where the CPU is a virtual one.
-  if (__builtin_cpu_supports("avx2")) list.ops[n++] = &kAvx2Rows;
-  if (__builtin_cpu_supports("sse4.1")) list.ops[n++] = &kSse41Rows;
+  const CpuFeatures features = AskCpu();
+  if (features.avx2) list.ops[n++] = &kAvx2Rows;
+  if (features.sse41) list.ops[n++] = &kSse41Rows;
 #elif defined(__ARM_NEON)
   list.ops[n++] = &kNeonRows;
 #endif
