@@ -339,28 +339,32 @@ class Pipeline {
     }
     PixelChroma chroma = {};
     for (int i = 0; i < collected; ++i) {
-      memcpy(luma_ + i * n_, source_.Luma(r + i), size_t(n_));
-      chroma = CollectChroma(source_.ChromaOfPixels(r + i), i);
+      uint8_t* const into = luma_ + i * n_;
+      const uint8_t* const luma = source_.Luma(r + i, into);
+      if (luma != into) memcpy(into, luma, size_t(n_));
+      const PixelChroma row = CollectChroma(r + i, i);
+      if (i == 0) chroma = row;
     }
     ConvertPixels(r, {nullptr, 0, luma_, n_, collected}, chroma);
     return collected;
   }
 
-  // Chroma of a strip as row i of those collected in channels_.
-  PixelChroma CollectChroma(const PixelChroma& strip, int i) {
-    const ChromaRows& from = strip.rows;
-    const int samples = ((n_ - 1 + strip.phase) >> from.shift) + 1;
-    if (from.step == 2) {
-      uint8_t* const pairs = channels_[0];  // and [1]
-      const bool uFirst = from.u < from.v;
-      memcpy(pairs + ptrdiff_t{2} * i * samples, uFirst ? from.u : from.v, size_t(2) * samples);
-      return {{pairs + (uFirst ? 0 : 1), pairs + (uFirst ? 1 : 0), from.shift, 2,
-               ptrdiff_t{2} * samples, ptrdiff_t{2} * samples, 0},
-              strip.phase};
+  // Chroma of a row as row i of those collected.
+  PixelChroma CollectChroma(int32_t r, int i) {
+    uint8_t* const u = channels_[0] + i * n_;
+    uint8_t* const v = channels_[1] + i * n_;
+    PixelChroma chroma = source_.ChromaOfPixels(r, u, v);
+    ChromaRows& rows = chroma.rows;
+    if (source_.ChromaIsGrey()) return chroma;
+    const int samples = ((n_ - 1 + chroma.phase) >> rows.shift) + 1;
+    if (rows.step == 2) {
+      rows_.deinterleave(rows.u < rows.v ? u : v, rows.u < rows.v ? v : u,
+                         rows.u < rows.v ? rows.u : rows.v, samples);
+    } else if (rows.u != u) {
+      memcpy(u, rows.u, size_t(samples));
+      memcpy(v, rows.v, size_t(samples));
     }
-    memcpy(channels_[0] + i * samples, from.u, size_t(samples));
-    memcpy(channels_[1] + i * samples, from.v, size_t(samples));
-    return {{channels_[0], channels_[1], from.shift, 1, samples, samples, 0}, strip.phase};
+    return {{u, v, rows.shift, 1, n_, n_, 0}, chroma.phase};
   }
 
   // Fills in where the pixels of `rows` go.

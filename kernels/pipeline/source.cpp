@@ -132,7 +132,7 @@ void Source::SelectPixelChroma(int32_t x, int n) {
   }
 }
 
-PixelChroma Source::ChromaOfPixels(int32_t r) {
+PixelChroma Source::ChromaOfPixels(int32_t r, uint8_t* intoU, uint8_t* intoV) {
   if (pixelChroma_ == PixelChromaRead::kGrey) return {{u_, v_, 0, 1, 0, 0, 0}, 0};
   const int32_t row = rowPositions_.At(r, job_.engine.srcSubsample[4]).first;
   const uint8_t* const u = RowStart(1, row);
@@ -144,14 +144,15 @@ PixelChroma Source::ChromaOfPixels(int32_t r) {
                job_.srcPitches[2], job_.engine.srcSubsample[4] == 2 ? 1 : 0},
               phase_};
     case PixelChromaRead::kStrided:
-      rows_.readStrided(u_, u + start, chromaU_.step, chromaCount_);
-      rows_.readStrided(v_, v + start, chromaU_.step, chromaCount_);
-      return {{u_, v_, shift_, 1, 0, 0, 0}, phase_};
+      rows_.readStrided(intoU, u + start, chromaU_.step, chromaCount_);
+      rows_.readStrided(intoV, v + start, chromaU_.step, chromaCount_);
+      return {{intoU, intoV, shift_, 1, 0, 0, 0}, phase_};
     case PixelChromaRead::kPairs:
       rows_.readPairs(packed_, u, chromaU_.plan);
-      return {{packed_, packed_ + 1, 0, 2, 0, 0, 0}, 0};
+      rows_.deinterleave(intoU, intoV, packed_, chromaCount_);
+      return {{intoU, intoV, 0, 1, 0, 0, 0}, 0};
     default:
-      return {{ReadSamples(u_, u, chromaU_), ReadSamples(v_, v, chromaU_), 0, 1, 0, 0, 0}, 0};
+      return {{ReadSamples(intoU, u, chromaU_), ReadSamples(intoV, v, chromaU_), 0, 1, 0, 0, 0}, 0};
   }
 }
 
@@ -214,10 +215,10 @@ const uint8_t* Source::ChromaAt(int plane, int32_t x, int32_t row) const {
 }
 
 const uint8_t* Source::LumaInPlace(int32_t r) const {
+  if (!first_.contiguous || first_.step != 1 || interpolates_) return nullptr;
   const Taps taps = rowPositions_.At(r, 1);
-  const bool inPlace = first_.contiguous && first_.step == 1 && !interpolates_ &&
-                       (taps.weight == 0 || taps.first == taps.second);
-  return inPlace ? RowStart(0, taps.first) + first_.offset[0] : nullptr;
+  if (taps.weight != 0 && taps.first != taps.second) return nullptr;
+  return RowStart(0, taps.first) + first_.offset[0];
 }
 
 const uint8_t* Source::ReadSamples(uint8_t* buffer, const uint8_t* row,
@@ -303,13 +304,14 @@ void Source::FetchLines(int32_t r, Fill fill, Line** first, Line** second, uint1
   *second = FetchLine(taps.second, *first, fill);
 }
 
-const uint8_t* Source::Luma(int32_t r) {
+const uint8_t* Source::Luma(int32_t r, uint8_t* into) {
   Line *first, *second;
   uint16_t weight;
   FetchLines(r, &Source::FillLumaLine, &first, &second, &weight);
   if (weight == 0) return first->channel[0];
-  rows_.blendRows(blended_[0], first->channel[0], second->channel[0], weight, first_.n);
-  return blended_[0];
+  uint8_t* const blended = into != nullptr ? into : blended_[0];
+  rows_.blendRows(blended, first->channel[0], second->channel[0], weight, first_.n);
+  return blended;
 }
 
 const uint8_t* Source::Chroma(int plane, int32_t r, const SampleColumns& columns, uint8_t* buffer) {

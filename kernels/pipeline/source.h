@@ -57,15 +57,18 @@ class Source {
   int32_t SourceRow(int32_t r, uint32_t factor) const { return rowPositions_.At(r, factor).first; }
   ptrdiff_t pitch(int plane) const { return job_.srcPitches[plane]; }
 
-  // Runs for loop row r: valid until the next call of the same function.
-  const uint8_t* Luma(int32_t r);
+  // Runs for loop row r: valid until the next call of the same function. What is not in place is
+  // made in `into` where that is given.
+  const uint8_t* Luma(int32_t r, uint8_t* into = nullptr);
   const uint8_t* U(int32_t r);
   const uint8_t* V(int32_t r);
   RgbRun Rgb(int32_t r);
   // The strip's packed pixels, untouched; null where they are blended or come from a palette.
   const uint8_t* Pixels(int32_t r);
   const PixelFormat& pixelFormat() const { return pixels_; }
-  PixelChroma ChromaOfPixels(int32_t r);
+  PixelChroma ChromaOfPixels(int32_t r) { return ChromaOfPixels(r, u_, v_); }
+  PixelChroma ChromaOfPixels(int32_t r, uint8_t* u, uint8_t* v);
+  bool ChromaIsGrey() const { return pixelChroma_ == PixelChromaRead::kGrey; }
   // Where the luma of the strip lies in the source as it is wanted; null when it does not.
   const uint8_t* LumaInPlace(int32_t r) const;
   bool ChromaIsInPlace() const { return pixelChroma_ == PixelChromaRead::kInPlace; }

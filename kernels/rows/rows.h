@@ -101,9 +101,14 @@ struct PairPlan {
   const int32_t* first;  // of pair i: first[i * stride], second[i * stride]
   const int32_t* second;
   int stride;
-  const uint16_t* weights;    // for blendPairs: a weight for each pair
-  int32_t window[kMost / 4];  // for each four pairs a window of 16 bytes, and where in it they are
-  uint8_t shuffle[kMost / 4][8];
+  const uint16_t* weights;  // for blendPairs: a weight for each pair
+  bool hasWindows;          // everywhere
+  // Of each eight pairs: a window of 16 bytes for each half of them, and where in it their bytes
+  // are.
+  struct Eight {
+    int32_t window[2];
+    uint8_t shuffle[2][8];
+  } eights[kMost / 8];
 };
 
 // Error carry of 16-bit RGB: the bits that narrowing drops are added to the next pixel's index.

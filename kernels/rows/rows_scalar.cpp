@@ -482,6 +482,18 @@ using Lanes2 = uint16_t __attribute__((vector_size(16)));
 using Lanes4 = uint32_t __attribute__((vector_size(16)));
 using Lanes8 = uint64_t __attribute__((vector_size(16)));
 
+// Vectors anywhere in memory. Some compilers make calls of memcpy with 16 bytes.
+template <typename Lanes>
+Lanes LoadLanes(const uint8_t* p) {
+  using Unaligned [[gnu::aligned(1), gnu::may_alias]] = Lanes;
+  return *reinterpret_cast<const Unaligned*>(p);
+}
+template <typename Lanes>
+void StoreLanes(uint8_t* p, Lanes lanes) {
+  using Unaligned [[gnu::aligned(1), gnu::may_alias]] = Lanes;
+  *reinterpret_cast<Unaligned*>(p) = lanes;
+}
+
 static Lanes1 LowPairs(Lanes1 a, Lanes1 b) {
   return __builtin_shufflevector(a, b, 0, 16, 1, 17, 2, 18, 3, 19, 4, 20, 5, 21, 6, 22, 7, 23);
 }
@@ -527,7 +539,7 @@ inline __attribute__((always_inline)) void PairRows(Lanes (&rows)[kRows]) {
 template <typename Lanes, int kRows>
 inline __attribute__((always_inline)) void LoadPaired(Lanes (&rows)[kRows], const uint8_t* src,
                                                       ptrdiff_t srcPitch) {
-  for (int i = 0; i < kRows; ++i) memcpy(&rows[i], src + i * srcPitch, sizeof(Lanes));
+  for (int i = 0; i < kRows; ++i) rows[i] = LoadLanes<Lanes>(src + i * srcPitch);
   PairRows<(kRows == 8 ? 3 : 2)>(rows);
 }
 
@@ -539,7 +551,7 @@ struct TransposedSquare {
   static void Write(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch) {
     Lanes rows[kSide];
     LoadPaired(rows, src, srcPitch);
-    for (int i = 0; i < kSide; ++i) memcpy(dst + i * dstPitch, &rows[i], 16);
+    for (int i = 0; i < kSide; ++i) StoreLanes(dst + i * dstPitch, rows[i]);
   }
 };
 
@@ -553,10 +565,8 @@ struct TransposedSquare<Lanes1, 1> {
     LoadPaired(upper, src, srcPitch);
     LoadPaired(lower, src + 8 * srcPitch, srcPitch);
     for (int i = 0; i < 8; ++i) {
-      const Lanes8 even = LowPairs(Lanes8(upper[i]), Lanes8(lower[i]));
-      const Lanes8 odd = HighPairs(Lanes8(upper[i]), Lanes8(lower[i]));
-      memcpy(dst + 2 * i * dstPitch, &even, 16);
-      memcpy(dst + (2 * i + 1) * dstPitch, &odd, 16);
+      StoreLanes(dst + 2 * i * dstPitch, LowPairs(Lanes8(upper[i]), Lanes8(lower[i])));
+      StoreLanes(dst + (2 * i + 1) * dstPitch, HighPairs(Lanes8(upper[i]), Lanes8(lower[i])));
     }
   }
 };

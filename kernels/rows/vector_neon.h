@@ -6,6 +6,8 @@
 #include <arm_neon.h>
 #include <stdint.h>
 
+#include "kernels/rows/weights.h"
+
 namespace kestrel {
 namespace {
 
@@ -17,6 +19,10 @@ struct Words {
 };
 struct WordsPair {
   Words low, high;
+};
+// The bytes of kBytes pixels, by their place in the pixel.
+struct PixelBytes {
+  Bytes low, middle, high, alpha;
 };
 // Products of 32 bits as two vectors of halves.
 struct Product {
@@ -90,13 +96,24 @@ template <int kBits>
 inline Words ShiftRightUnsigned(Words a) {
   return {vshrq_n_u16(a.v, kBits)};
 }
-// Half of the doubled product, both rounded down: the product's high half.
-inline Words MultiplyHigh(Words a, Words b) {
-  return Unsigned(vshrq_n_s16(vqdmulhq_s16(Signed(a), Signed(b)), 1));
+// base + the high half of the signed product: half of the doubled product's, both rounded down.
+inline Words AddHighProduct(Words base, Words a, Words b) {
+  return Unsigned(vsraq_n_s16(Signed(base), vqdmulhq_s16(Signed(a), Signed(b)), 1));
 }
-inline Product Multiply(Words a, Words b) {
-  const uint32x4_t low = vmull_u16(vget_low_u16(a.v), vget_low_u16(b.v));
-  const uint32x4_t high = vmull_u16(vget_high_u16(a.v), vget_high_u16(b.v));
+// A number that words are multiplied by.
+struct Factor {
+  explicit Factor(int value) : lanes(vdup_n_u16(uint16_t(value))) {}
+  uint16x4_t lanes;
+};
+inline Words MultiplyAdd(Words sum, Words a, const Factor& f) {
+  return {vmlaq_lane_u16(sum.v, a.v, f.lanes, 0)};
+}
+inline Words MultiplySubtract(Words sum, Words a, const Factor& f) {
+  return {vmlsq_lane_u16(sum.v, a.v, f.lanes, 0)};
+}
+inline Product Multiply(Words a, const Factor& f) {
+  const uint32x4_t low = vmull_u16(vget_low_u16(a.v), f.lanes);
+  const uint32x4_t high = vmull_u16(vget_high_u16(a.v), f.lanes);
   const uint16x8x2_t halves = vuzpq_u16(vreinterpretq_u16_u32(low), vreinterpretq_u16_u32(high));
   return {{halves.val[0]}, {halves.val[1]}};
 }
@@ -106,8 +123,39 @@ inline Words PrepareCarry(Words addend) {
 }
 // -1 where low + addend, both unsigned, does not fit 16 bits.
 inline Words CarryOf(Words low, Words preparedAddend) {
-  return {vcgtq_u16(low.v, preparedAddend.v)};
+  uint16x8_t carry = vcgtq_u16(low.v, preparedAddend.v);
+  // Keeps the compiler from turning "minus -1" into "and 1, plus".
+  __asm__("" : "+w"(carry));
+  return {carry};
 }
+
+// A component of chroma, prepared for several words, and a word that it is converted to:
+// offset + c * gain, in numbers of 32 bits.
+struct ChromaFactor {
+  explicit ChromaFactor(Words c)
+      : low(vreinterpretq_s32_u32(vmovl_u16(vget_low_u16(c.v)))),
+        high(vreinterpretq_s32_u32(vmovl_u16(vget_high_u16(c.v)))) {}
+  int32x4_t low, high;
+};
+class ChromaWord {
+ public:
+  ChromaWord(int32_t gain, int32_t offset)
+      : gain_(vdup_n_s32(gain)), offset_(vdupq_n_s32(offset)) {}
+  // Without its lowest 12 bits, and modulo 65536: four fractional bits are left.
+  Words Sixteenths(const ChromaFactor& c) const {
+    return Unsigned(vcombine_s16(vshrn_n_s32(Sum(c.low), 12), vshrn_n_s32(Sum(c.high), 12)));
+  }
+  // Without its lowest 16 bits.
+  Words Whole(const ChromaFactor& c) const {
+    return Unsigned(vcombine_s16(vshrn_n_s32(Sum(c.low), 16), vshrn_n_s32(Sum(c.high), 16)));
+  }
+
+ private:
+  int32x4_t Sum(int32x4_t c) const { return vmlaq_lane_s32(offset_, c, gain_, 0); }
+
+  int32x2_t gain_;
+  int32x4_t offset_;
+};
 
 // ---- Between bytes and words
 inline WordsPair Widen(Bytes b) {
@@ -116,6 +164,10 @@ inline WordsPair Widen(Bytes b) {
 // Signed words clamped to bytes.
 inline Bytes Narrow(Words low, Words high) {
   return {vcombine_u8(vqmovun_s16(Signed(low)), vqmovun_s16(Signed(high)))};
+}
+template <int kBits>
+inline Bytes NarrowShifted(Words low, Words high) {
+  return {vcombine_u8(vqshrun_n_s16(Signed(low), kBits), vqshrun_n_s16(Signed(high), kBits))};
 }
 // Each word twice: words of half as many samples become words for pixels.
 inline WordsPair Double(Words w) {
@@ -140,17 +192,17 @@ inline void StorePixelWords(uint8_t* p, WordsPair w) {
 inline WordsPair LoadPixelWords(const uint8_t* p) {
   return {LoadWords(p), LoadWords(p + 16)};
 }
-inline void Load4(const uint8_t* p, Bytes (&channels)[4]) {
+inline PixelBytes Load4(const uint8_t* p) {
   const uint8x16x4_t pixels = vld4q_u8(p);
-  for (int c = 0; c < 4; ++c) channels[c] = {pixels.val[c]};
+  return {{pixels.val[0]}, {pixels.val[1]}, {pixels.val[2]}, {pixels.val[3]}};
 }
 inline void Store4(uint8_t* p, Bytes a, Bytes b, Bytes c, Bytes d) {
   const uint8x16x4_t pixels = {{a.v, b.v, c.v, d.v}};
   vst4q_u8(p, pixels);
 }
-inline void Load3(const uint8_t* p, Bytes (&channels)[3]) {
+inline PixelBytes Load3(const uint8_t* p) {
   const uint8x16x3_t pixels = vld3q_u8(p);
-  for (int c = 0; c < 3; ++c) channels[c] = {pixels.val[c]};
+  return {{pixels.val[0]}, {pixels.val[1]}, {pixels.val[2]}, SetBytes(0)};
 }
 inline void Store3(uint8_t* p, Bytes a, Bytes b, Bytes c) {
   const uint8x16x3_t pixels = {{a.v, b.v, c.v}};
@@ -181,9 +233,9 @@ inline uint8x8_t GatherFour(const uint8_t* window, const uint8_t* shuffle) {
   return vtbl2_u8({{vget_low_u8(v), vget_high_u8(v)}}, vld1_u8(shuffle));
 #endif
 }
-inline Words GatherPairs(const uint8_t* src, const int32_t* windows, const uint8_t (*shuffles)[8]) {
-  return {vreinterpretq_u16_u8(vcombine_u8(GatherFour(src + windows[0], shuffles[0]),
-                                           GatherFour(src + windows[1], shuffles[1])))};
+inline Words GatherPairs(const uint8_t* src, const PairPlan::Eight* eight) {
+  return {vreinterpretq_u16_u8(vcombine_u8(GatherFour(src + eight->window[0], eight->shuffle[0]),
+                                           GatherFour(src + eight->window[1], eight->shuffle[1])))};
 }
 
 // The odd bytes of two vectors.
@@ -192,66 +244,106 @@ inline Bytes Seconds(Bytes a, Bytes b) {
 }
 
 // ---- RGB to YUV
-// (offset + r * w0 + g * w1 + b * w2) >> 16 of bytes. Each weight is 256 * high + low.
+// Bits above and below eight of the weights' magnitudes: all |weight| = 256 * high + low, or all
+// 256 * high - low, so that sums of either part fit 16 bits.
+struct WeightParts {
+  int32_t high[3], low[3];
+  bool minus;
+
+  explicit WeightParts(const int32_t (&weights)[3]) : minus(false) {
+    int32_t sum = 0;
+    for (int c = 0; c < 3; ++c) {
+      const int32_t magnitude = weights[c] < 0 ? -weights[c] : weights[c];
+      high[c] = magnitude >> 8;
+      low[c] = magnitude & 255;
+      sum += low[c];
+    }
+    if (sum <= 256) return;
+    minus = true;
+    for (int c = 0; c < 3; ++c) {
+      if (low[c] == 0) continue;
+      ++high[c];
+      low[c] = 256 - low[c];
+    }
+  }
+};
+
+// (offset + low * w0 + middle * w1 + high * w2) >> 16 of the bytes of a pixel. Bytes with a
+// negative weight are complemented, which makes all products positive.
+template <Signs kSigns, bool kMinus>
 class WeightedSum {
  public:
-  WeightedSum(const int32_t (&weights)[3], int32_t offset) : offset_(offset) {
+  WeightedSum(const Weights& weights, const WeightParts& parts) {
+    int32_t offset = weights.offset;
     for (int c = 0; c < 3; ++c) {
-      positive_[c] = weights[c] >= 0;
-      magnitude_[c] = vdup_n_u16(uint16_t(positive_[c] ? weights[c] : -weights[c]));
+      if (weights.of[c] < 0) offset += 255 * weights.of[c];
+      high_[c] = vdup_n_u8(uint8_t(parts.high[c]));
+      low_[c] = vdup_n_u8(uint8_t(parts.low[c]));
     }
+    // Sums of the low parts that count down start so high that they stay positive.
+    constexpr int32_t kFloor = kMinus ? 255 : 0;
+    highOffset_ = vdupq_n_u16(uint16_t((offset >> 8) - kFloor));
+    lowOffset_ = vdupq_n_u16(uint16_t((offset & 255) + 256 * kFloor));
   }
-  Bytes Of(Bytes r, Bytes g, Bytes b) const {
-    return {vcombine_u8(Eight(vget_low_u8(r.v), vget_low_u8(g.v), vget_low_u8(b.v)),
-                        Eight(vget_high_u8(r.v), vget_high_u8(g.v), vget_high_u8(b.v)))};
+  Bytes Of(Bytes low, Bytes middle, Bytes high) const {
+    const uint8x16_t l = kSigns == Signs::kLastPositive ? vmvnq_u8(low.v) : low.v;
+    const uint8x16_t m = kSigns != Signs::kAllPositive ? vmvnq_u8(middle.v) : middle.v;
+    const uint8x16_t h = kSigns == Signs::kFirstPositive ? vmvnq_u8(high.v) : high.v;
+    return {vcombine_u8(Eight(vget_low_u8(l), vget_low_u8(m), vget_low_u8(h)),
+                        Eight(vget_high_u8(l), vget_high_u8(m), vget_high_u8(h)))};
   }
-
- private:
-  uint32x4_t Four(const uint16x4_t (&rgb)[3]) const {
-    uint32x4_t sum = vdupq_n_u32(uint32_t(offset_));
-    for (int c = 0; c < 3; ++c) {
-      sum = positive_[c] ? vmlal_u16(sum, rgb[c], magnitude_[c])
-                         : vmlsl_u16(sum, rgb[c], magnitude_[c]);
-    }
-    return sum;
-  }
-  uint8x8_t Eight(uint8x8_t r, uint8x8_t g, uint8x8_t b) const {
-    const uint16x8_t wide[3] = {vmovl_u8(r), vmovl_u8(g), vmovl_u8(b)};
-    const uint16x4_t low[3] = {vget_low_u16(wide[0]), vget_low_u16(wide[1]), vget_low_u16(wide[2])};
-    const uint16x4_t high[3] = {vget_high_u16(wide[0]), vget_high_u16(wide[1]),
-                                vget_high_u16(wide[2])};
-    return vmovn_u16(vcombine_u16(vshrn_n_u32(Four(low), 16), vshrn_n_u32(Four(high), 16)));
-  }
-
-  uint16x4_t magnitude_[3];
-  bool positive_[3];
-  int32_t offset_;
-};
-
-// The sums of kBytes pixels of four bytes, or of the second ones of as many pairs.
-class PixelSum {
- public:
-  PixelSum(const WeightedSum& sum, bool blueFirst, bool alphaFirst)
-      : sum_(sum), blueFirst_(blueFirst), alphaFirst_(alphaFirst) {}
+  // The sums of kBytes pixels of four bytes, or of the second ones of as many pairs.
   template <bool kSeconds>
-  Bytes Of(const uint8_t* p) const {
-    Bytes channels[4];
-    Load4(p, channels);
-    if (kSeconds) {
-      Bytes more[4];
-      Load4(p + 4 * kBytes, more);
-      for (int c = 0; c < 4; ++c) channels[c] = Seconds(channels[c], more[c]);
+  Bytes OfPixels(const uint8_t* p) const {
+    const PixelBytes pixels = Load4(p);
+    if constexpr (kSeconds) {
+      const PixelBytes more = Load4(p + 4 * kBytes);
+      return Of(Seconds(pixels.low, more.low), Seconds(pixels.middle, more.middle),
+                Seconds(pixels.high, more.high));
+    } else {
+      return Of(pixels.low, pixels.middle, pixels.high);
     }
-    const Bytes low = alphaFirst_ ? channels[1] : channels[0];
-    const Bytes middle = alphaFirst_ ? channels[2] : channels[1];
-    const Bytes high = alphaFirst_ ? channels[3] : channels[2];
-    return sum_.Of(blueFirst_ ? high : low, middle, blueFirst_ ? low : high);
   }
 
  private:
-  WeightedSum sum_;
-  bool blueFirst_, alphaFirst_;
+  uint8x8_t Eight(uint8x8_t l, uint8x8_t m, uint8x8_t h) const {
+    uint16x8_t low = lowOffset_;
+    if constexpr (kMinus) {
+      low = vmlsl_u8(vmlsl_u8(vmlsl_u8(low, l, low_[0]), m, low_[1]), h, low_[2]);
+    } else {
+      low = vmlal_u8(vmlal_u8(vmlal_u8(low, l, low_[0]), m, low_[1]), h, low_[2]);
+    }
+    const uint16x8_t high =
+        vmlal_u8(vmlal_u8(vmlal_u8(highOffset_, l, high_[0]), m, high_[1]), h, high_[2]);
+    return vshrn_n_u16(vsraq_n_u16(high, low, 8), 8);
+  }
+
+  uint8x8_t high_[3], low_[3];
+  uint16x8_t highOffset_, lowOffset_;
 };
+
+template <Signs kSigns, typename Call>
+void WithSumOf(const Weights& weights, const WeightParts& parts, const Call& call) {
+  if (parts.minus) {
+    call(WeightedSum<kSigns, true>(weights, parts));
+  } else {
+    call(WeightedSum<kSigns, false>(weights, parts));
+  }
+}
+
+// (Weights of every standard can be parted: a test of the rows looks at all of them.)
+template <typename Call>
+void WithSum(const Weights& weights, const Call& call) {
+  const WeightParts parts(weights.of);
+  switch (weights.signs()) {
+    case Signs::kAllPositive:
+      return WithSumOf<Signs::kAllPositive>(weights, parts, call);
+    case Signs::kFirstPositive:
+      return WithSumOf<Signs::kFirstPositive>(weights, parts, call);
+    default:
+      return WithSumOf<Signs::kLastPositive>(weights, parts, call);
+  }
+}
 
 }  // namespace
 }  // namespace kestrel

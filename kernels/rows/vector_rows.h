@@ -51,7 +51,7 @@ inline void ForRun(uint8_t* const (&dst)[kDsts], int n, const Block& block, Sour
 inline Words Blend(Words a, Words b, Words weights) {
   const Words difference = b - a;
   // Weights are unsigned: one of 0.5 and more counts as itself less one.
-  return a + MultiplyHigh(difference, weights) + (difference & ShiftRight<15>(weights));
+  return AddHighProduct(a + (difference & ShiftRight<15>(weights)), difference, weights);
 }
 
 void BlendColumns(uint8_t* dst, const uint8_t* a, const uint8_t* b, const uint16_t* weights,
@@ -69,27 +69,51 @@ void BlendColumns(uint8_t* dst, const uint8_t* a, const uint8_t* b, const uint16
       Units{a, 1}, Units{b, 1}, Units{reinterpret_cast<const uint8_t*>(weights), 2});
 }
 
-void BlendRows(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t weight, int n) {
+template <bool kFromSecond>
+void BlendRowsFrom(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t weight, int n) {
   const Words w = SetWords(int(weight));
-  const bool fromSecond = weight >= 32768;
   uint8_t* const dsts[] = {dst};
   ForRun<1>(
       dsts, n,
       [=](uint8_t* const* out, const uint8_t* inA, const uint8_t* inB) {
         const WordsPair first = Widen(LoadBytes(inA));
         const WordsPair second = Widen(LoadBytes(inB));
-        const WordsPair& base = fromSecond ? second : first;
-        StoreBytes(out[0], Narrow(base.low + MultiplyHigh(second.low - first.low, w),
-                                  base.high + MultiplyHigh(second.high - first.high, w)));
+        const WordsPair& base = kFromSecond ? second : first;
+        StoreBytes(out[0], Narrow(AddHighProduct(base.low, second.low - first.low, w),
+                                  AddHighProduct(base.high, second.high - first.high, w)));
       },
       Units{a, 1}, Units{b, 1});
 }
 
-constexpr int kGroup = 4;  // pairs that share a window
-constexpr int kNoWindow = -1;
+// As in Blend: a weight of 0.5 and more counts as itself less one.
+void BlendRows(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t weight, int n) {
+  if (weight >= 32768) {
+    BlendRowsFrom<true>(dst, a, b, weight, n);
+  } else {
+    BlendRowsFrom<false>(dst, a, b, weight, n);
+  }
+}
+
+// Four pairs that share a window. No window reaches beyond the bytes that the run reads anyway,
+// [lowest, end). False when there is none.
+bool PlanWindow(const int32_t (&offsets)[8], int32_t lowest, int32_t end, int32_t* window,
+                uint8_t (&shuffle)[8]) {
+  int32_t first = offsets[0];
+  int32_t last = offsets[0];
+  for (const int32_t offset : offsets) {
+    if (offset < first) first = offset;
+    if (offset > last) last = offset;
+  }
+  if (first > end - 16) first = end - 16;
+  const bool fits = first >= lowest && last - first < 16;
+  *window = fits ? first : -1;
+  for (int k = 0; k < 8; ++k) shuffle[k] = uint8_t(fits ? offsets[k] - first : 0);
+  return fits;
+}
 
 void PlanPairs(PairPlan* plan) {
   const int n = plan->n;
+  plan->hasWindows = true;
   if (n == 0) return;
   int32_t lowest = INT32_MAX;
   int32_t end = 0;
@@ -100,33 +124,24 @@ void PlanPairs(PairPlan* plan) {
       if (offset >= end) end = offset + 1;
     }
   }
-  const int groups = (n + kWords - 1) / kWords * (kWords / kGroup);
-  for (int g = 0; g < groups; ++g) {
-    int32_t offsets[2 * kGroup];
-    int32_t window = INT32_MAX;
-    int32_t last = 0;
-    for (int i = 0; i < kGroup; ++i) {
-      const int pair = g * kGroup + i < n ? g * kGroup + i : n - 1;
-      offsets[2 * i] = plan->first[pair * plan->stride];
-      offsets[2 * i + 1] = plan->second[pair * plan->stride];
-      for (int k = 2 * i; k < 2 * i + 2; ++k) {
-        if (offsets[k] < window) window = offsets[k];
-        if (offsets[k] > last) last = offsets[k];
-      }
+  for (int i = 0; i < n; i += 4) {
+    int32_t offsets[8];
+    for (int k = 0; k < 4; ++k) {
+      const int pair = (i + k < n ? i + k : n - 1) * plan->stride;
+      offsets[2 * k] = plan->first[pair];
+      offsets[2 * k + 1] = plan->second[pair];
     }
-    // No window reaches beyond the bytes that the run reads anyway.
-    if (window > end - 16) window = end - 16;
-    const bool fits = window >= lowest && last - window < 16;
-    plan->window[g] = fits ? window : kNoWindow;
-    for (int k = 0; k < 2 * kGroup; ++k) {
-      plan->shuffle[g][k] = uint8_t(fits ? offsets[k] - window : 0);
+    PairPlan::Eight& eight = plan->eights[i / 8];
+    const int half = i / 4 % 2;
+    if (!PlanWindow(offsets, lowest, end, &eight.window[half], eight.shuffle[half])) {
+      plan->hasWindows = false;
     }
   }
 }
 
-inline bool HasWindows(const PairPlan& plan, int i) {
+bool HasWindows(const PairPlan::Eight* eights) {
   int32_t windows = 0;
-  for (int g = i / kGroup; g < (i + kWords) / kGroup; ++g) windows |= plan.window[g];
+  for (int i = 0; i < kWords / 8; ++i) windows |= eights[i].window[0] | eights[i].window[1];
   return windows >= 0;
 }
 
@@ -135,15 +150,24 @@ inline bool HasWindows(const PairPlan& plan, int i) {
 template <typename Block, typename Other>
 inline void ForPairs(const uint8_t* src, const PairPlan& plan, const Block& block,
                      const Other& other) {
-  int i = 0;
-  for (; i + kWords <= plan.n; i += kWords) {
-    if (HasWindows(plan, i)) {
-      block(i, GatherPairs(src, plan.window + i / kGroup, plan.shuffle + i / kGroup));
-    } else {
-      other(i, i + kWords);
+  const int whole = plan.n / kWords * kWords;
+  const PairPlan::Eight* eights = plan.eights;
+  if (plan.hasWindows) {
+    for (int i = 0; i < whole; i += kWords) {
+      block(i, GatherPairs(src, eights));
+      eights += kWords / 8;
+    }
+  } else {
+    for (int i = 0; i < whole; i += kWords) {
+      if (HasWindows(eights)) {
+        block(i, GatherPairs(src, eights));
+      } else {
+        other(i, i + kWords);
+      }
+      eights += kWords / 8;
     }
   }
-  other(i, plan.n);
+  other(whole, plan.n);
 }
 
 void ReadPairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan) {
@@ -153,37 +177,34 @@ void ReadPairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan) {
 }
 
 void BlendPairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan) {
+  const uint16_t* const weights = plan.weights;
   ForPairs(
       src, plan,
-      [=, &plan](int i, Words pairs) {
+      [=](int i, Words pairs) {
         StoreHalf(dst + i, Blend(pairs & SetWords(0xFF), ShiftRightUnsigned<8>(pairs),
-                                 LoadWords(plan.weights + i)));
+                                 LoadWords(weights + i)));
       },
       [=, &plan](int i, int end) { scalar::BlendSomePairs(dst, src, plan, i, end); });
 }
 
 // ---- Packed pixels
-// Which of the layouts that vectors know a format is.
+// Which of the layouts that vectors know a format is: red, green and blue (or the reverse) from the
+// lowest bits up, in bytes that may be followed by alpha, or in fields of 5, 6 and 5 bits.
 struct PixelShape {
   explicit PixelShape(const PixelFormat& format) {
     const uint32_t* at = format.position;
     const uint32_t* size = format.size;
     blueFirst = at[0] > at[2];
-    alphaFirst = format.alphaByte == 0;
     const uint32_t lowest = blueFirst ? at[2] : at[0];
     const uint32_t highest = blueFirst ? at[0] : at[2];
-    const bool bytesInTurn = format.wholeBytes && at[1] == lowest + 8 && highest == at[1] + 8 &&
-                             lowest == (alphaFirst ? 8 : 0);
+    const bool bytesInTurn = format.wholeBytes && lowest == 0 && at[1] == 8 && highest == 16;
     const bool is565 =
         size[0] == 5 && size[1] == 6 && size[2] == 5 && lowest == 0 && at[1] == 5 && highest == 11;
-    if (format.bytes == 4 || format.bytes == 3) {
-      bytes = bytesInTurn ? format.bytes : 0;
-    } else {
-      bytes = format.bytes == 2 && is565 ? 2 : 0;
-    }
+    const bool known = format.bytes == 2 ? is565 : format.bytes >= 3 && bytesInTurn;
+    bytes = known ? format.bytes : 0;
   }
   int bytes;  // 0: none of them
-  bool blueFirst, alphaFirst;
+  bool blueFirst;
 };
 
 // Pixels of 5, 6 and 5 bits from channels whose fields are in the top bits, or in the lowest.
@@ -195,104 +216,125 @@ inline Words PackFields565(Words low, Words green, Words high) {
   return low | ShiftLeft<5>(green) | ShiftLeft<11>(high);
 }
 
-inline void StorePixels(uint8_t* dst, const PixelShape& shape, Bytes r, Bytes g, Bytes b,
-                        Bytes alpha) {
-  const Bytes low = shape.blueFirst ? b : r;
-  const Bytes high = shape.blueFirst ? r : b;
-  if (shape.bytes == 4) {
-    if (shape.alphaFirst) {
-      Store4(dst, alpha, low, g, high);
-    } else {
-      Store4(dst, low, g, high, alpha);
-    }
-  } else if (shape.bytes == 3) {
-    Store3(dst, low, g, high);
+// Channels by their place in the pixel. kBytes pixels.
+template <int kPixel>
+inline void StorePixels(uint8_t* dst, Bytes low, Bytes middle, Bytes high, Bytes alpha) {
+  if constexpr (kPixel == 4) {
+    Store4(dst, low, middle, high, alpha);
+  } else if constexpr (kPixel == 3) {
+    Store3(dst, low, middle, high);
   } else {
     const WordsPair l = Widen(low);
-    const WordsPair m = Widen(g);
+    const WordsPair m = Widen(middle);
     const WordsPair h = Widen(high);
     StorePixelWords(dst, {Pack565(l.low, m.low, h.low), Pack565(l.high, m.high, h.high)});
   }
 }
 
-inline uint8_t AlphaOf(const PixelShape& shape, AlphaFill alpha) {
-  return uint8_t(shape.alphaFirst ? alpha.bits : alpha.bits >> 24);
+template <int kPixel>
+inline PixelBytes LoadPixels(const uint8_t* src) {
+  if constexpr (kPixel == 4) {
+    return Load4(src);
+  } else if constexpr (kPixel == 3) {
+    return Load3(src);
+  } else {
+    const WordsPair w = LoadPixelWords(src);
+    const Words five = SetWords(0xF8);
+    const Words six = SetWords(0xFC);
+    return {Narrow(ShiftLeft<3>(w.low) & five, ShiftLeft<3>(w.high) & five),
+            Narrow(ShiftRightUnsigned<3>(w.low) & six, ShiftRightUnsigned<3>(w.high) & six),
+            Narrow(ShiftRightUnsigned<8>(w.low) & five, ShiftRightUnsigned<8>(w.high) & five),
+            SetBytes(0)};
+  }
+}
+
+// Calls call(PixelSize) of a shape that is known.
+template <int kPixel>
+struct PixelSize {
+  static constexpr int value = kPixel;
+};
+template <typename Call>
+inline void WithPixelSize(const PixelShape& shape, const Call& call) {
+  if (shape.bytes == 4) {
+    call(PixelSize<4>());
+  } else if (shape.bytes == 3) {
+    call(PixelSize<3>());
+  } else {
+    call(PixelSize<2>());
+  }
+}
+
+inline uint8_t AlphaOf(AlphaFill alpha) {
+  return uint8_t(alpha.bits >> 24);
 }
 
 void PackRgb(uint8_t* dst, const uint8_t* const rgb[3], const PixelFormat& format,
              const FieldShifts& shifts, AlphaFill alpha, int n) {
   const PixelShape shape(format);
-  const Bytes fill = SetBytes(AlphaOf(shape, alpha));
-  uint8_t* const dsts[] = {dst};
-  const Units r = {rgb[0], 1};
-  const Units g = {rgb[1], 1};
-  const Units b = {rgb[2], 1};
-  const auto store = [&](uint8_t* const* out, const uint8_t* inR, const uint8_t* inG,
-                         const uint8_t* inB) {
-    StorePixels(out[0], shape, LoadBytes(inR), LoadBytes(inG), LoadBytes(inB), fill);
-  };
-  if (shape.bytes == 4) return ForRun<4>(dsts, n, store, r, g, b);
-  if (shape.bytes == 3) return ForRun<3>(dsts, n, store, r, g, b);
-  if (shape.bytes == 2 && shifts.right[0] == 3) return ForRun<2>(dsts, n, store, r, g, b);
-  if (shape.bytes != 2 || shifts.right[0] != 0) {
+  const bool narrowed = shape.bytes == 2 && shifts.right[0] == 0;
+  if (shape.bytes == 0 || (shape.bytes == 2 && !narrowed && shifts.right[0] != 3)) {
     return scalar::PackRgb(dst, rgb, format, shifts, alpha, n);
   }
-  ForRun<2>(
-      dsts, n,
-      [](uint8_t* const* out, const uint8_t* inLow, const uint8_t* inG, const uint8_t* inHigh) {
-        const WordsPair l = Widen(LoadBytes(inLow));
-        const WordsPair m = Widen(LoadBytes(inG));
-        const WordsPair h = Widen(LoadBytes(inHigh));
-        StorePixelWords(
-            out[0], {PackFields565(l.low, m.low, h.low), PackFields565(l.high, m.high, h.high)});
-      },
-      shape.blueFirst ? b : r, g, shape.blueFirst ? r : b);
-}
-
-// The bytes of kBytes pixels' channels.
-struct PixelBytes {
-  Bytes r, g, b, alpha;
-};
-inline PixelBytes LoadPixels(const uint8_t* src, const PixelShape& shape) {
-  Bytes low, middle, high;
-  Bytes alpha = SetBytes(0);
-  if (shape.bytes == 4) {
-    Bytes channels[4];
-    Load4(src, channels);
-    low = shape.alphaFirst ? channels[1] : channels[0];
-    middle = shape.alphaFirst ? channels[2] : channels[1];
-    high = shape.alphaFirst ? channels[3] : channels[2];
-    alpha = shape.alphaFirst ? channels[0] : channels[3];
-  } else if (shape.bytes == 3) {
-    Bytes channels[3];
-    Load3(src, channels);
-    low = channels[0];
-    middle = channels[1];
-    high = channels[2];
-  } else {
-    const WordsPair w = LoadPixelWords(src);
-    const Words five = SetWords(0xF8);
-    const Words six = SetWords(0xFC);
-    low = Narrow(ShiftLeft<3>(w.low) & five, ShiftLeft<3>(w.high) & five);
-    middle = Narrow(ShiftRightUnsigned<3>(w.low) & six, ShiftRightUnsigned<3>(w.high) & six);
-    high = Narrow(ShiftRightUnsigned<8>(w.low) & five, ShiftRightUnsigned<8>(w.high) & five);
+  const Bytes fill = SetBytes(AlphaOf(alpha));
+  uint8_t* const dsts[] = {dst};
+  const Units low = {rgb[shape.blueFirst ? 2 : 0], 1};
+  const Units middle = {rgb[1], 1};
+  const Units high = {rgb[shape.blueFirst ? 0 : 2], 1};
+  if (narrowed) {
+    return ForRun<2>(
+        dsts, n,
+        [](uint8_t* const* out, const uint8_t* inLow, const uint8_t* inMiddle,
+           const uint8_t* inHigh) {
+          const WordsPair l = Widen(LoadBytes(inLow));
+          const WordsPair m = Widen(LoadBytes(inMiddle));
+          const WordsPair h = Widen(LoadBytes(inHigh));
+          StorePixelWords(
+              out[0], {PackFields565(l.low, m.low, h.low), PackFields565(l.high, m.high, h.high)});
+        },
+        low, middle, high);
   }
-  return {shape.blueFirst ? high : low, middle, shape.blueFirst ? low : high, alpha};
+  WithPixelSize(shape, [&](auto size) {
+    constexpr int kPixel = decltype(size)::value;
+    ForRun<kPixel>(
+        dsts, n,
+        [=](uint8_t* const* out, const uint8_t* inLow, const uint8_t* inMiddle,
+            const uint8_t* inHigh) {
+          StorePixels<kPixel>(out[0], LoadBytes(inLow), LoadBytes(inMiddle), LoadBytes(inHigh),
+                              fill);
+        },
+        low, middle, high);
+  });
 }
 
 void UnpackRgb(uint8_t* const rgb[3], const uint8_t* src, const PixelFormat& format, int n) {
   const PixelShape shape(format);
   if (shape.bytes == 0) return scalar::UnpackRgb(rgb, src, format, n);
-  uint8_t* const dsts[] = {rgb[0], rgb[1], rgb[2]};
-  ForRun<1>(
+  uint8_t* const dsts[] = {rgb[shape.blueFirst ? 2 : 0], rgb[1], rgb[shape.blueFirst ? 0 : 2]};
+  WithPixelSize(shape, [&](auto size) {
+    constexpr int kPixel = decltype(size)::value;
+    ForRun<1>(
+        dsts, n,
+        [](uint8_t* const* out, const uint8_t* in) {
+          const PixelBytes pixels = LoadPixels<kPixel>(in);
+          StoreBytes(out[0], pixels.low);
+          StoreBytes(out[1], pixels.middle);
+          StoreBytes(out[2], pixels.high);
+        },
+        Units{src, kPixel});
+  });
+}
+
+template <int kIn, int kOut, bool kExchange>
+void RepackRun(uint8_t* dst, const uint8_t* src, int n) {
+  uint8_t* const dsts[] = {dst};
+  ForRun<kOut>(
       dsts, n,
-      [&](uint8_t* const* out, const uint8_t* in) {
-        const PixelBytes pixels = LoadPixels(in, shape);
-        StoreBytes(out[0], pixels.r);
-        StoreBytes(out[1], pixels.g);
-        StoreBytes(out[2], pixels.b);
+      [](uint8_t* const* out, const uint8_t* in) {
+        const PixelBytes p = LoadPixels<kIn>(in);
+        StorePixels<kOut>(out[0], kExchange ? p.high : p.low, p.middle, kExchange ? p.low : p.high,
+                          p.alpha);
       },
-      Units{src, shape.bytes});
+      Units{src, kIn});
 }
 
 void RepackPixels(uint8_t* dst, const uint8_t* src, const PixelFormat& from, const PixelFormat& to,
@@ -300,348 +342,348 @@ void RepackPixels(uint8_t* dst, const uint8_t* src, const PixelFormat& from, con
   const PixelShape in(from);
   const PixelShape out(to);
   if (in.bytes == 0 || out.bytes == 0) return scalar::RepackPixels(dst, src, from, to, n);
-  uint8_t* const dsts[] = {dst};
-  const auto repack = [&](uint8_t* const* pixelsOut, const uint8_t* pixelsIn) {
-    const PixelBytes pixels = LoadPixels(pixelsIn, in);
-    StorePixels(pixelsOut[0], out, pixels.r, pixels.g, pixels.b, pixels.alpha);
-  };
-  const Units pixels = {src, in.bytes};
-  if (out.bytes == 4) {
-    ForRun<4>(dsts, n, repack, pixels);
-  } else if (out.bytes == 3) {
-    ForRun<3>(dsts, n, repack, pixels);
-  } else {
-    ForRun<2>(dsts, n, repack, pixels);
-  }
+  WithPixelSize(in, [&](auto inSize) {
+    WithPixelSize(out, [&](auto outSize) {
+      constexpr int kIn = decltype(inSize)::value;
+      constexpr int kOut = decltype(outSize)::value;
+      const auto repack =
+          in.blueFirst != out.blueFirst ? RepackRun<kIn, kOut, true> : RepackRun<kIn, kOut, false>;
+      repack(dst, src, n);
+    });
+  });
 }
 
 void UnpackAlpha(uint8_t* alpha, const uint8_t* src, const PixelFormat& format, int n) {
-  if (format.bytes != 4) return scalar::UnpackAlpha(alpha, src, format, n);
-  const int byte = format.alphaByte;
+  if (PixelShape(format).bytes != 4) return scalar::UnpackAlpha(alpha, src, format, n);
   uint8_t* const dsts[] = {alpha};
   ForRun<1>(
-      dsts, n,
-      [=](uint8_t* const* out, const uint8_t* in) {
-        Bytes channels[4];
-        Load4(in, channels);
-        StoreBytes(out[0], channels[byte]);
-      },
+      dsts, n, [](uint8_t* const* out, const uint8_t* in) { StoreBytes(out[0], Load4(in).alpha); },
       Units{src, 4});
 }
 
 // ---- YUV to RGB
-// floor((offset + c * gain) / 4096) of words c, modulo 65536: a sum with four fractional bits.
-class ChromaWord {
- public:
-  ChromaWord(int32_t gain, int32_t offset)
-      : high_(SetWords(gain >> 12)),
-        low_(SetWords(gain & 4095)),
-        offset_(SetWords(offset >> 12)),
-        carry_(PrepareCarry(SetWords((offset & 4095) << 4))) {}
-  // times16: 16 * c.
-  Words Of(Words c, Words times16) const {
-    const Product low = Multiply(times16, low_);
-    return c * high_ + low.high + offset_ - CarryOf(low.low, carry_);
-  }
-
- private:
-  Words high_, low_, offset_, carry_;
+// What one component of chroma adds to the channel that it alone changes, and to green.
+struct ChromaShare {
+  int32_t gain, offset;
+  int32_t greenGain, greenOffset;
+  int32_t sixBitGain, sixBitOffset, sixBitGreenGain;
 };
 
-// What chroma adds to luma, as words of pixels or of chroma samples.
+// Chroma as it is taken from memory: a for the pixel's low channel and b for its high one.
+enum class ChromaLayout { kEveryPixel, kPlanes, kPairsOfAB, kPairsOfBA };
+
 template <YuvToRgbForm kForm>
 struct ChromaTerms {
+  // For the low, middle and high channel; then what carries into the low and the high one.
   static constexpr int kCount = kForm == YuvToRgbForm::kTable ? 5 : 3;
-  // R, G, B; then what carries into R and B.
   Words term[kCount];
 };
 
 template <YuvToRgbForm kForm>
 class ColourStage {
  public:
-  explicit ColourStage(const YuvToRgbWide& s)
-      : red_(s.vToR, s.offset[0] - Base(s, 0)),
-        greenV_(s.vToG, s.offset[1]),
-        greenU_(s.uToG, 0),
-        blue_(s.uToB, s.offset[2] - Base(s, 2)),
-        greenBase_(SetWords(Base(s, 1) >> 12)),
-        lumaWhole_(SetWords(s.yGain >> 12)),
-        lumaPart_(SetWords(s.yGain << 4 & 0xFFFF)) {}
+  ColourStage(const YuvToRgbWide& s, const ChromaShare& a, const ChromaShare& b, int32_t greenBase)
+      : a_(a.gain, a.offset),
+        b_(b.gain, b.offset),
+        greenA_(a.greenGain, a.greenOffset - (kForm == YuvToRgbForm::kTable ? 0 : greenBase)),
+        greenB_(b.greenGain, b.greenOffset),
+        greenBase_(SetWords(greenBase >> 12)),
+        lumaWhole_(s.yGain >> 12),
+        lumaPart_(s.yGain << 4 & 0xFFFF),
+        sixA_(a.sixBitGain),
+        sixB_(b.sixBitGain),
+        sixGreenA_(a.sixBitGreenGain),
+        sixGreenB_(b.sixBitGreenGain),
+        sixOffsetA_(SetWords(a.sixBitOffset)),
+        sixOffsetB_(SetWords(b.sixBitOffset)) {}
 
-  ChromaTerms<kForm> Terms(Words u, Words v) const {
+  ChromaTerms<kForm> Terms(Words a, Words b) const {
     if constexpr (kForm == YuvToRgbForm::kSixBits) {
-      return {{ShiftRight<6>(v * SetWords(90) - SetWords(11485)),
-               ShiftRight<6>(SetWords(8669) - v * SetWords(46) - u * SetWords(22)),
-               ShiftRight<6>(u * SetWords(113) - SetWords(14516))}};
+      const Words green =
+          MultiplySubtract(MultiplySubtract(SetWords(8669), a, sixGreenA_), b, sixGreenB_);
+      return {{ShiftRight<6>(MultiplyAdd(sixOffsetA_, a, sixA_)), ShiftRight<6>(green),
+               ShiftRight<6>(MultiplyAdd(sixOffsetB_, b, sixB_))}};
     } else {
-      const Words u16 = ShiftLeft<4>(u);
-      const Words v16 = ShiftLeft<4>(v);
-      const Words red = red_.Of(v, v16);
-      const Words blue = blue_.Of(u, u16);
-      const Words greenV = greenV_.Of(v, v16);
-      const Words greenU = greenU_.Of(u, u16);
-      const Words green = greenU + greenV - greenBase_;
+      const ChromaFactor factorA(a);
+      const ChromaFactor factorB(b);
+      const Words greenA = greenA_.Sixteenths(factorA);
+      const Words greenB = greenB_.Sixteenths(factorB);
+      const Words green = greenA + greenB;
       if constexpr (kForm == YuvToRgbForm::kWholeLuma) {
-        return {{ShiftRight<4>(red), ShiftRight<4>(green), ShiftRight<4>(blue)}};
+        return {{a_.Whole(factorA), ShiftRight<4>(green), b_.Whole(factorB)}};
       } else {
-        // The low halves of the words of V and U are what G takes of them.
-        return {{red, green, blue, PrepareCarry(greenV), PrepareCarry(greenU)}};
+        // What green takes of a component is the low half of that component's word in the tables.
+        return {{a_.Sixteenths(factorA), green - greenBase_, b_.Sixteenths(factorB),
+                 PrepareCarry(greenA), PrepareCarry(greenB)}};
       }
     }
   }
 
-  struct Rgb {
-    Words channel[3];
+  struct Channels {
+    Words low, middle, high;
   };
-  Rgb Add(Words y, const ChromaTerms<kForm>& terms) const {
-    const Words* t = terms.term;
+  // With four fractional bits in the table form.
+  Channels Add(Words y, const Words* t) const {
     if constexpr (kForm == YuvToRgbForm::kTable) {
       const Product part = Multiply(y, lumaPart_);
-      const Words luma = y * lumaWhole_ + part.high;
-      return {{ShiftRight<4>(luma + t[0] - CarryOf(part.low, t[3])), ShiftRight<4>(luma + t[1]),
-               ShiftRight<4>(luma + t[2] - CarryOf(part.low, t[4]))}};
+      const Words luma = MultiplyAdd(part.high, y, lumaWhole_);
+      return {luma + t[0] - CarryOf(part.low, t[3]), luma + t[1],
+              luma + t[2] - CarryOf(part.low, t[4])};
     } else {
-      return {{y + t[0], y + t[1], y + t[2]}};
+      return {y + t[0], y + t[1], y + t[2]};
     }
+  }
+  static Bytes Clamp(Words low, Words high) {
+    return kForm == YuvToRgbForm::kTable ? NarrowShifted<4>(low, high) : Narrow(low, high);
   }
 
  private:
-  // Where value 0 of a channel lies in the clamp table, as part of its offset.
-  static int32_t Base(const YuvToRgbWide& s, int c) { return s.base[c] << (s.narrowing[c] + 16); }
-
-  ChromaWord red_, greenV_, greenU_, blue_;
-  Words greenBase_, lumaWhole_, lumaPart_;
+  ChromaWord a_, b_, greenA_, greenB_;
+  Words greenBase_;
+  Factor lumaWhole_, lumaPart_;
+  Factor sixA_, sixB_, sixGreenA_, sixGreenB_;
+  Words sixOffsetA_, sixOffsetB_;
 };
 
-template <YuvToRgbForm kForm, bool kHalf>
-class PixelConverter {
- public:
-  PixelConverter(const ChromaRows& chroma, const YuvToRgb& colour, const PixelShape& shape,
-                 uint8_t alpha)
-      : stage_(colour.wide),
-        shape_(shape),
-        alpha_(SetBytes(alpha)),
-        unit_(shape.bytes),
-        step_(chroma.step),
-        uFirst_(chroma.u < chroma.v) {}
-
-  // Rows that share chroma, one or two.
-  struct Lines {
-    uint8_t* dst;
-    ptrdiff_t dstPitch;
-    const uint8_t* y;
-    ptrdiff_t yPitch;
-    const uint8_t* u;
-    const uint8_t* v;
-    int count;
-  };
-
-  void Convert(const Lines& lines, int n) const {
-    int i = 0;
-    for (; i + kBytes <= n; i += kBytes) ConvertVector(At(lines, i));
-    if (i == n) return;
-    // The last vector reaches back over pixels that are done already, unless it would tear a pair.
-    const int last = n - kBytes;
-    if (last >= 0 && (!kHalf || last % 2 == 0)) {
-      ConvertVector(At(lines, last));
-    } else {
-      ConvertRest(At(lines, i), n - i);
-    }
-  }
-
- private:
-  Lines At(const Lines& lines, int i) const {
-    const ptrdiff_t sample = ptrdiff_t{kHalf ? i / 2 : i} * step_;
-    return {lines.dst + ptrdiff_t{i} * unit_,
-            lines.dstPitch,
-            lines.y + i,
-            lines.yPitch,
-            lines.u + sample,
-            lines.v + sample,
-            lines.count};
-  }
-
-  void ConvertRest(const Lines& lines, int n) const {
-    uint8_t y[2][kBytes] = {};
-    uint8_t chroma[2][2 * kBytes] = {};
-    uint8_t pixels[2][4 * kBytes];
-    for (int row = 0; row < lines.count; ++row) {
-      memcpy(y[row], lines.y + row * lines.yPitch, size_t(n));
-    }
-    const size_t samples = size_t(kHalf ? (n + 1) / 2 : n);
-    Lines rest = {pixels[0], sizeof(pixels[0]), y[0],       sizeof(y[0]),
-                  chroma[0], chroma[1],         lines.count};
-    if (step_ == 1) {
-      memcpy(chroma[0], lines.u, samples);
-      memcpy(chroma[1], lines.v, samples);
-    } else {
-      memcpy(chroma, uFirst_ ? lines.u : lines.v, 2 * samples);
-      rest.u = chroma[0] + (uFirst_ ? 0 : 1);
-      rest.v = chroma[0] + (uFirst_ ? 1 : 0);
-    }
-    ConvertVector(rest);
-    for (int row = 0; row < lines.count; ++row) {
-      memcpy(lines.dst + row * lines.dstPitch, pixels[row], size_t(n) * size_t(unit_));
-    }
-  }
-
-  void ConvertVector(const Lines& lines) const {
-    ChromaTerms<kForm> low, high;
-    LoadTerms(lines.u, lines.v, &low, &high);
-    ConvertLine(lines.dst, lines.y, low, high);
-    if (lines.count == 2) {
-      ConvertLine(lines.dst + lines.dstPitch, lines.y + lines.yPitch, low, high);
-    }
-  }
-
-  void ConvertLine(uint8_t* dst, const uint8_t* y, const ChromaTerms<kForm>& low,
-                   const ChromaTerms<kForm>& high) const {
-    const WordsPair luma = Widen(LoadBytes(y));
-    const auto a = stage_.Add(luma.low, low);
-    const auto b = stage_.Add(luma.high, high);
-    StorePixels(dst, shape_, Narrow(a.channel[0], b.channel[0]), Narrow(a.channel[1], b.channel[1]),
-                Narrow(a.channel[2], b.channel[2]), alpha_);
-  }
-
-  void LoadTerms(const uint8_t* inU, const uint8_t* inV, ChromaTerms<kForm>* low,
-                 ChromaTerms<kForm>* high) const {
-    const uint8_t* const pairs = uFirst_ ? inU : inV;
-    if constexpr (kHalf) {
-      Words u, v;
-      if (step_ == 1) {
-        u = LoadHalf(inU);
-        v = LoadHalf(inV);
-      } else {
-        const Words both = LoadWords(pairs);
-        const Words first = both & SetWords(0xFF);
-        const Words second = ShiftRightUnsigned<8>(both);
-        u = uFirst_ ? first : second;
-        v = uFirst_ ? second : first;
-      }
-      const ChromaTerms<kForm> terms = stage_.Terms(u, v);
-      for (int k = 0; k < ChromaTerms<kForm>::kCount; ++k) {
-        const WordsPair twice = Double(terms.term[k]);
-        low->term[k] = twice.low;
-        high->term[k] = twice.high;
-      }
-    } else {
-      Bytes first, second;
-      if (step_ == 1) {
-        first = LoadBytes(inU);
-        second = LoadBytes(inV);
-      } else {
-        Load2(pairs, &first, &second);
-      }
-      const bool exchanged = step_ != 1 && !uFirst_;
-      const WordsPair u = Widen(exchanged ? second : first);
-      const WordsPair v = Widen(exchanged ? first : second);
-      *low = stage_.Terms(u.low, v.low);
-      *high = stage_.Terms(u.high, v.high);
-    }
-  }
-
-  const ColourStage<kForm> stage_;
-  const PixelShape shape_;
-  const Bytes alpha_;
-  const int unit_;
-  const int step_;
-  const bool uFirst_;
+// Rows of pixels with their chroma, 1 << rowShift of them to a row of it.
+struct PixelLines {
+  uint8_t* dst;
+  ptrdiff_t dstPitch;
+  const uint8_t* y;
+  ptrdiff_t yPitch;
+  const uint8_t* a;  // pairs: where they begin
+  const uint8_t* b;
+  ptrdiff_t aPitch, bPitch;
+  int rows, rowShift;
 };
 
-template <YuvToRgbForm kForm, bool kHalf>
-void ConvertRows(const PixelRows& rows, const ChromaRows& chroma, const YuvToRgb& colour,
-                 const PixelShape& shape, uint8_t alpha, int n) {
-  const PixelConverter<kForm, kHalf> converter(chroma, colour, shape, alpha);
-  const int share = 1 << chroma.rowShift;
-  for (int row = 0; row < rows.rows; row += share) {
-    const int chromaRow = row >> chroma.rowShift;
-    const int count = rows.rows - row < share ? 1 : share;
-    converter.Convert(
-        {rows.dst + row * rows.dstPitch, rows.dstPitch, rows.y + row * rows.yPitch, rows.yPitch,
-         chroma.u + chromaRow * chroma.uPitch, chroma.v + chromaRow * chroma.vPitch, count},
-        n);
+constexpr bool IsHalf(ChromaLayout layout) {
+  return layout != ChromaLayout::kEveryPixel;
+}
+constexpr bool IsPairs(ChromaLayout layout) {
+  return layout == ChromaLayout::kPairsOfAB || layout == ChromaLayout::kPairsOfBA;
+}
+
+template <YuvToRgbForm kForm, ChromaLayout kLayout>
+inline void LoadTerms(const ColourStage<kForm>& stage, const uint8_t* a, const uint8_t* b,
+                      ChromaTerms<kForm>* low, ChromaTerms<kForm>* high) {
+  if constexpr (!IsHalf(kLayout)) {
+    const WordsPair wideA = Widen(LoadBytes(a));
+    const WordsPair wideB = Widen(LoadBytes(b));
+    *low = stage.Terms(wideA.low, wideB.low);
+    *high = stage.Terms(wideA.high, wideB.high);
+    return;
+  }
+  ChromaTerms<kForm> terms;
+  if constexpr (IsPairs(kLayout)) {
+    const Words pairs = LoadWords(a);
+    const Words first = pairs & SetWords(0xFF);
+    const Words second = ShiftRightUnsigned<8>(pairs);
+    terms = kLayout == ChromaLayout::kPairsOfAB ? stage.Terms(first, second)
+                                                : stage.Terms(second, first);
+  } else {
+    terms = stage.Terms(LoadHalf(a), LoadHalf(b));
+  }
+#pragma GCC unroll 5  // or the terms would go through memory
+  for (int k = 0; k < ChromaTerms<kForm>::kCount; ++k) {
+    const WordsPair twice = Double(terms.term[k]);
+    low->term[k] = twice.low;
+    high->term[k] = twice.high;
   }
 }
 
-template <YuvToRgbForm kForm>
-void ConvertYuv(const PixelRows& rows, const ChromaRows& chroma, const YuvToRgb& colour,
-                const PixelShape& shape, uint8_t alpha, int n) {
-  if (chroma.shift != 0) {
-    ConvertRows<kForm, true>(rows, chroma, colour, shape, alpha, n);
-  } else {
-    ConvertRows<kForm, false>(rows, chroma, colour, shape, alpha, n);
+template <YuvToRgbForm kForm, int kPixel>
+inline void ConvertLine(const ColourStage<kForm>& stage, uint8_t* dst, const uint8_t* y,
+                        const ChromaTerms<kForm>& low, const ChromaTerms<kForm>& high,
+                        Bytes alpha) {
+  const WordsPair luma = Widen(LoadBytes(y));
+  const auto first = stage.Add(luma.low, low.term);
+  const auto second = stage.Add(luma.high, high.term);
+  StorePixels<kPixel>(dst, stage.Clamp(first.low, second.low),
+                      stage.Clamp(first.middle, second.middle),
+                      stage.Clamp(first.high, second.high), alpha);
+}
+
+// n pixels of each row, whole vectors of them.
+template <YuvToRgbForm kForm, ChromaLayout kLayout, int kPixel>
+void ConvertVectors(const void* colourStage, const PixelLines& lines, uint8_t alphaByte, int n) {
+  constexpr int kChroma = IsHalf(kLayout) && !IsPairs(kLayout) ? kBytes / 2 : kBytes;
+  const ColourStage<kForm> stage = *static_cast<const ColourStage<kForm>*>(colourStage);
+  const Bytes alpha = SetBytes(alphaByte);
+  const int share = 1 << lines.rowShift;
+  for (int row = 0; row < lines.rows; row += share) {
+    const ptrdiff_t chromaRow = row >> lines.rowShift;
+    const bool two = share == 2 && row + 1 < lines.rows;
+    uint8_t* dst = lines.dst + row * lines.dstPitch;
+    const uint8_t* y = lines.y + row * lines.yPitch;
+    const uint8_t* a = lines.a + chromaRow * lines.aPitch;
+    const uint8_t* b = lines.b + chromaRow * lines.bPitch;
+    for (int i = 0; i < n; i += kBytes) {
+      ChromaTerms<kForm> low, high;
+      LoadTerms<kForm, kLayout>(stage, a, b, &low, &high);
+      ConvertLine<kForm, kPixel>(stage, dst, y, low, high, alpha);
+      if (two) {
+        ConvertLine<kForm, kPixel>(stage, dst + lines.dstPitch, y + lines.yPitch, low, high, alpha);
+      }
+      dst += kBytes * kPixel;
+      y += kBytes;
+      a += kChroma;
+      b += kChroma;
+    }
   }
+}
+
+// A conversion with everything decided.
+struct PixelConversion {
+  void (*vectors)(const void* stage, const PixelLines& lines, uint8_t alpha, int n);
+  const void* stage;
+  ChromaLayout layout;
+  int pixel;  // bytes
+  uint8_t alpha;
+
+  void Convert(const PixelLines& lines, int n) const {
+    const int whole = n / kBytes * kBytes;
+    vectors(stage, lines, alpha, whole);
+    if (whole == n) return;
+    // The last vector reaches back over pixels that are done already, unless it would tear a pair.
+    const int last = n - kBytes;
+    if (last >= 0 && (!IsHalf(layout) || last % 2 == 0)) {
+      vectors(stage, At(lines, last, 0), alpha, kBytes);
+      return;
+    }
+    for (int row = 0; row < lines.rows; row += 1 << lines.rowShift) {
+      ConvertRest(At(lines, whole, row), n - whole);
+    }
+  }
+
+ private:
+  PixelLines At(const PixelLines& lines, int i, int row) const {
+    const int sample = IsHalf(layout) && !IsPairs(layout) ? i / 2 : i;
+    PixelLines at = lines;
+    at.dst += row * lines.dstPitch + ptrdiff_t{i} * pixel;
+    at.y += row * lines.yPitch + i;
+    at.a += (row >> lines.rowShift) * lines.aPitch + sample;
+    at.b += (row >> lines.rowShift) * lines.bPitch + sample;
+    at.rows -= row;
+    return at;
+  }
+
+  // The first rows of `lines`, as many as share chroma.
+  void ConvertRest(const PixelLines& lines, int n) const {
+    uint8_t y[2][kBytes] = {};
+    uint8_t a[kBytes] = {};
+    uint8_t b[kBytes] = {};
+    uint8_t pixels[2][4 * kBytes];
+    const int share = 1 << lines.rowShift;
+    const int rows = share < lines.rows ? share : lines.rows;
+    for (int row = 0; row < rows; ++row) memcpy(y[row], lines.y + row * lines.yPitch, size_t(n));
+    const int samples = IsHalf(layout) ? (n + 1) / 2 : n;
+    memcpy(a, lines.a, size_t(IsPairs(layout) ? 2 * samples : samples));
+    if (!IsPairs(layout)) memcpy(b, lines.b, size_t(samples));
+    vectors(stage, {pixels[0], 4 * kBytes, y[0], kBytes, a, b, 0, 0, rows, lines.rowShift}, alpha,
+            kBytes);
+    for (int row = 0; row < rows; ++row) {
+      memcpy(lines.dst + row * lines.dstPitch, pixels[row], size_t(n) * size_t(pixel));
+    }
+  }
+};
+
+template <YuvToRgbForm kForm, int kPixel>
+constexpr decltype(PixelConversion::vectors) kConverters[] = {
+    ConvertVectors<kForm, ChromaLayout::kEveryPixel, kPixel>,
+    ConvertVectors<kForm, ChromaLayout::kPlanes, kPixel>,
+    ConvertVectors<kForm, ChromaLayout::kPairsOfAB, kPixel>,
+    ConvertVectors<kForm, ChromaLayout::kPairsOfBA, kPixel>,
+};
+
+template <YuvToRgbForm kForm>
+void ConvertYuv(const PixelRows& rows, const ChromaRows& chroma, const YuvToRgbWide& s,
+                const PixelShape& shape, uint8_t alpha, int n) {
+  // Where value 0 of a channel lies in the clamp table, as part of its offset.
+  const auto base = [&](int c) { return s.base[c] << (s.narrowing[c] + 16); };
+  const ChromaShare ofU = {s.uToB, s.offset[2] - base(2), s.uToG, 0, 113, -14516, 22};
+  const ChromaShare ofV = {s.vToR, s.offset[0] - base(0), s.vToG, s.offset[1], 90, -11485, 46};
+  const bool aIsU = shape.blueFirst;
+  const ColourStage<kForm> stage(s, aIsU ? ofU : ofV, aIsU ? ofV : ofU, base(1));
+  const uint8_t* a = aIsU ? chroma.u : chroma.v;
+  const uint8_t* b = aIsU ? chroma.v : chroma.u;
+  const ptrdiff_t aPitch = aIsU ? chroma.uPitch : chroma.vPitch;
+  const ptrdiff_t bPitch = aIsU ? chroma.vPitch : chroma.uPitch;
+  ChromaLayout layout = ChromaLayout::kEveryPixel;
+  if (chroma.shift != 0) {
+    layout = chroma.step == 1 ? ChromaLayout::kPlanes
+             : a < b          ? ChromaLayout::kPairsOfAB
+                              : ChromaLayout::kPairsOfBA;
+  }
+  if (layout == ChromaLayout::kPairsOfBA) a = b;  // where the pairs begin
+  const auto& converters = shape.bytes == 4   ? kConverters<kForm, 4>
+                           : shape.bytes == 3 ? kConverters<kForm, 3>
+                                              : kConverters<kForm, 2>;
+  const PixelConversion conversion = {converters[int(layout)], &stage, layout, shape.bytes, alpha};
+  conversion.Convert({rows.dst, rows.dstPitch, rows.y, rows.yPitch, a, b, aPitch, bPitch, rows.rows,
+                      chroma.rowShift},
+                     n);
 }
 
 void YuvToPixels(const PixelRows& rows, const ChromaRows& chroma, const YuvToRgb& colour,
                  const PixelFormat& format, AlphaFill alpha, int n) {
   const PixelShape shape(format);
-  const uint8_t fill = AlphaOf(shape, alpha);
-  if (shape.bytes == 0) return scalar::YuvToPixels(rows, chroma, colour, format, alpha, n);
+  const uint8_t fill = AlphaOf(alpha);
+  // (Pairs for every pixel are taken apart before they come here.)
+  const bool known = shape.bytes != 0 && (chroma.shift != 0 || chroma.step == 1);
+  if (!known) return scalar::YuvToPixels(rows, chroma, colour, format, alpha, n);
   switch (colour.form) {
     case YuvToRgbForm::kTable:
-      return ConvertYuv<YuvToRgbForm::kTable>(rows, chroma, colour, shape, fill, n);
+      return ConvertYuv<YuvToRgbForm::kTable>(rows, chroma, colour.wide, shape, fill, n);
     case YuvToRgbForm::kWholeLuma:
-      return ConvertYuv<YuvToRgbForm::kWholeLuma>(rows, chroma, colour, shape, fill, n);
+      return ConvertYuv<YuvToRgbForm::kWholeLuma>(rows, chroma, colour.wide, shape, fill, n);
     case YuvToRgbForm::kSixBits:
-      return ConvertYuv<YuvToRgbForm::kSixBits>(rows, chroma, colour, shape, fill, n);
+      return ConvertYuv<YuvToRgbForm::kSixBits>(rows, chroma, colour.wide, shape, fill, n);
     default:
       return scalar::YuvToPixels(rows, chroma, colour, format, alpha, n);
   }
 }
 
 // ---- RGB to YUV, levels
-// The tables are straight lines.
-WeightedSum SumOf(RgbToYuvTables tables) {
-  int32_t weights[3];
-  int32_t offset = 0;
-  for (int c = 0; c < 3; ++c) {
-    weights[c] = tables[c][1] - tables[c][0];
-    offset += tables[c][0];
-  }
-  return WeightedSum(weights, offset);
-}
-
 void RgbToYuv(uint8_t* dst, const uint8_t* const rgb[3], RgbToYuvTables tables, int n) {
-  const WeightedSum sum = SumOf(tables);
   uint8_t* const dsts[] = {dst};
-  ForRun<1>(
-      dsts, n,
-      [&](uint8_t* const* out, const uint8_t* r, const uint8_t* g, const uint8_t* b) {
-        StoreBytes(out[0], sum.Of(LoadBytes(r), LoadBytes(g), LoadBytes(b)));
-      },
-      Units{rgb[0], 1}, Units{rgb[1], 1}, Units{rgb[2], 1});
+  WithSum(Weights(tables, false), [&](const auto& sum) {
+    ForRun<1>(
+        dsts, n,
+        [&](uint8_t* const* out, const uint8_t* r, const uint8_t* g, const uint8_t* b) {
+          StoreBytes(out[0], sum.Of(LoadBytes(r), LoadBytes(g), LoadBytes(b)));
+        },
+        Units{rgb[0], 1}, Units{rgb[1], 1}, Units{rgb[2], 1});
+  });
 }
 
 template <bool kSeconds>
 void SomePixelsToYuv(uint8_t* dst, const uint8_t* src, const PixelFormat& format,
                      RgbToYuvTables tables, int n) {
   const PixelShape shape(format);
-  const WeightedSum sum = SumOf(tables);
-  const int unit = kSeconds ? 2 * shape.bytes : shape.bytes;
   uint8_t* const dsts[] = {dst};
-  if (shape.bytes == 4) {
-    const PixelSum pixels(sum, shape.blueFirst, shape.alphaFirst);
-    ForRun<1>(
-        dsts, n,
-        [&](uint8_t* const* out, const uint8_t* in) {
-          StoreBytes(out[0], pixels.Of<kSeconds>(in));
-        },
-        Units{src, unit});
-    return;
-  }
-  ForRun<1>(
-      dsts, n,
-      [&](uint8_t* const* out, const uint8_t* in) {
-        PixelBytes pixels = LoadPixels(in, shape);
-        if (kSeconds) {
-          const PixelBytes more = LoadPixels(in + kBytes * shape.bytes, shape);
-          pixels = {Seconds(pixels.r, more.r), Seconds(pixels.g, more.g), Seconds(pixels.b, more.b),
-                    pixels.alpha};
-        }
-        StoreBytes(out[0], sum.Of(pixels.r, pixels.g, pixels.b));
-      },
-      Units{src, unit});
+  WithSum(Weights(tables, shape.blueFirst), [&](const auto& sum) {
+    WithPixelSize(shape, [&](auto size) {
+      constexpr int kPixel = decltype(size)::value;
+      ForRun<1>(
+          dsts, n,
+          [&](uint8_t* const* out, const uint8_t* in) {
+            if constexpr (kPixel == 4) {
+              StoreBytes(out[0], sum.template OfPixels<kSeconds>(in));
+            } else {
+              const PixelBytes p = LoadPixels<kPixel>(in);
+              if constexpr (kSeconds) {
+                const PixelBytes more = LoadPixels<kPixel>(in + kBytes * kPixel);
+                StoreBytes(out[0], sum.Of(Seconds(p.low, more.low), Seconds(p.middle, more.middle),
+                                          Seconds(p.high, more.high)));
+              } else {
+                StoreBytes(out[0], sum.Of(p.low, p.middle, p.high));
+              }
+            }
+          },
+          Units{src, kSeconds ? 2 * kPixel : kPixel});
+    });
+  });
 }
 
 void PixelsToYuv(uint8_t* dst, const uint8_t* src, const PixelFormat& format, RgbToYuvTables tables,
@@ -657,18 +699,18 @@ void PixelPairsToYuv(uint8_t* dst, const uint8_t* src, const PixelFormat& format
 }
 
 void MapLevels(uint8_t* dst, const uint8_t* src, const LevelMap& levels, int n) {
-  const Words whole = SetWords(levels.gain >> 16);
-  const Words part = SetWords(levels.gain & 0xFFFF);
+  const Factor whole(levels.gain >> 16);
+  const Factor part(levels.gain & 0xFFFF);
   const Words offset = SetWords(levels.offset >> 16);
   const Words carry = PrepareCarry(SetWords(levels.offset & 0xFFFF));
   const auto map = [=](Words level) {
     const Product product = Multiply(level, part);
-    return level * whole + product.high + offset - CarryOf(product.low, carry);
+    return MultiplyAdd(product.high + offset, level, whole) - CarryOf(product.low, carry);
   };
   uint8_t* const dsts[] = {dst};
   ForRun<1>(
       dsts, n,
-      [&](uint8_t* const* out, const uint8_t* in) {
+      [=](uint8_t* const* out, const uint8_t* in) {
         const WordsPair level = Widen(LoadBytes(in));
         StoreBytes(out[0], Narrow(map(level.low), map(level.high)));
       },
@@ -687,9 +729,7 @@ void ReadStrided(uint8_t* dst, const uint8_t* src, ptrdiff_t step, int n) {
     }
   } else if (step == 4) {
     for (; i + kBytes < n; i += kBytes) {
-      Bytes channels[4];
-      Load4(src + 4 * i, channels);
-      StoreBytes(dst + i, channels[0]);
+      StoreBytes(dst + i, Load4(src + 4 * i).low);
     }
   }
   scalar::ReadStrided(dst + i, src + i * step, step, n - i);

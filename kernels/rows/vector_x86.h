@@ -10,7 +10,8 @@
 
 #include <immintrin.h>
 #include <stdint.h>
-#include <string.h>
+
+#include "kernels/rows/weights.h"
 
 namespace kestrel {
 namespace {
@@ -31,6 +32,10 @@ struct Words {
 };
 struct WordsPair {
   Words low, high;
+};
+// The bytes of kBytes pixels, by their place in the pixel.
+struct PixelBytes {
+  Bytes low, middle, high, alpha;
 };
 // Products of 32 bits as two vectors of halves.
 struct Product {
@@ -179,11 +184,23 @@ template <int kBits>
 inline Words ShiftRightUnsigned(Words a) {
   return {KESTREL_SIMD(srli_epi16)(a.v, kBits)};
 }
-inline Words MultiplyHigh(Words a, Words b) {
-  return {KESTREL_SIMD(mulhi_epi16)(a.v, b.v)};
+// base + the high half of the signed product.
+inline Words AddHighProduct(Words base, Words a, Words b) {
+  return base + Words{KESTREL_SIMD(mulhi_epi16)(a.v, b.v)};
 }
-inline Product Multiply(Words a, Words b) {
-  return {{KESTREL_SIMD(mullo_epi16)(a.v, b.v)}, {KESTREL_SIMD(mulhi_epu16)(a.v, b.v)}};
+// A number that words are multiplied by.
+struct Factor {
+  explicit Factor(int value) : words(SetWords(value)) {}
+  Words words;
+};
+inline Words MultiplyAdd(Words sum, Words a, const Factor& f) {
+  return sum + a * f.words;
+}
+inline Words MultiplySubtract(Words sum, Words a, const Factor& f) {
+  return sum - a * f.words;
+}
+inline Product Multiply(Words a, const Factor& f) {
+  return {{KESTREL_SIMD(mullo_epi16)(a.v, f.words.v)}, {KESTREL_SIMD(mulhi_epu16)(a.v, f.words.v)}};
 }
 // For CarryOf: every addend is prepared once.
 inline Words PrepareCarry(Words addend) {
@@ -194,6 +211,32 @@ inline Words CarryOf(Words low, Words preparedAddend) {
   return {KESTREL_SIMD(cmpgt_epi16)((low ^ SetWords(-0x8000)).v, preparedAddend.v)};
 }
 
+// A component of chroma, prepared for several words, and a word that it is converted to:
+// offset + c * gain, in numbers of 32 bits.
+struct ChromaFactor {
+  explicit ChromaFactor(Words component) : c(component), times16(ShiftLeft<4>(component)) {}
+  Words c, times16;
+};
+class ChromaWord {
+ public:
+  ChromaWord(int32_t gain, int32_t offset)
+      : high_(gain >> 12),
+        low_(gain & 4095),
+        offset_(SetWords(offset >> 12)),
+        carry_(PrepareCarry(SetWords((offset & 4095) << 4))) {}
+  // Without its lowest 12 bits, and modulo 65536: four fractional bits are left.
+  Words Sixteenths(const ChromaFactor& chroma) const {
+    const Product low = Multiply(chroma.times16, low_);
+    return MultiplyAdd(low.high + offset_, chroma.c, high_) - CarryOf(low.low, carry_);
+  }
+  // Without its lowest 16 bits.
+  Words Whole(const ChromaFactor& chroma) const { return ShiftRight<4>(Sixteenths(chroma)); }
+
+ private:
+  Factor high_, low_;
+  Words offset_, carry_;
+};
+
 // ---- Between bytes and words
 inline WordsPair Widen(Bytes b) {
   return {{KESTREL_SIMD(unpacklo_epi8)(b.v, Zero())}, {KESTREL_SIMD(unpackhi_epi8)(b.v, Zero())}};
@@ -201,6 +244,10 @@ inline WordsPair Widen(Bytes b) {
 // Signed words clamped to bytes.
 inline Bytes Narrow(Words low, Words high) {
   return {KESTREL_SIMD(packus_epi16)(low.v, high.v)};
+}
+template <int kBits>
+inline Bytes NarrowShifted(Words low, Words high) {
+  return Narrow(ShiftRight<kBits>(low), ShiftRight<kBits>(high));
 }
 // Each word twice: words of half as many samples become words for pixels.
 inline WordsPair Double(Words w) {
@@ -229,22 +276,22 @@ inline WordsPair LoadPixelWords(const uint8_t* p) {
   return {{LoadLanes(p, 0, 2)}, {LoadLanes(p, 1, 2)}};
 }
 
-inline void Load4(const uint8_t* p, Bytes (&channels)[4]) {
+inline PixelBytes Load4(const uint8_t* p) {
   // 0 4 8 12  1 5 9 13 ...: four bytes of each channel beside each other.
   const Register order =
       Broadcast(_mm_setr_epi8(0, 4, 8, 12, 1, 5, 9, 13, 2, 6, 10, 14, 3, 7, 11, 15));
-  Register quads[4];
-  for (int i = 0; i < 4; ++i) {
-    quads[i] = KESTREL_SIMD(shuffle_epi8)(LoadLanes(p, i, 4), order);
-  }
-  const Register low01 = KESTREL_SIMD(unpacklo_epi32)(quads[0], quads[1]);
-  const Register low23 = KESTREL_SIMD(unpacklo_epi32)(quads[2], quads[3]);
-  const Register high01 = KESTREL_SIMD(unpackhi_epi32)(quads[0], quads[1]);
-  const Register high23 = KESTREL_SIMD(unpackhi_epi32)(quads[2], quads[3]);
-  channels[0] = {KESTREL_SIMD(unpacklo_epi64)(low01, low23)};
-  channels[1] = {KESTREL_SIMD(unpackhi_epi64)(low01, low23)};
-  channels[2] = {KESTREL_SIMD(unpacklo_epi64)(high01, high23)};
-  channels[3] = {KESTREL_SIMD(unpackhi_epi64)(high01, high23)};
+  const Register a = KESTREL_SIMD(shuffle_epi8)(LoadLanes(p, 0, 4), order);
+  const Register b = KESTREL_SIMD(shuffle_epi8)(LoadLanes(p, 1, 4), order);
+  const Register c = KESTREL_SIMD(shuffle_epi8)(LoadLanes(p, 2, 4), order);
+  const Register d = KESTREL_SIMD(shuffle_epi8)(LoadLanes(p, 3, 4), order);
+  const Register low01 = KESTREL_SIMD(unpacklo_epi32)(a, b);
+  const Register low23 = KESTREL_SIMD(unpacklo_epi32)(c, d);
+  const Register high01 = KESTREL_SIMD(unpackhi_epi32)(a, b);
+  const Register high23 = KESTREL_SIMD(unpackhi_epi32)(c, d);
+  return {{KESTREL_SIMD(unpacklo_epi64)(low01, low23)},
+          {KESTREL_SIMD(unpackhi_epi64)(low01, low23)},
+          {KESTREL_SIMD(unpacklo_epi64)(high01, high23)},
+          {KESTREL_SIMD(unpackhi_epi64)(high01, high23)}};
 }
 
 // Four-byte pixels in four registers, four pixels per lane.
@@ -264,23 +311,26 @@ inline void Store4(uint8_t* p, Bytes a, Bytes b, Bytes c, Bytes d) {
   for (int i = 0; i < 4; ++i) StoreLanes(p, i, 4, quads.v[i]);
 }
 
-inline void Load3(const uint8_t* p, Bytes (&channels)[3]) {
-  const Register v[3] = {LoadLanes(p, 0, 3), LoadLanes(p, 1, 3), LoadLanes(p, 2, 3)};
-  // Byte i of channel c is byte 3 * i + c of the 48.
-  for (int c = 0; c < 3; ++c) {
-    alignas(16) int8_t order[3][16];
-    for (int i = 0; i < 16; ++i) {
-      for (int part = 0; part < 3; ++part) {
-        const int from = 3 * i + c - 16 * part;
-        order[part][i] = int8_t(from >= 0 && from < 16 ? from : -1);
-      }
-    }
-    Words merged = {Zero()};
+// Byte i of the channel is byte 3 * i + c of the 48 that three registers hold.
+template <int kChannel>
+inline Bytes PickOfThree(Register a, Register b, Register c) {
+  alignas(16) int8_t order[3][16];
+  for (int i = 0; i < 16; ++i) {
     for (int part = 0; part < 3; ++part) {
-      merged = merged | Words{KESTREL_SIMD(shuffle_epi8)(v[part], Broadcast(Load16(order[part])))};
+      const int from = 3 * i + kChannel - 16 * part;
+      order[part][i] = int8_t(from >= 0 && from < 16 ? from : -1);
     }
-    channels[c] = {merged.v};
   }
+  const Words x = {KESTREL_SIMD(shuffle_epi8)(a, Broadcast(Load16(order[0])))};
+  const Words y = {KESTREL_SIMD(shuffle_epi8)(b, Broadcast(Load16(order[1])))};
+  const Words z = {KESTREL_SIMD(shuffle_epi8)(c, Broadcast(Load16(order[2])))};
+  return {(x | y | z).v};
+}
+inline PixelBytes Load3(const uint8_t* p) {
+  const Register a = LoadLanes(p, 0, 3);
+  const Register b = LoadLanes(p, 1, 3);
+  const Register c = LoadLanes(p, 2, 3);
+  return {PickOfThree<0>(a, b, c), PickOfThree<1>(a, b, c), PickOfThree<2>(a, b, c), SetBytes(0)};
 }
 inline void Store3(uint8_t* p, Bytes a, Bytes b, Bytes c) {
   const Quads quads = Interleave4(a, b, c, c);
@@ -321,18 +371,17 @@ inline Bytes SwapNeighbours(Bytes b) {
   return {(ShiftLeft<8>(w) | ShiftRightUnsigned<8>(w)).v};
 }
 
-// kWords pairs of a plan from pair i on, as words: first byte low, second byte high.
-inline Words GatherPairs(const uint8_t* src, const int32_t* windows, const uint8_t (*shuffles)[8]) {
-  __m128i eight[2];
-  for (int i = 0; i < kBytes / 16; ++i) {
-    eight[i] = _mm_unpacklo_epi64(
-        _mm_shuffle_epi8(Load16(src + windows[2 * i]), Load8(shuffles[2 * i])),
-        _mm_shuffle_epi8(Load16(src + windows[2 * i + 1]), Load8(shuffles[2 * i + 1])));
-  }
+// kWords pairs of a plan, as words: first byte low, second byte high.
+inline __m128i GatherEight(const uint8_t* src, const PairPlan::Eight& eight) {
+  return _mm_unpacklo_epi64(
+      _mm_shuffle_epi8(Load16(src + eight.window[0]), Load8(eight.shuffle[0])),
+      _mm_shuffle_epi8(Load16(src + eight.window[1]), Load8(eight.shuffle[1])));
+}
+inline Words GatherPairs(const uint8_t* src, const PairPlan::Eight* eights) {
 #ifdef __AVX2__
-  return {Join(eight[0], eight[1])};
+  return {Join(GatherEight(src, eights[0]), GatherEight(src, eights[1]))};
 #else
-  return {eight[0]};
+  return {GatherEight(src, eights[0])};
 #endif
 }
 
@@ -347,72 +396,46 @@ inline Bytes Seconds(Bytes a, Bytes b) {
 }
 
 // ---- RGB to YUV
-// (offset + r * w0 + g * w1 + b * w2) >> 16 of bytes.
+// (offset + low * w0 + middle * w1 + high * w2) >> 16 of the bytes of a pixel. 32768 fits as a
+// negative number only, and a weight of more only in two parts.
+template <Signs kSigns>
 class WeightedSum {
  public:
   WeightedSum(const int32_t (&weights)[3], int32_t offset) {
-    // 32768 fits as a negative number only, and a weight of more only in two parts.
-    negated_ = weights[0] == 32768 || weights[2] == 32768;
-    const int32_t sign = negated_ ? -1 : 1;
+    const int32_t sign = kNegated ? -1 : 1;
     const int32_t half = sign * weights[1] / 2;
-    redBlue_ = Pair(sign * weights[0], sign * weights[2]);
-    green_ = Pair(half, sign * weights[1] - half);
+    outer_ = Pair(sign * weights[0], sign * weights[2]);
+    middle_ = Pair(half, sign * weights[1] - half);
     offset_ = KESTREL_SIMD(set1_epi32)(offset);
   }
-  Bytes Of(Bytes r, Bytes g, Bytes b) const {
-    const Words low =
-        Eight(KESTREL_SIMD(unpacklo_epi8)(r.v, b.v), KESTREL_SIMD(unpacklo_epi8)(g.v, g.v));
-    const Words high =
-        Eight(KESTREL_SIMD(unpackhi_epi8)(r.v, b.v), KESTREL_SIMD(unpackhi_epi8)(g.v, g.v));
-    return Narrow(low, high);
+  Bytes Of(Bytes low, Bytes middle, Bytes high) const {
+    return Narrow(Eight(KESTREL_SIMD(unpacklo_epi8)(low.v, high.v),
+                        KESTREL_SIMD(unpacklo_epi8)(middle.v, middle.v)),
+                  Eight(KESTREL_SIMD(unpackhi_epi8)(low.v, high.v),
+                        KESTREL_SIMD(unpackhi_epi8)(middle.v, middle.v)));
   }
-  // Of words: red and blue in turn, and green twice; one sum of 32 bits for each pair.
-  Register Sums(Register redBlue, Register green) const {
-    const Register sum = KESTREL_SIMD(add_epi32)(KESTREL_SIMD(madd_epi16)(redBlue, redBlue_),
-                                                 KESTREL_SIMD(madd_epi16)(green, green_));
-    return KESTREL_SIMD(srai_epi32)(
-        negated_ ? KESTREL_SIMD(sub_epi32)(offset_, sum) : KESTREL_SIMD(add_epi32)(offset_, sum),
-        16);
-  }
-
- private:
-  static Register Pair(int32_t low, int32_t high) {
-    return KESTREL_SIMD(set1_epi32)(int32_t((uint32_t(low) & 0xFFFF) | uint32_t(high) << 16));
-  }
-  Words Eight(Register redBlue, Register green) const {
-    const WordsPair rb = Widen({redBlue});
-    const WordsPair gg = Widen({green});
-    return {KESTREL_SIMD(packs_epi32)(Sums(rb.low.v, gg.low.v), Sums(rb.high.v, gg.high.v))};
-  }
-
-  Register redBlue_, green_, offset_;
-  bool negated_;
-};
-
-// The sums of kBytes pixels of four bytes, or of the second ones of as many pairs.
-class PixelSum {
- public:
-  PixelSum(const WeightedSum& sum, bool blueFirst, bool alphaFirst) : sum_(sum) {
-    const int first = alphaFirst ? 1 : 0;
-    const int red = blueFirst ? first + 2 : first;
-    const int blue = blueFirst ? first : first + 2;
-    redBlue_ = Pick(red, blue);
-    green_ = Pick(first + 1, first + 1);
-  }
+  // The sums of kBytes pixels of four bytes, or of the second ones of as many pairs.
   template <bool kSeconds>
-  Bytes Of(const uint8_t* p) const {
+  Bytes OfPixels(const uint8_t* p) const {
+    const Register pickOuter = Pick(0, 2);
+    const Register pickMiddle = Pick(1, 1);
     Register sums[4];
     for (int i = 0; i < 4; ++i) {
       const Register pixels =
           kSeconds ? Odd(LoadLanes(p, 2 * i, 8), LoadLanes(p, 2 * i + 1, 8)) : LoadLanes(p, i, 4);
-      sums[i] = sum_.Sums(KESTREL_SIMD(shuffle_epi8)(pixels, redBlue_),
-                          KESTREL_SIMD(shuffle_epi8)(pixels, green_));
+      sums[i] = Sums(KESTREL_SIMD(shuffle_epi8)(pixels, pickOuter),
+                     KESTREL_SIMD(shuffle_epi8)(pixels, pickMiddle));
     }
     return Narrow({KESTREL_SIMD(packs_epi32)(sums[0], sums[1])},
                   {KESTREL_SIMD(packs_epi32)(sums[2], sums[3])});
   }
 
  private:
+  static constexpr bool kNegated = kSigns != Signs::kAllPositive;
+
+  static Register Pair(int32_t low, int32_t high) {
+    return KESTREL_SIMD(set1_epi32)(int32_t((uint32_t(low) & 0xFFFF) | uint32_t(high) << 16));
+  }
   // Bytes a and b of each pixel as words.
   static Register Pick(int a, int b) {
     return KESTREL_SIMD(add_epi8)(
@@ -428,10 +451,34 @@ class PixelSum {
     return _mm_castps_si128(_mm_shuffle_ps(_mm_castsi128_ps(a), _mm_castsi128_ps(b), 0xDD));
 #endif
   }
+  // Of words: the outer bytes in turn, and the middle one twice; 32 bits for each pixel.
+  Register Sums(Register outer, Register middle) const {
+    const Register sum = KESTREL_SIMD(add_epi32)(KESTREL_SIMD(madd_epi16)(outer, outer_),
+                                                 KESTREL_SIMD(madd_epi16)(middle, middle_));
+    return KESTREL_SIMD(srai_epi32)(
+        kNegated ? KESTREL_SIMD(sub_epi32)(offset_, sum) : KESTREL_SIMD(add_epi32)(offset_, sum),
+        16);
+  }
+  Words Eight(Register outer, Register middle) const {
+    const WordsPair o = Widen({outer});
+    const WordsPair m = Widen({middle});
+    return {KESTREL_SIMD(packs_epi32)(Sums(o.low.v, m.low.v), Sums(o.high.v, m.high.v))};
+  }
 
-  WeightedSum sum_;
-  Register redBlue_, green_;
+  Register outer_, middle_, offset_;
 };
+
+template <typename Call>
+void WithSum(const Weights& weights, const Call& call) {
+  switch (weights.signs()) {
+    case Signs::kAllPositive:
+      return call(WeightedSum<Signs::kAllPositive>(weights.of, weights.offset));
+    case Signs::kFirstPositive:
+      return call(WeightedSum<Signs::kFirstPositive>(weights.of, weights.offset));
+    default:
+      return call(WeightedSum<Signs::kLastPositive>(weights.of, weights.offset));
+  }
+}
 
 }  // namespace
 }  // namespace kestrel

@@ -1,4 +1,5 @@
-// Random conversions through the public interface, every byte compared with the plain model.
+// Random conversions through the public interface, every byte compared with the plain model, for
+// every instruction set that the CPU can run.
 #include <algorithm>
 #include <csignal>
 #include <cstdint>
@@ -8,17 +9,20 @@
 #include <initializer_list>
 #include <memory>
 #include <string>
+#include <vector>
 
 #include "engine/postprocess.h"
 #include "tests/differential/case.h"
 #include "tests/differential/placed.h"
 #include "tests/reference/reference.h"
 #include "tests/support/guarded_buffer.h"
+#include "tests/support/instruction_sets.h"
 
 namespace differential {
 namespace {
 
 using testing_support::GuardedBuffer;
+using testing_support::InstructionSet;
 
 constexpr size_t kCapacity = size_t{1} << 20;
 
@@ -26,15 +30,16 @@ constexpr size_t kCapacity = size_t{1} << 20;
 volatile std::sig_atomic_t crashInModel = 0;
 uint64_t currentSeed = 0;
 uint64_t currentNumber = 0;
+const char* currentRows = "";
 
 extern "C" void ReportCrash(int signalNumber) {
-  char line[160];
+  char line[200];
   const int length = std::snprintf(line, sizeof(line),
                                    "signal %d in the %s; reproduce with: differential --seed %llu "
-                                   "--first %llu --cases 1 --verbose\n",
+                                   "--first %llu --cases 1 --verbose --rows '%s'\n",
                                    signalNumber, crashInModel ? "model" : "library",
                                    static_cast<unsigned long long>(currentSeed),
-                                   static_cast<unsigned long long>(currentNumber));
+                                   static_cast<unsigned long long>(currentNumber), currentRows);
   std::fwrite(line, 1, size_t(length), stderr);
   std::signal(signalNumber, SIG_DFL);  // the faulting instruction runs again and ends the program
 }
@@ -49,8 +54,9 @@ class Bench {
     }
   }
 
-  // Empty when model and product agree, otherwise what differs.
-  std::string Run(const Case& drawn) {
+  // Empty when model and product agree with each of the sets, otherwise what differs. The last
+  // one that ran is currentRows.
+  std::string Run(const Case& drawn, const std::vector<InstructionSet>& sets) {
     Random random(drawn.seed ^ 0x5bd1e995, drawn.number);
     PlacedBlock source[3], product[3], model[3];
     for (int i = 0; i < drawn.src.blocks.count; ++i) {
@@ -88,25 +94,41 @@ class Bench {
       }
     }
 
+    refused_ += expectedCode != KESTREL_OK;
+
+    std::vector<uint8_t> before[3];
+    for (int i = 0; i < drawn.dst.blocks.count; ++i) {
+      before[i].assign(product[i].watched, product[i].watched + product[i].watchedSize);
+    }
     uint8_t* productPlanes[3];
     SetPlanes(drawn.dst, product, productPlanes, job.dstPitches);
-    bool recordsKept = false;
-    const uint32_t code = RunProduct(job, productPlanes, &recordsKept);
-    if (code != expectedCode) {
-      return "code " + std::to_string(code) + ", expected " + std::to_string(expectedCode);
+    for (const InstructionSet& set : sets) {
+      currentRows = set.name.c_str();
+      for (int i = 0; i < drawn.dst.blocks.count; ++i) {
+        std::copy(before[i].begin(), before[i].end(), product[i].watched);
+      }
+      bool recordsKept = false;
+      const uint32_t code = RunProduct(job, productPlanes, set, &recordsKept);
+      if (code != expectedCode) {
+        return "code " + std::to_string(code) + ", expected " + std::to_string(expectedCode);
+      }
+      if (!recordsKept) {
+        return "the records of the caller have changed";
+      }
+      std::string difference = Difference(drawn.dst, product, model);
+      if (!difference.empty()) {
+        return difference;
+      }
     }
-    if (!recordsKept) {
-      return "the records of the caller have changed";
-    }
-    refused_ += code != KESTREL_OK;
-    return Difference(drawn.dst, product, model);
+    return "";
   }
 
   uint64_t refused() const { return refused_; }
   uint64_t drew() const { return drew_; }
 
  private:
-  static uint32_t RunProduct(const reference::Job& job, uint8_t* const* planes, bool* recordsKept) {
+  static uint32_t RunProduct(const reference::Job& job, uint8_t* const* planes,
+                             const InstructionSet& set, bool* recordsKept) {
     MPPFORMAT dst = job.dst;
     MPPFORMAT src = job.src;
     MPPPARAM params = job.params;
@@ -115,6 +137,7 @@ class Bench {
     *recordsKept = dst.format == job.dst.format && src.format == job.src.format &&
                    std::memcmp(&params, &job.params, sizeof(params)) == 0;
     if (code == KESTREL_OK) {
+      ForceRows(handle, set);
       code = MPProcess(handle, planes, job.hasRect ? &job.rect : nullptr, job.dstPitches,
                        job.srcPlanes, job.srcPitches);
       MPPDestroy(handle);
@@ -134,12 +157,16 @@ struct Options {
   uint64_t first = 0;
   uint64_t failures = 1;
   bool verbose = false;
+  std::string rows;  // none: all of them
 };
 
 int Usage() {
   std::fprintf(stderr,
-               "usage: differential [--cases N] [--seed S] [--first K] [--failures F] [--verbose]\n"
-               "Runs the cases K..K+N-1 of seed S and stops after F failures.\n");
+               "usage: differential [--cases N] [--seed S] [--first K] [--failures F] [--verbose] "
+               "[--rows NAME]\n"
+               "Runs the cases K..K+N-1 of seed S and stops after F failures.\n"
+               "--rows: with one instruction set only, of: %s\n",
+               NamesOf(testing_support::InstructionSets()).c_str());
   return 2;
 }
 
@@ -148,6 +175,10 @@ bool ParseOptions(int argc, char** argv, Options* options) {
     const std::string name = argv[i];
     if (name == "--verbose") {
       options->verbose = true;
+      continue;
+    }
+    if (name == "--rows" && i + 1 < argc) {
+      options->rows = argv[++i];
       continue;
     }
     uint64_t* const target = name == "--cases"      ? &options->cases
@@ -171,6 +202,10 @@ int RunCases(const Options& options) {
   for (int signalNumber : {SIGSEGV, SIGBUS, SIGFPE, SIGILL, SIGABRT}) {
     std::signal(signalNumber, ReportCrash);
   }
+  const std::vector<InstructionSet> sets = testing_support::InstructionSetsNamed(options.rows);
+  if (sets.empty()) {
+    return Usage();
+  }
   Bench bench;
   uint64_t failures = 0;
   currentSeed = options.seed;
@@ -180,25 +215,27 @@ int RunCases(const Options& options) {
     if (options.verbose) {
       std::fprintf(stderr, "%s", Describe(drawn).c_str());
     }
-    const std::string difference = bench.Run(drawn);
+    const std::string difference = bench.Run(drawn, sets);
     if (!difference.empty()) {
       ++failures;
       std::printf(
-          "MISMATCH in %s  %s\n  reproduce with: differential --seed %llu --first %llu --cases 1\n",
+          "MISMATCH in %s  %s\n  reproduce with: differential --seed %llu --first %llu --cases 1 "
+          "--rows '%s'\n",
           Describe(drawn).c_str(), difference.c_str(),
           static_cast<unsigned long long>(options.seed),
-          static_cast<unsigned long long>(currentNumber));
+          static_cast<unsigned long long>(currentNumber), currentRows);
       std::fflush(stdout);  // the next case may crash
     }
   }
   if (failures != 0) {
     return 1;
   }
-  std::printf("%llu cases of seed %llu: %llu wrote pixels, %llu were refused, all bytes equal\n",
-              static_cast<unsigned long long>(options.cases),
-              static_cast<unsigned long long>(options.seed),
-              static_cast<unsigned long long>(bench.drew()),
-              static_cast<unsigned long long>(bench.refused()));
+  std::printf(
+      "%llu cases of seed %llu: %llu wrote pixels, %llu were refused, all bytes equal with "
+      "each of: %s\n",
+      static_cast<unsigned long long>(options.cases), static_cast<unsigned long long>(options.seed),
+      static_cast<unsigned long long>(bench.drew()),
+      static_cast<unsigned long long>(bench.refused()), NamesOf(sets).c_str());
   if (options.cases >= 1000 && bench.drew() < options.cases / 2) {
     std::printf("too few of the cases wrote anything: they no longer test what they should\n");
     return 1;

@@ -1,5 +1,5 @@
 // Checksums of a fixed list of conversions. The committed file was made by the plain model and must
-// hold for the library on every CPU.
+// hold for the library on every CPU, with every instruction set.
 #include <algorithm>
 #include <cstdint>
 #include <cstdio>
@@ -17,11 +17,13 @@
 #include "tests/differential/random.h"
 #include "tests/reference/reference.h"
 #include "tests/support/guarded_buffer.h"
+#include "tests/support/instruction_sets.h"
 
 namespace differential {
 namespace {
 
 using testing_support::GuardedBuffer;
+using testing_support::InstructionSet;
 
 struct NamedCode {
   const char* name;
@@ -226,6 +228,40 @@ void AddRest(List* list) {
   list->Add({"yv12", "xrgb8888"}, {33, 17}, {48, 20}, params, "inner_source");
 }
 
+// What cameras and galleries ask for most. BT.601 full range goes to kernels of its own.
+void AddFrequent(List* list) {
+  constexpr Size kSizes[][2] = {
+      {{64, 48}, {64, 48}}, {{67, 35}, {67, 35}}, {{64, 48}, {80, 60}}, {{68, 38}, {51, 29}}};
+  const auto add = [list, &kSizes](const Pair& pair, const char* what, uint32_t dither) {
+    for (const auto& size : kSizes) {
+      const bool isUnit = size[0].width == size[1].width;
+      MPPPARAM params = Params(isUnit ? MPP_NEAREST : MPP_BILINEAR, 0);
+      params.dither = dither;
+      list->Add(pair, size[0], size[1], params, what);
+      GoldenJob& job = list->Last();
+      for (MPPFORMAT* const side : {&job.src, &job.dst}) {
+        side->format |= side->format >> 28 >= 5 ? FORMAT_BT601_FULL : 0;
+      }
+    }
+  };
+  for (const char* const src : {"nv21", "i420", "nv12"}) {
+    for (const char* const dst : {"xbgr8888", "bgr888", "rgb888", "rgb565"}) {
+      add({src, dst}, "full_range", 0);
+    }
+  }
+  add({"xbgr8888", "nv21"}, "full_range", 0);
+  add({"xbgr8888", "i420"}, "full_range", 0);
+  constexpr Pair kBetweenRgb[] = {
+      {"rgb565", "xbgr8888"}, {"rgb565", "bgr888"},     {"rgb565", "bgr565"},
+      {"bgr888", "xbgr8888"}, {"bgr888", "rgb565"},     {"xbgr8888", "bgr888"},
+      {"xbgr8888", "rgb565"}, {"xbgr8888", "xrgb8888"}, {"bgr888", "rgb888"}};
+  for (const Pair& pair : kBetweenRgb) {
+    add(pair, "frequent", 0);
+  }
+  add({"i420", "rgb565"}, "full_range_dithered", 1);
+  add({"rgb888", "rgb565"}, "frequent_dithered", 1);
+}
+
 uint32_t Crc32(uint32_t crc, const uint8_t* bytes, size_t count) {
   crc = ~crc;
   for (size_t i = 0; i < count; ++i) {
@@ -296,20 +332,22 @@ class Image {
   std::vector<std::unique_ptr<GuardedBuffer>> memory_;
 };
 
-uint32_t RunProduct(const reference::Job& job) {
+uint32_t RunProduct(const reference::Job& job, const InstructionSet& set) {
   MPPFORMAT dst = job.dst;
   MPPFORMAT src = job.src;
   MPPPARAM params = job.params;
   MPPHandle* handle = nullptr;
   uint32_t code = MPPCreate(&dst, &src, &params, &handle);
   if (code == KESTREL_OK) {
+    ForceRows(handle, set);
     code = MPProcess(handle, job.dstPlanes, nullptr, job.dstPitches, job.srcPlanes, job.srcPitches);
     MPPDestroy(handle);
   }
   return code;
 }
 
-std::string LineOf(const GoldenJob& golden, bool useReference) {
+// Of the library with a set, or of the plain model for none.
+std::string LineOf(const GoldenJob& golden, const InstructionSet* set) {
   const MPPPARAM& params = golden.params;
   Image src(golden.src, params.srcOriginX + golden.src.width,
             params.srcOriginY + golden.src.height);
@@ -333,7 +371,7 @@ std::string LineOf(const GoldenJob& golden, bool useReference) {
     job.srcPlanes[i] = src.planes[i];
     job.srcPitches[i] = src.pitches[i];
   }
-  const uint32_t code = useReference ? reference::Convert(job) : RunProduct(job);
+  const uint32_t code = set ? RunProduct(job, *set) : reference::Convert(job);
   char sum[40];
   if (code == KESTREL_OK) {
     std::snprintf(sum, sizeof(sum), " %08x\n", dst.Checksum());
@@ -362,18 +400,29 @@ bool SameLines(const std::string& got, const std::string& expected) {
   }
 }
 
+std::string LinesOf(const List& list, const InstructionSet* set) {
+  std::string lines;
+  for (const GoldenJob& job : list.jobs()) {
+    lines += LineOf(job, set);
+  }
+  return lines;
+}
+
 int Usage() {
   std::fprintf(stderr,
-               "usage: golden [--reference] [--file PATH [--update]]\n"
+               "usage: golden [--rows NAME | --reference] [--file PATH]\n"
+               "       golden --reference --file PATH --update\n"
                "Prints `name crc32` of every conversion, or compares them with a file, or rewrites "
-               "it.\n--reference: the plain model instead of the library.\n");
+               "it.\n--reference: the plain model instead of the library.\n"
+               "--rows: with one instruction set only, of: %s\n",
+               NamesOf(testing_support::InstructionSets()).c_str());
   return 2;
 }
 
 int Main(int argc, char** argv) {
   bool update = false;
   bool useReference = false;
-  std::string path;
+  std::string path, rows;
   for (int i = 1; i < argc; ++i) {
     const std::string argument = argv[i];
     if (argument == "--update") {
@@ -382,11 +431,15 @@ int Main(int argc, char** argv) {
       useReference = true;
     } else if (argument == "--file" && i + 1 < argc) {
       path = argv[++i];
+    } else if (argument == "--rows" && i + 1 < argc) {
+      rows = argv[++i];
     } else {
       return Usage();
     }
   }
-  if (update && path.empty()) {
+  const std::vector<InstructionSet> sets = testing_support::InstructionSetsNamed(rows);
+  if (sets.empty() || (useReference && !rows.empty()) ||
+      (update && (path.empty() || !useReference))) {
     return Usage();
   }
   List list;
@@ -395,28 +448,35 @@ int Main(int argc, char** argv) {
   AddScales(&list);
   AddColour(&list);
   AddRest(&list);
-  std::string lines;
-  for (const GoldenJob& job : list.jobs()) {
-    lines += LineOf(job, useReference);
-  }
+  AddFrequent(&list);
   if (path.empty()) {
-    std::fputs(lines.c_str(), stdout);
+    std::fputs(LinesOf(list, useReference ? nullptr : &sets[0]).c_str(), stdout);
     return 0;
   }
   if (update) {
     std::ofstream file(path, std::ios::binary);
-    file << lines;
+    file << LinesOf(list, nullptr);
     return file.flush() ? 0 : 1;
   }
   std::ifstream file(path, std::ios::binary);
   const std::string expected((std::istreambuf_iterator<char>(file)),
                              std::istreambuf_iterator<char>());
-  if (expected.empty() || !SameLines(lines, expected)) {
-    std::printf("the checksums differ from %s\n", path.c_str());
-    return 1;
+  const auto agree = [&](const InstructionSet* set, const char* name) {
+    if (expected.empty() || !SameLines(LinesOf(list, set), expected)) {
+      std::printf("the checksums of %s differ from %s\n", name, path.c_str());
+      return false;
+    }
+    std::printf("%zu checksums of %s agree\n", list.jobs().size(), name);
+    return true;
+  };
+  if (useReference) {
+    return agree(nullptr, "the plain model") ? 0 : 1;
   }
-  std::printf("%zu checksums agree\n", list.jobs().size());
-  return 0;
+  bool allAgree = true;
+  for (const InstructionSet& set : sets) {
+    allAgree = agree(&set, set.name.c_str()) && allAgree;
+  }
+  return allAgree ? 0 : 1;
 }
 
 }  // namespace

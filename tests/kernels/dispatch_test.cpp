@@ -8,6 +8,7 @@
 #include "tests/kernels/kernel_case.h"
 #include "tests/kernels/observer.h"
 #include "tests/reference/chooser.h"
+#include "tests/support/instruction_sets.h"
 
 namespace kernel_tests {
 namespace {
@@ -119,6 +120,8 @@ TEST_P(EveryDispatcher, ChoosesAsTheModelDoes) {
     }
     const EngineHandle handle = CreateEngine(drawn.dst.record, drawn.src.record, drawn.params);
     ASSERT_NE(handle, nullptr);
+    const auto& sets = testing_support::InstructionSets();
+    ForceRows(handle.get(), sets[size_t(i) % sets.size()]);
     DrawBand(&random, model, &drawn);
     if (!bench.Prepare(drawn, model)) {
       continue;

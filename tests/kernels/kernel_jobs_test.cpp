@@ -1,9 +1,11 @@
 // Every kernel of the table through its exported entry: what it accepts equals the model on every
-// byte, what it refuses is refused before anything is written.
+// byte, what it refuses is refused before anything is written. The instruction sets that the CPU
+// can run take turns.
 #include <gtest/gtest.h>
 
 #include "tests/kernels/kernel_case.h"
 #include "tests/reference/chooser.h"
+#include "tests/support/instruction_sets.h"
 
 namespace kernel_tests {
 namespace {
@@ -17,6 +19,14 @@ constexpr uint32_t kRgb = kestrel::kRgb16 | kestrel::kRgb24 | kestrel::kRgb32;
 
 // Engines are cheap, but a kernel whose engines are never met is not tested.
 constexpr int kMostDraws = 2000 * kJobs;
+
+// Gives the engine of a job the instruction set whose turn it is, and says which.
+std::string TakeTurn(MPPHandle* handle, int job) {
+  const auto& sets = testing_support::InstructionSets();
+  const auto& set = sets[size_t(job) % sets.size()];
+  ForceRows(handle, set);
+  return set.name + ": ";
+}
 
 class EveryKernel : public testing::TestWithParam<int> {
  protected:
@@ -64,11 +74,11 @@ TEST_P(EveryKernel, GivesTheBytesOfTheModel) {
     if (!bench.Prepare(drawn, model)) {
       continue;
     }
-    ++jobs;
-    ASSERT_EQ(bench.Call(entry(), handle->pass[0]->context), KESTREL_OK) << bench.Describe();
+    const std::string set = TakeTurn(handle.get(), jobs++);
+    ASSERT_EQ(bench.Call(entry(), handle->pass[0]->context), KESTREL_OK) << set << bench.Describe();
     drew += bench.Difference().empty() ? 0 : 1;
     bench.CallModel(quirks);
-    ASSERT_EQ(bench.Difference(), "") << bench.Describe();
+    ASSERT_EQ(bench.Difference(), "") << set << bench.Describe();
   }
   EXPECT_GT(drew, kJobs / 2);
 }
@@ -92,7 +102,7 @@ TEST_P(EveryKernel, RefusesBeforeWriting) {
     if (!bench.Prepare(drawn, model)) {
       continue;
     }
-    ++refusals;
+    TakeTurn(handle.get(), refusals++);
     ASSERT_EQ(bench.Call(entry(), handle->pass[0]->context), KESTREL_UNSUPPORTED)
         << bench.Describe();
     ASSERT_EQ(bench.Difference(), "") << "written although refused: " << bench.Describe();

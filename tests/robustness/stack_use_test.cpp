@@ -8,11 +8,13 @@
 #include <cstring>
 #include <functional>
 #include <memory>
+#include <string>
 #include <vector>
 
 #include "engine/postprocess.h"
 #include "jni/bitmap_buffers.h"
 #include "tests/robustness/test_image.h"
+#include "tests/support/instruction_sets.h"
 
 namespace robustness {
 namespace {
@@ -71,51 +73,101 @@ TEST(StackUse, TheMeasureWorks) {
   EXPECT_LT(some, 48000u);
 }
 
-TEST(StackUse, EveryPairOfFormats) {
-  // Wider than any strip, a little enlarged, so that filtered rows are kept as well.
-  constexpr int32_t kWidth = 1300;
-  constexpr int32_t kHeight = 14;
-  constexpr int32_t kSrcWidth = 1100;
-  constexpr int32_t kSrcHeight = 12;
-  static const std::vector<uint8_t> palette(1024, 3);
+// Jobs that kernels are made for and others. Wider than any strip; the enlarged ones keep filtered
+// rows as well.
+struct Kind {
+  int32_t srcWidth;
+  int32_t srcHeight;
+  uint32_t transform;
+  uint32_t resample;
+  uint32_t dither;
+  int32_t contrast;
+  uint32_t standard;
+};
+constexpr int32_t kWidth = 1300;
+constexpr int32_t kHeight = 14;
+constexpr Kind kKinds[] = {{1100, 12, 0, MPP_BILINEAR, 1, 40, FORMAT_BT601_VIDEO},
+                           {1100, 12, 3, MPP_BILINEAR, 1, 40, FORMAT_BT601_VIDEO},
+                           {1100, 12, 6, MPP_BILINEAR, 1, 40, FORMAT_BT601_VIDEO},
+                           {1100, 12, 0, MPP_BILINEAR, 0, 0, FORMAT_BT601_FULL},
+                           {1100, 12, 5, MPP_BILINEAR, 0, 0, FORMAT_BT601_FULL},
+                           {kWidth, kHeight, 0, MPP_NEAREST, 0, 0, FORMAT_BT601_FULL},
+                           {kWidth, kHeight, 3, MPP_NEAREST, 0, 0, FORMAT_BT601_FULL}};
+
+uint32_t WithStandard(uint32_t code, uint32_t standard) {
+  return code >> 28 >= 5 ? code | standard : code;
+}
+
+// A job of one kind with its images.
+class Job {
+ public:
+  Job(const Kind& kind, uint32_t dstCode, uint32_t srcCode) {
+    static const std::vector<uint8_t> palette(1024, 3);
+    const bool swaps = (kind.transform & MPP_SWAP_XY) != 0;
+    dst_ = {WithStandard(dstCode, kind.standard), swaps ? kHeight : kWidth,
+            swaps ? kWidth : kHeight, nullptr};
+    src_ = {WithStandard(srcCode, kind.standard), kind.srcWidth, kind.srcHeight, palette.data()};
+    params_.resampleFlags = kind.resample;
+    params_.transformCode = kind.transform;
+    params_.bandSelector = 4;
+    params_.passMode = MPP_PASS_TILED;
+    params_.dither = kind.dither;
+    params_.contrast = kind.contrast;
+    to_ = Image(dst_);
+    from_ = Image(src_);
+  }
+
+  // Creates an engine, forces a set upon it and uses it.
+  void Run(const testing_support::InstructionSet& set) {
+    MPPHandle* handle = nullptr;
+    if (MPPCreate(&dst_, &src_, &params_, &handle) != KESTREL_OK) return;
+    ForceRows(handle, set);
+    MPProcess(handle, to_->planes(), nullptr, to_->pitches(), from_->constPlanes(),
+              from_->pitches());
+    MPPDestroy(handle);
+  }
+
+ private:
+  static std::unique_ptr<TestImage> Image(const MPPFORMAT& format) {
+    ImageShape shape;
+    EXPECT_TRUE(ShapeOf(format.format, &shape));
+    return std::make_unique<TestImage>(shape, format.width, format.height, nullptr, true);
+  }
+
+  MPPFORMAT dst_, src_;
+  MPPPARAM params_{};
+  std::unique_ptr<TestImage> to_, from_;
+};
+
+class StackUseOf : public testing::TestWithParam<testing_support::InstructionSet> {};
+
+TEST_P(StackUseOf, EveryPairOfFormats) {
+  Job(kKinds[0], FORMAT_NV21, FORMAT_RGB565).Run(GetParam());  // binds the library's imports
   size_t worst = 0;
   for (const uint32_t dstCode : kListedCodes) {
     for (const uint32_t srcCode : kListedCodes) {
-      ImageShape dstShape;
-      ImageShape srcShape;
-      ASSERT_TRUE(ShapeOf(dstCode, &dstShape));
-      ASSERT_TRUE(ShapeOf(srcCode, &srcShape));
-      for (const uint32_t transform : {0u, 3u, 6u}) {
-        const bool swaps = (transform & MPP_SWAP_XY) != 0;
-        MPPFORMAT dst = {dstCode, swaps ? kHeight : kWidth, swaps ? kWidth : kHeight, nullptr};
-        MPPFORMAT src = {srcCode, kSrcWidth, kSrcHeight, palette.data()};
-        MPPPARAM params = {};
-        params.resampleFlags = MPP_BILINEAR;
-        params.transformCode = transform;
-        params.bandSelector = 4;
-        params.passMode = MPP_PASS_TILED;
-        params.dither = 1;
-        params.contrast = 40;
-        TestImage to(dstShape, dst.width, dst.height, nullptr, true);
-        TestImage from(srcShape, kSrcWidth, kSrcHeight, nullptr, true);
-        const auto job = [&] {
-          MPPHandle* handle = nullptr;
-          if (MPPCreate(&dst, &src, &params, &handle) != KESTREL_OK) return;
-          MPProcess(handle, to.planes(), nullptr, to.pitches(), from.constPlanes(), from.pitches());
-          MPPDestroy(handle);
-        };
-        if (worst == 0) job();  // the first call also binds the library's imports
-        const size_t used = StackUse(job);
-        ASSERT_LT(used, kLimit) << std::hex << dstCode << " from " << srcCode << " transform "
-                                << transform;
-        worst = std::max(worst, used);
+      std::vector<Job> jobs;
+      for (const Kind& kind : kKinds) {
+        jobs.emplace_back(kind, dstCode, srcCode);
       }
+      const size_t used = StackUse([&jobs] {
+        for (Job& job : jobs) job.Run(GetParam());
+      });
+      ASSERT_LT(used, kLimit) << std::hex << dstCode << " from " << srcCode;
+      worst = std::max(worst, used);
     }
   }
   EXPECT_GT(worst, 100u);
   RecordProperty("deepest_stack_bytes", static_cast<int>(worst));
   printf("deepest stack: %zu bytes\n", worst);
 }
+
+INSTANTIATE_TEST_SUITE_P(Rows, StackUseOf, testing::ValuesIn(testing_support::InstructionSets()),
+                         [](const auto& test) {
+                           std::string name = test.param.name;
+                           std::replace(name.begin(), name.end(), '.', '_');
+                           return name;
+                         });
 
 TEST(StackUse, OneShot) {
   MBITMAP src = {FORMAT_XBGR8888, 640, 480, {}, {}};
