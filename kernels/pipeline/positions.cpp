@@ -56,6 +56,14 @@ RowPositions::RowPositions(const Job& job)
       readableLast_(job.engine.srcReadBottom - 1),
       top_(job.rect.top),
       bilinear_(BlendsNeighbours(job)),
-      sharedLowerLine_(job.has(kSharedLowerLine)) {}
+      sharedLowerLine_(job.has(kSharedLowerLine)),
+      plainFrom_(srcTop_ > 0 ? srcTop_ : 0) {
+  for (int shift = 0; shift < 2; ++shift) {
+    // Rows whose sample, and whose successor's, are above the last one and readable.
+    const int64_t last = (int64_t(srcBottom_) - 1) >> shift;
+    const int64_t readable = readableLast_ >> shift;
+    plainTo_[shift] = (last < readable ? last : readable) * 65536 << shift;
+  }
+}
 
 }  // namespace kestrel

@@ -43,6 +43,8 @@ class RowPositions {
   int32_t readableLast_;
   int32_t top_;
   bool bilinear_, sharedLowerLine_;
+  // Positions in [plainFrom_, plainTo_[factor - 1]) need no clamping; for factors 1 and 2.
+  int64_t plainFrom_, plainTo_[2];
 
   Taps Own(int32_t r, uint32_t factor) const;
 };
@@ -75,6 +77,12 @@ inline Taps ColumnPositions::At(int32_t x) const {
 
 inline Taps RowPositions::Own(int32_t r, uint32_t factor) const {
   const int64_t position = start_ + step_ * r;
+  if (factor <= 2 && position >= plainFrom_ && position < plainTo_[factor - 1]) {
+    const int32_t plain = int32_t(position >> 16);
+    const int shift = int(factor) - 1;
+    return {plain >> shift, (plain + 1) >> shift,
+            uint16_t(bilinear_ ? uint32_t(position) & 0xFFFF : 0)};
+  }
   int64_t row = srcTop_;
   uint16_t weight = 0;
   // A 16.16 position against a whole row: this catches what lies above row 0 and nothing else, and

@@ -3,6 +3,8 @@
 
 #include <string.h>
 
+#include "kernels/rows/transpose.h"
+
 static_assert(__BYTE_ORDER__ == __ORDER_LITTLE_ENDIAN__, "packed pixels are stored as words");
 
 namespace kestrel {
@@ -466,16 +468,6 @@ void SwapPairs(uint8_t* dst, const uint8_t* src, int n) {
   }
 }
 
-template <int kBytes>
-void TransposeUnits(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch,
-                    int rows, int columns) {
-  for (int i = 0; i < columns; ++i) {
-    uint8_t* const out = dst + i * dstPitch;
-    const uint8_t* const in = src + i * kBytes;
-    for (int j = 0; j < rows; ++j) memcpy(out + j * kBytes, in + j * srcPitch, kBytes);
-  }
-}
-
 // Vectors of 16 bytes as lanes of one unit each. Pairs: the low (high) halves of two, interleaved.
 using Lanes1 = uint8_t __attribute__((vector_size(16)));
 using Lanes2 = uint16_t __attribute__((vector_size(16)));
@@ -547,6 +539,8 @@ inline __attribute__((always_inline)) void LoadPaired(Lanes (&rows)[kRows], cons
 template <typename Lanes, int kUnit>
 struct TransposedSquare {
   static constexpr int kSide = 16 / kUnit;
+  static constexpr int kRows = kSide;
+  static constexpr int kColumns = kSide;
 
   static void Write(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch) {
     Lanes rows[kSide];
@@ -558,7 +552,8 @@ struct TransposedSquare {
 // Sixteen rows do not fit the registers: two halves of eight, joined column by column.
 template <>
 struct TransposedSquare<Lanes1, 1> {
-  static constexpr int kSide = 16;
+  static constexpr int kRows = 16;
+  static constexpr int kColumns = 16;
 
   static void Write(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch) {
     Lanes1 upper[8], lower[8];
@@ -571,46 +566,20 @@ struct TransposedSquare<Lanes1, 1> {
   }
 };
 
-// In blocks whose columns fill a cache line of the destination each; the line after it is asked for
-// early, because stores to lines that are far away are what this waits for. The last squares reach
-// back over their neighbours, which gives the same bytes again.
-template <typename Lanes, int kUnit>
-void TransposeSquares(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch,
-                      int rows, int columns) {
-  using Square = TransposedSquare<Lanes, kUnit>;
-  constexpr int kLine = 64 / kUnit;
-  const int lastRow = rows - Square::kSide;
-  const int lastColumn = columns - Square::kSide;
-  if (lastRow < 0 || lastColumn < 0) {
-    return TransposeUnits<kUnit>(dst, dstPitch, src, srcPitch, rows, columns);
-  }
-  for (int top = 0; top < rows; top += kLine) {
-    const int bottom = top + kLine < rows ? top + kLine : rows;
-    for (int i = 0; i < columns; i += Square::kSide) {
-      const int column = i < lastColumn ? i : lastColumn;
-      uint8_t* const out = dst + column * dstPitch;
-      for (int k = 0; k < Square::kSide; ++k) {
-        __builtin_prefetch(out + k * dstPitch + bottom * kUnit, 1);
-      }
-      for (int j = top; j < bottom; j += Square::kSide) {
-        const int row = j < lastRow ? j : lastRow;
-        Square::Write(out + row * kUnit, dstPitch, src + row * srcPitch + column * kUnit, srcPitch);
-      }
-    }
-  }
-}
-
 void Transpose(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch, int unit,
                int rows, int columns) {
   switch (unit) {
     case 1:
-      return TransposeSquares<Lanes1, 1>(dst, dstPitch, src, srcPitch, rows, columns);
+      return TransposeBy<TransposedSquare<Lanes1, 1>, 1>(dst, dstPitch, src, srcPitch, rows,
+                                                         columns);
     case 2:
-      return TransposeSquares<Lanes2, 2>(dst, dstPitch, src, srcPitch, rows, columns);
+      return TransposeBy<TransposedSquare<Lanes2, 2>, 2>(dst, dstPitch, src, srcPitch, rows,
+                                                         columns);
     case 3:
       return TransposeUnits<3>(dst, dstPitch, src, srcPitch, rows, columns);
     default:
-      return TransposeSquares<Lanes4, 4>(dst, dstPitch, src, srcPitch, rows, columns);
+      return TransposeBy<TransposedSquare<Lanes4, 4>, 4>(dst, dstPitch, src, srcPitch, rows,
+                                                         columns);
   }
 }
 

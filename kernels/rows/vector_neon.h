@@ -6,6 +6,8 @@
 #include <arm_neon.h>
 #include <stdint.h>
 
+#include "kernels/rows/rows_scalar.h"
+#include "kernels/rows/transpose.h"
 #include "kernels/rows/weights.h"
 
 namespace kestrel {
@@ -342,6 +344,133 @@ void WithSum(const Weights& weights, const Call& call) {
       return WithSumOf<Signs::kFirstPositive>(weights, parts, call);
     default:
       return WithSumOf<Signs::kLastPositive>(weights, parts, call);
+  }
+}
+
+// ---- Transposition
+// Exchanges neighbouring units of two rows: the step that turns squares of 2 x 2.
+inline void Turn8(uint8x16_t* a, uint8x16_t* b) {
+  const uint8x16x2_t turned = vtrnq_u8(*a, *b);
+  *a = turned.val[0];
+  *b = turned.val[1];
+}
+inline void Turn16(uint8x16_t* a, uint8x16_t* b) {
+  const uint16x8x2_t turned = vtrnq_u16(vreinterpretq_u16_u8(*a), vreinterpretq_u16_u8(*b));
+  *a = vreinterpretq_u8_u16(turned.val[0]);
+  *b = vreinterpretq_u8_u16(turned.val[1]);
+}
+inline void Turn32(uint8x16_t* a, uint8x16_t* b) {
+  const uint32x4x2_t turned = vtrnq_u32(vreinterpretq_u32_u8(*a), vreinterpretq_u32_u8(*b));
+  *a = vreinterpretq_u8_u32(turned.val[0]);
+  *b = vreinterpretq_u8_u32(turned.val[1]);
+}
+
+struct Rows8 {
+  uint8x16_t r0, r1, r2, r3, r4, r5, r6, r7;
+
+  Rows8(const uint8_t* p, ptrdiff_t pitch)
+      : r0(vld1q_u8(p)),
+        r1(vld1q_u8(p + pitch)),
+        r2(vld1q_u8(p + 2 * pitch)),
+        r3(vld1q_u8(p + 3 * pitch)),
+        r4(vld1q_u8(p + 4 * pitch)),
+        r5(vld1q_u8(p + 5 * pitch)),
+        r6(vld1q_u8(p + 6 * pitch)),
+        r7(vld1q_u8(p + 7 * pitch)) {}
+};
+
+// Eight rows of 16 bytes.
+struct Block8 {
+  static constexpr int kRows = 8;
+  static constexpr int kColumns = 16;
+  static void Write(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch) {
+    Rows8 r(src, srcPitch);
+    Turn8(&r.r0, &r.r1);
+    Turn8(&r.r2, &r.r3);
+    Turn8(&r.r4, &r.r5);
+    Turn8(&r.r6, &r.r7);
+    Turn16(&r.r0, &r.r2);
+    Turn16(&r.r1, &r.r3);
+    Turn16(&r.r4, &r.r6);
+    Turn16(&r.r5, &r.r7);
+    Turn32(&r.r0, &r.r4);
+    Turn32(&r.r1, &r.r5);
+    Turn32(&r.r2, &r.r6);
+    Turn32(&r.r3, &r.r7);
+    const uint8x16_t columns[8] = {r.r0, r.r1, r.r2, r.r3, r.r4, r.r5, r.r6, r.r7};
+    for (const uint8x16_t& column : columns) {
+      vst1_u8(dst, vget_low_u8(column));
+      vst1_u8(dst + 8 * dstPitch, vget_high_u8(column));
+      dst += dstPitch;
+    }
+  }
+};
+
+// Stores a column's first half of one register and second half of another.
+inline void StoreHalves(uint8_t* dst, uint8x8_t first, uint8x8_t second) {
+  vst1q_u8(dst, vcombine_u8(first, second));
+}
+
+// Eight rows of eight pairs.
+struct Block16 {
+  static constexpr int kRows = 8;
+  static constexpr int kColumns = 8;
+  static void Write(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch) {
+    Rows8 r(src, srcPitch);
+    Turn16(&r.r0, &r.r1);
+    Turn16(&r.r2, &r.r3);
+    Turn16(&r.r4, &r.r5);
+    Turn16(&r.r6, &r.r7);
+    Turn32(&r.r0, &r.r2);
+    Turn32(&r.r1, &r.r3);
+    Turn32(&r.r4, &r.r6);
+    Turn32(&r.r5, &r.r7);
+    StoreHalves(dst, vget_low_u8(r.r0), vget_low_u8(r.r4));
+    StoreHalves(dst + dstPitch, vget_low_u8(r.r1), vget_low_u8(r.r5));
+    StoreHalves(dst + 2 * dstPitch, vget_low_u8(r.r2), vget_low_u8(r.r6));
+    StoreHalves(dst + 3 * dstPitch, vget_low_u8(r.r3), vget_low_u8(r.r7));
+    StoreHalves(dst + 4 * dstPitch, vget_high_u8(r.r0), vget_high_u8(r.r4));
+    StoreHalves(dst + 5 * dstPitch, vget_high_u8(r.r1), vget_high_u8(r.r5));
+    StoreHalves(dst + 6 * dstPitch, vget_high_u8(r.r2), vget_high_u8(r.r6));
+    StoreHalves(dst + 7 * dstPitch, vget_high_u8(r.r3), vget_high_u8(r.r7));
+  }
+};
+
+// Eight rows of four words.
+struct Block32 {
+  static constexpr int kRows = 8;
+  static constexpr int kColumns = 4;
+  static void Write(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch) {
+    Rows8 r(src, srcPitch);
+    Turn32(&r.r0, &r.r1);
+    Turn32(&r.r2, &r.r3);
+    Turn32(&r.r4, &r.r5);
+    Turn32(&r.r6, &r.r7);
+    StoreHalves(dst, vget_low_u8(r.r0), vget_low_u8(r.r2));
+    StoreHalves(dst + 16, vget_low_u8(r.r4), vget_low_u8(r.r6));
+    dst += dstPitch;
+    StoreHalves(dst, vget_low_u8(r.r1), vget_low_u8(r.r3));
+    StoreHalves(dst + 16, vget_low_u8(r.r5), vget_low_u8(r.r7));
+    dst += dstPitch;
+    StoreHalves(dst, vget_high_u8(r.r0), vget_high_u8(r.r2));
+    StoreHalves(dst + 16, vget_high_u8(r.r4), vget_high_u8(r.r6));
+    dst += dstPitch;
+    StoreHalves(dst, vget_high_u8(r.r1), vget_high_u8(r.r3));
+    StoreHalves(dst + 16, vget_high_u8(r.r5), vget_high_u8(r.r7));
+  }
+};
+
+void Transpose(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch, int unit,
+               int rows, int columns) {
+  switch (unit) {
+    case 1:
+      return TransposeBy<Block8, 1>(dst, dstPitch, src, srcPitch, rows, columns);
+    case 2:
+      return TransposeBy<Block16, 2>(dst, dstPitch, src, srcPitch, rows, columns);
+    case 4:
+      return TransposeBy<Block32, 4>(dst, dstPitch, src, srcPitch, rows, columns);
+    default:
+      return scalar::Transpose(dst, dstPitch, src, srcPitch, unit, rows, columns);
   }
 }
 

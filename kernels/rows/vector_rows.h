@@ -824,7 +824,7 @@ constexpr RowOps VectorRows(const char* name) {
           Interleave,
           Deinterleave,
           SwapPairs,
-          scalar::Transpose,
+          Transpose,
           WriteStrided,
           WritePixels};
 }

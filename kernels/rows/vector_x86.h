@@ -11,6 +11,7 @@
 #include <immintrin.h>
 #include <stdint.h>
 
+#include "kernels/rows/rows_scalar.h"
 #include "kernels/rows/weights.h"
 
 namespace kestrel {
@@ -479,6 +480,9 @@ void WithSum(const Weights& weights, const Call& call) {
       return call(WeightedSum<Signs::kLastPositive>(weights.of, weights.offset));
   }
 }
+
+// The reference version is vectors already.
+constexpr auto Transpose = scalar::Transpose;
 
 }  // namespace
 }  // namespace kestrel
