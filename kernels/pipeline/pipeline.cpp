@@ -411,8 +411,9 @@ class Pipeline {
   }
 
   void RgbToYuv(int32_t r) {
-    const uint8_t* const pixels = destination_.exchangesLuma() ? nullptr : source_.Pixels(r);
-    if (pixels != nullptr && chromaOfSeconds_) return PixelsToYuv(r, pixels);
+    const bool fromPixels = chromaOfSeconds_ && !destination_.exchangesLuma();
+    const uint8_t* const pixels = fromPixels ? source_.Pixels(r) : nullptr;
+    if (pixels != nullptr) return PixelsToYuv(r, pixels);
     const RgbRun run = source_.Rgb(r);
     const auto tables = static_cast<RgbToYuvTables>(engine_.table);
     rows_.rgbToYuv(luma_, run.channel, tables, n_);

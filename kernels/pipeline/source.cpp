@@ -328,11 +328,33 @@ const uint8_t* Source::V(int32_t r) {
   return Chroma(2, r, chromaV_, v_);
 }
 
-const uint8_t* Source::Pixels(int32_t r) {
-  const Taps taps = rowPositions_.At(r, 1);
-  if (palette_ != nullptr || interpolates_ || (taps.weight != 0 && taps.first != taps.second)) {
-    return nullptr;
+void Source::FillPixelLine(Line* line, int32_t row) {
+  const uint8_t* const start = RowStart(0, row);
+  uint8_t* const pixels = line->samples[0];
+  line->channel[0] = pixels;
+  if (interpolates_) {
+    rows_.blendPixels(pixels, start, {first_.offset, second_.offset, weights_}, pixels_.alphaByte,
+                      first_.n);
+  } else if (first_.contiguous) {
+    line->channel[0] = start + first_.offset[0];
+  } else {
+    rows_.gatherPixels(pixels, start, first_.offset, pixels_.bytes, first_.n);
   }
+}
+
+const uint8_t* Source::Pixels(int32_t r) {
+  if (palette_ != nullptr) return nullptr;
+  if (pixels_.bytes == 4 && pixels_.wholeBytes) {
+    Line *first, *second;
+    uint16_t weight;
+    FetchLines(r, &Source::FillPixelLine, &first, &second, &weight);
+    if (weight == 0) return first->channel[0];
+    rows_.blendPixelRows(blended_[0], first->channel[0], second->channel[0], weight,
+                         pixels_.alphaByte, first_.n);
+    return blended_[0];
+  }
+  const Taps taps = rowPositions_.At(r, 1);
+  if (interpolates_ || (taps.weight != 0 && taps.first != taps.second)) return nullptr;
   const uint8_t* const row = RowStart(0, taps.first);
   if (first_.contiguous) return row + first_.offset[0];
   rows_.gatherPixels(packed_, row, first_.offset, pixels_.bytes, first_.n);

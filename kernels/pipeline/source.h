@@ -63,7 +63,8 @@ class Source {
   const uint8_t* U(int32_t r);
   const uint8_t* V(int32_t r);
   RgbRun Rgb(int32_t r);
-  // The strip's packed pixels, untouched; null where they are blended or come from a palette.
+  // The strip's packed pixels. Null where they come from a palette, or are blended and not of four
+  // whole bytes. Not to be mixed with Rgb in a strip.
   const uint8_t* Pixels(int32_t r);
   const PixelFormat& pixelFormat() const { return pixels_; }
   PixelChroma ChromaOfPixels(int32_t r) { return ChromaOfPixels(r, u_, v_); }
@@ -85,7 +86,7 @@ class Source {
     int32_t row;
     const uint8_t* channel[3];  // into `samples`, or into the source
     const uint8_t* alpha;
-    uint8_t samples[4][kStrip];
+    uint8_t samples[4][kStrip];  // channels and alpha, or packed pixels
   };
 
   const uint8_t* RowStart(int plane, int32_t row) const {
@@ -98,6 +99,7 @@ class Source {
   const uint8_t* Chroma(int plane, int32_t r, const SampleColumns& columns, uint8_t* buffer);
   void FillLumaLine(Line* line, int32_t row);
   void FillRgbLine(Line* line, int32_t row);
+  void FillPixelLine(Line* line, int32_t row);
   using Fill = void (Source::*)(Line*, int32_t);
   Line* FetchLine(int32_t row, const Line* keep, Fill fill);
   // Both lines of a loop row, or the same one twice when only the first counts.
@@ -125,7 +127,7 @@ class Source {
   Line lines_[2];
   uint8_t scratch_[3][kStrip];  // second taps
   uint8_t packed_[4 * kStrip];  // gathered pixels, or pairs of chroma samples
-  uint8_t blended_[3][kStrip];
+  uint8_t blended_[4][kStrip];  // channels, or packed pixels
   uint8_t u_[kStrip], v_[kStrip];
 };
 

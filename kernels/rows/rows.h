@@ -111,6 +111,13 @@ struct PairPlan {
   } eights[kMost / 8];
 };
 
+// Byte offsets of two neighbouring pixels, and the weight of the second.
+struct PixelTaps {
+  const int32_t* first;
+  const int32_t* second;
+  const uint16_t* weights;
+};
+
 // Error carry of 16-bit RGB: the bits that narrowing drops are added to the next pixel's index.
 struct Carry {
   int32_t mask[3];
@@ -142,6 +149,13 @@ struct KestrelRowOps {
   void (*blendColumns)(uint8_t* dst, const uint8_t* a, const uint8_t* b, const uint16_t* weights,
                        int n);
   void (*blendRows)(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t weight, int n);
+
+  // The same for packed pixels of four bytes: pixel i from those at first[i] and second[i], each of
+  // its bytes blended by weights[i] but for byte `alphaByte`, which is the first pixel's. -1: none.
+  void (*blendPixels)(uint8_t* dst, const uint8_t* src, const kestrel::PixelTaps& taps,
+                      int alphaByte, int n);
+  void (*blendPixelRows)(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t weight,
+                         int alphaByte, int n);
 
   // Packed pixels to channels of 8 bits: the top bits of each field, zero-filled below.
   void (*unpackRgb)(uint8_t* const rgb[3], const uint8_t* src, const kestrel::PixelFormat& format,

@@ -67,6 +67,26 @@ void BlendRows(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t weight
   for (int i = 0; i < n; ++i) dst[i] = Blend(a[i], b[i], int32_t(weight));
 }
 
+static void BlendPixel(uint8_t* dst, const uint8_t* a, const uint8_t* b, int32_t weight,
+                       int alphaByte) {
+  for (int k = 0; k < 4; ++k) dst[k] = k == alphaByte ? a[k] : Blend(a[k], b[k], weight);
+}
+
+void BlendPixels(uint8_t* dst, const uint8_t* src, const PixelTaps& taps, int alphaByte, int n) {
+  for (int i = 0; i < n; ++i) {
+    BlendPixel(dst + ptrdiff_t{4} * i, src + taps.first[i], src + taps.second[i], taps.weights[i],
+               alphaByte);
+  }
+}
+
+void BlendPixelRows(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t weight,
+                    int alphaByte, int n) {
+  for (int i = 0; i < n; ++i) {
+    BlendPixel(dst + ptrdiff_t{4} * i, a + ptrdiff_t{4} * i, b + ptrdiff_t{4} * i, int32_t(weight),
+               alphaByte);
+  }
+}
+
 void PlanPairs(PairPlan*) {}
 
 void ReadSomePairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan, int i, int end) {
@@ -594,6 +614,8 @@ const RowOps kScalarRows = {"scalar",
                             scalar::BlendPairs,
                             scalar::BlendColumns,
                             scalar::BlendRows,
+                            scalar::BlendPixels,
+                            scalar::BlendPixelRows,
                             scalar::UnpackRgb,
                             scalar::UnpackAlpha,
                             scalar::UnpackIndexed,

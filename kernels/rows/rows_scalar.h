@@ -18,6 +18,9 @@ void BlendPairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan);
 void BlendSomePairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan, int i, int end);
 void BlendColumns(uint8_t* dst, const uint8_t* a, const uint8_t* b, const uint16_t* weights, int n);
 void BlendRows(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t weight, int n);
+void BlendPixels(uint8_t* dst, const uint8_t* src, const PixelTaps& taps, int alphaByte, int n);
+void BlendPixelRows(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t weight,
+                    int alphaByte, int n);
 void UnpackRgb(uint8_t* const rgb[3], const uint8_t* src, const PixelFormat& format, int n);
 void UnpackAlpha(uint8_t* alpha, const uint8_t* src, const PixelFormat& format, int n);
 void UnpackIndexed(uint8_t* const rgb[3], const uint8_t* row, const int32_t* columns, uint32_t bits,

@@ -240,6 +240,33 @@ inline Words GatherPairs(const uint8_t* src, const PairPlan::Eight* eight) {
                                            GatherFour(src + eight->window[1], eight->shuffle[1])))};
 }
 
+// ---- Pixels of four bytes
+// Words for the bytes of pixels: `one` for byte `byte`, `others` for the rest.
+inline Words QuadWords(int byte, int one, int others) {
+  uint16_t words[8];
+  for (int i = 0; i < 8; ++i) words[i] = uint16_t(i % 4 == byte ? one : others);
+  return {vld1q_u16(words)};
+}
+// (Through bytes: pixels need not be aligned.)
+inline uint32_t LoadQuad(const uint8_t* p) {
+  uint32_t quad;
+  __builtin_memcpy(&quad, p, 4);
+  return quad;
+}
+inline Bytes GatherQuads(const uint8_t* src, const int32_t* offsets) {
+  uint32x4_t v = vdupq_n_u32(LoadQuad(src + offsets[0]));
+  v = vsetq_lane_u32(LoadQuad(src + offsets[1]), v, 1);
+  v = vsetq_lane_u32(LoadQuad(src + offsets[2]), v, 2);
+  v = vsetq_lane_u32(LoadQuad(src + offsets[3]), v, 3);
+  return {vreinterpretq_u8_u32(v)};
+}
+// Each of a vector's pixels' weights for all its bytes.
+inline WordsPair SpreadToQuads(const uint16_t* weights) {
+  const uint16x4_t w = vld1_u16(weights);
+  return {{vcombine_u16(vdup_lane_u16(w, 0), vdup_lane_u16(w, 1))},
+          {vcombine_u16(vdup_lane_u16(w, 2), vdup_lane_u16(w, 3))}};
+}
+
 // The odd bytes of two vectors.
 inline Bytes Seconds(Bytes a, Bytes b) {
   return {vuzpq_u8(a.v, b.v).val[1]};

@@ -94,6 +94,45 @@ void BlendRows(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t weight
   }
 }
 
+constexpr int kQuads = kBytes / 4;  // pixels of four bytes in a vector
+
+void GatherPixels(uint8_t* dst, const uint8_t* src, const int32_t* offsets, int bytes, int n) {
+  int i = 0;
+  if (bytes == 4) {
+    for (; i + kQuads <= n; i += kQuads) StoreBytes(dst + 4 * i, GatherQuads(src, offsets + i));
+  }
+  scalar::GatherPixels(dst + ptrdiff_t{i} * bytes, src, offsets + i, bytes, n - i);
+}
+
+void BlendPixels(uint8_t* dst, const uint8_t* src, const PixelTaps& taps, int alphaByte, int n) {
+  const Words keep = QuadWords(alphaByte, 0, 0xFFFF);
+  int i = 0;
+  for (; i + kQuads <= n; i += kQuads) {
+    const WordsPair first = Widen(GatherQuads(src, taps.first + i));
+    const WordsPair second = Widen(GatherQuads(src, taps.second + i));
+    const WordsPair weights = SpreadToQuads(taps.weights + i);
+    StoreBytes(dst + 4 * i, Narrow(Blend(first.low, second.low, weights.low & keep),
+                                   Blend(first.high, second.high, weights.high & keep)));
+  }
+  scalar::BlendPixels(dst + 4 * i, src, {taps.first + i, taps.second + i, taps.weights + i},
+                      alphaByte, n - i);
+}
+
+void BlendPixelRows(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t weight,
+                    int alphaByte, int n) {
+  const Words weights = QuadWords(alphaByte, 0, int(weight));
+  uint8_t* const dsts[] = {dst};
+  ForRun<1>(
+      dsts, 4 * n,
+      [=](uint8_t* const* out, const uint8_t* inA, const uint8_t* inB) {
+        const WordsPair first = Widen(LoadBytes(inA));
+        const WordsPair second = Widen(LoadBytes(inB));
+        StoreBytes(out[0], Narrow(Blend(first.low, second.low, weights),
+                                  Blend(first.high, second.high, weights)));
+      },
+      Units{a, 1}, Units{b, 1});
+}
+
 // Four pairs that share a window. No window reaches beyond the bytes that the run reads anyway,
 // [lowest, end). False when there is none.
 bool PlanWindow(const int32_t (&offsets)[8], int32_t lowest, int32_t end, int32_t* window,
@@ -801,12 +840,14 @@ constexpr RowOps VectorRows(const char* name) {
   return {name,
           ReadStrided,
           scalar::Gather,
-          scalar::GatherPixels,
+          GatherPixels,
           PlanPairs,
           ReadPairs,
           BlendPairs,
           BlendColumns,
           BlendRows,
+          BlendPixels,
+          BlendPixelRows,
           UnpackRgb,
           UnpackAlpha,
           scalar::UnpackIndexed,

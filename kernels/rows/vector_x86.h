@@ -386,6 +386,44 @@ inline Words GatherPairs(const uint8_t* src, const PairPlan::Eight* eights) {
 #endif
 }
 
+// ---- Pixels of four bytes
+// Words for the bytes of pixels: `one` for byte `byte`, `others` for the rest.
+inline Words QuadWords(int byte, int one, int others) {
+  alignas(16) int16_t words[8];
+  for (int i = 0; i < 8; ++i) words[i] = int16_t(i % 4 == byte ? one : others);
+  return {Broadcast(Load16(words))};
+}
+inline __m128i GatherFourQuads(const uint8_t* src, const int32_t* offsets) {
+  const auto quad = [src](int32_t offset) {
+    int32_t value;
+    __builtin_memcpy(&value, src + offset, 4);
+    return value;
+  };
+  __m128i v = _mm_cvtsi32_si128(quad(offsets[0]));
+  v = _mm_insert_epi32(v, quad(offsets[1]), 1);
+  v = _mm_insert_epi32(v, quad(offsets[2]), 2);
+  return _mm_insert_epi32(v, quad(offsets[3]), 3);
+}
+inline Bytes GatherQuads(const uint8_t* src, const int32_t* offsets) {
+#ifdef __AVX2__
+  return {Join(GatherFourQuads(src, offsets), GatherFourQuads(src, offsets + 4))};
+#else
+  return {GatherFourQuads(src, offsets)};
+#endif
+}
+// Each of a vector's pixels' weights for all its bytes.
+inline WordsPair SpreadToQuads(const uint16_t* weights) {
+  const __m128i low = _mm_setr_epi8(0, 1, 0, 1, 0, 1, 0, 1, 2, 3, 2, 3, 2, 3, 2, 3);
+  const __m128i high = _mm_setr_epi8(4, 5, 4, 5, 4, 5, 4, 5, 6, 7, 6, 7, 6, 7, 6, 7);
+#ifdef __AVX2__
+  const Register w = Join(Load8(weights), Load8(weights + 4));
+#else
+  const Register w = Load8(weights);
+#endif
+  return {{KESTREL_SIMD(shuffle_epi8)(w, Broadcast(low))},
+          {KESTREL_SIMD(shuffle_epi8)(w, Broadcast(high))}};
+}
+
 // The odd bytes of two vectors.
 inline Bytes Seconds(Bytes a, Bytes b) {
   const Bytes narrow = Narrow(ShiftRightUnsigned<8>(Words{a.v}), ShiftRightUnsigned<8>(Words{b.v}));

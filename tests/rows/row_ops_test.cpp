@@ -352,6 +352,39 @@ void BlendRows(Trial* trial, const RowOps& ops, int n, int variant) {
       });
 }
 
+// Variants 0..3: the byte that keeps the first pixel's value; 4: none. Offsets are of bytes.
+void BlendPixels(Trial* trial, const RowOps& ops, int n, int variant) {
+  const int alphaByte = variant % 5 == 4 ? -1 : variant % 5;
+  const int32_t starts = trial->random().Between(1, 8 * n + 1);
+  const uint8_t* const src = trial->Source(size_t(starts + 3));
+  const int32_t* const first = trial->Source(DrawOffsets(trial, n, variant / 5, starts));
+  const int32_t* const second = trial->Source(DrawOffsets(trial, n, variant / 5, starts));
+  std::vector<uint16_t> drawn(size_t(n), 0);
+  std::generate(drawn.begin(), drawn.end(), [trial] { return uint16_t(DrawWeight(trial)); });
+  const uint16_t* const weights = trial->Source(drawn);
+  const auto dst = trial->Written(size_t(4) * size_t(n));
+  for (ptrdiff_t i = 0; i < n; ++i) {
+    for (ptrdiff_t k = 0; k < 4; ++k) {
+      const uint8_t kept = src[first[i] + k];
+      dst.expected[4 * i + k] =
+          k == alphaByte ? kept : Blended(kept, src[second[i] + k], weights[i]);
+    }
+  }
+  ops.blendPixels(dst.got, src, {first, second, weights}, alphaByte, n);
+}
+
+void BlendPixelRows(Trial* trial, const RowOps& ops, int n, int variant) {
+  const int alphaByte = variant == 4 ? -1 : variant;
+  const int64_t weight = DrawWeight(trial);
+  const uint8_t* const a = trial->Source(size_t(4) * size_t(n));
+  const uint8_t* const b = trial->Source(size_t(4) * size_t(n));
+  const auto dst = trial->Written(size_t(4) * size_t(n));
+  for (ptrdiff_t i = 0; i < ptrdiff_t{4} * n; ++i) {
+    dst.expected[i] = i % 4 == alphaByte ? a[i] : Blended(a[i], b[i], weight);
+  }
+  ops.blendPixelRows(dst.got, a, b, uint32_t(weight), alphaByte, n);
+}
+
 void UnpackRgb(Trial* trial, const RowOps& ops, int n, int variant) {
   const PixelFormat& format = kPixelFormats[variant];
   const uint8_t* const src = trial->Source(size_t(n) * size_t(format.bytes));
@@ -752,6 +785,8 @@ constexpr Operation kOperations[] = {
     {"BlendPairs", 6, BlendPairs},
     {"BlendColumns", 3, BlendColumns},
     {"BlendRows", 3, BlendRows},
+    {"BlendPixels", 15, BlendPixels},
+    {"BlendPixelRows", 5, BlendPixelRows},
     {"UnpackRgb", kPixelFormatCount, UnpackRgb},
     {"UnpackAlpha", kPixelFormatCount - kFirstWithAlpha, UnpackAlpha},
     {"UnpackIndexed", 9, UnpackIndexed},
