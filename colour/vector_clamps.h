@@ -6,9 +6,16 @@
 
 #include "engine/api.h"
 
+#if defined(__ARM_NEON)
+#include <arm_neon.h>
+typedef uint16x8_t KestrelU16x8;
+typedef int16x8_t KestrelS16x8;
+typedef int32x4_t KestrelS32x4;
+#else
 typedef uint16_t KestrelU16x8 __attribute__((vector_size(16)));
 typedef int16_t KestrelS16x8 __attribute__((vector_size(16)));
 typedef int32_t KestrelS32x4 __attribute__((vector_size(16)));
+#endif
 
 KESTREL_BEGIN_C
 
