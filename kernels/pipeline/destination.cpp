@@ -108,7 +108,7 @@ Destination::Destination(const Job& job)
   const bool tiles = engine_.swapXY != 0 && exchange_ == LumaExchange::kNone;
   const bool rgb = engine_.dstLayout.code == CODE_RGB;
   // A plane of YUV takes a quarter of what pixels may take, chroma pairs two quarters.
-  constexpr int kPlane = PlaneWriter::kTileSize;
+  constexpr ptrdiff_t kPlane = PlaneWriter::kTileSize;
   writers_[0].Set(planes_[0], rgb ? pixels_.bytes : 1, tiles, buffer_, &rows_);
   const ptrdiff_t apart = planes_[2].start - planes_[1].start;
   if (engine_.dstLayout.planeCount == 3 && (apart == 1 || apart == -1) &&

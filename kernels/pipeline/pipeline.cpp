@@ -159,8 +159,8 @@ class Pipeline {
   bool KeepsPixels() const {
     const PixelFormat& from = source_.pixelFormat();
     const PixelFormat& to = destination_.pixelFormat();
-    if (engine_.pathKind != PATH_RGB_TO_RGB || clampedCarry_ || from.bytes != to.bytes)
-      return false;
+    const bool rgb = engine_.pathKind == PATH_RGB_TO_RGB && !clampedCarry_;
+    if (!rgb || from.bytes != to.bytes) return false;
     uint32_t bits = from.alphaByte >= 0 ? 8 : 0;
     for (int c = 0; c < 3; ++c) {
       const bool same = from.size[c] == to.size[c] && from.position[c] == to.position[c];
@@ -339,7 +339,7 @@ class Pipeline {
     }
     PixelChroma chroma = {};
     for (int i = 0; i < collected; ++i) {
-      uint8_t* const into = luma_ + i * n_;
+      uint8_t* const into = luma_ + ptrdiff_t{i} * n_;
       const uint8_t* const luma = source_.Luma(r + i, into);
       if (luma != into) memcpy(into, luma, size_t(n_));
       const PixelChroma row = CollectChroma(r + i, i);
@@ -351,8 +351,8 @@ class Pipeline {
 
   // Chroma of a row as row i of those collected.
   PixelChroma CollectChroma(int32_t r, int i) {
-    uint8_t* const u = channels_[0] + i * n_;
-    uint8_t* const v = channels_[1] + i * n_;
+    uint8_t* const u = channels_[0] + ptrdiff_t{i} * n_;
+    uint8_t* const v = channels_[1] + ptrdiff_t{i} * n_;
     PixelChroma chroma = source_.ChromaOfPixels(r, u, v);
     ChromaRows& rows = chroma.rows;
     if (source_.ChromaIsGrey()) return chroma;
