@@ -253,6 +253,22 @@ void Destination::SelectColumns(int32_t x, int n) {
     }
     first = i + 1;
   }
+  writesGroups_ = StripIsGroups();
+}
+
+// Luma and chroma of the strip begin in the same group of four bytes and end in the same.
+bool Destination::StripIsGroups() const {
+  const PlaneLayout& layout = engine_.dstLayout;
+  const bool packed = layout.isPacked != 0 && layout.step[0] == 2 && planes_[0].columnStep == 2;
+  if (!packed || exchange_ != LumaExchange::kNone || chromaCount_ == 0 || firstPixel_ != 0 ||
+      pixelEnd_ != n_ || n_ != 2 * chromaCount_) {
+    return false;
+  }
+  const uint8_t* const luma = planes_[0].At(int64_t(x_) - job_.rect.left, 0);
+  const uint8_t* const group = luma - layout.yOffset;
+  return planes_[1].At(firstChroma_, 0) == group + layout.uOffset &&
+         planes_[2].At(firstChroma_, 0) == group + layout.vOffset && layout.yOffset < 2 &&
+         (layout.uOffset ^ layout.vOffset) == 2 && ((layout.uOffset ^ layout.yOffset) & 1) == 1;
 }
 
 // All writers store together and in order: in one packed layout a chroma sample takes the place of
@@ -270,6 +286,10 @@ void Destination::PutLuma(int32_t r, const uint8_t* luma) {
   const int64_t row = int64_t(exchange_ == LumaExchange::kRows ? r ^ 1 : r) - job_.rect.top;
   const int n = pixelEnd_ - firstPixel_;
   if (!plane.rows.Contains(row)) return;
+  if (writesGroups_) {
+    heldLuma_ = luma;
+    return;
+  }
   if (exchange_ == LumaExchange::kColumns) {
     for (int i = 0; i < n_; ++i) {
       const int64_t column = int64_t((x_ + i) ^ 1) - job_.rect.left;
@@ -292,6 +312,18 @@ void Destination::PutChromaPlane(int plane, int32_t r, const uint8_t* samples) {
 
 void Destination::PutChroma(int32_t r, const uint8_t* u, const uint8_t* v) {
   if (chromaCount_ == 0) return;
+  if (writesGroups_) {
+    if (heldLuma_ == nullptr) return;
+    const PlaneLayout& layout = engine_.dstLayout;
+    const bool uFirst = layout.uOffset < layout.vOffset;
+    rows_.interleave(buffer_, uFirst ? u : v, uFirst ? v : u, chromaCount_);
+    uint8_t* const group =
+        planes_[0].At(int64_t(x_) - job_.rect.left, int64_t(r) - job_.rect.top) - layout.yOffset;
+    const bool lumaFirst = layout.yOffset == 0;
+    rows_.interleave(group, lumaFirst ? heldLuma_ : buffer_, lumaFirst ? buffer_ : heldLuma_, n_);
+    heldLuma_ = nullptr;
+    return;
+  }
   if (chromaPairs_ == 0) {
     PutChromaPlane(1, r, u);
     PutChromaPlane(2, r, v);

@@ -122,6 +122,7 @@ class Destination {
   const int32_t* uColumns() const { return uColumns_; }
   const int32_t* vColumns() const { return vColumns_; }
   int chromaCount() const { return chromaCount_; }
+  // (Where packed 4:2:2 is written whole, luma is kept until the row's chroma comes.)
   void PutLuma(int32_t r, const uint8_t* luma);
   // Memory for a row of luma, for the strip columns that it says; not where luma is exchanged.
   PixelRun StartLuma(int32_t r) { return StartPixels(r, 1); }
@@ -149,6 +150,8 @@ class Destination {
   PlaneWriter& writer(int plane) { return writers_[plane]; }
   // Whether runs of every plane lie in memory as they are packed.
   bool AllInPlace() const;
+  // Whether the strip's rows of packed 4:2:2 are written as groups of two pixels.
+  bool writesGroups() const { return writesGroups_; }
 
   // RGB. Memory for the pixels of some rows; null when they are outside the image.
   PixelRun StartPixels(int32_t r, int rows);
@@ -173,6 +176,7 @@ class Destination {
   int32_t LastXOfChroma(int64_t column) const;
   int64_t BlockOfRow(int64_t r) const;
   bool WritesChroma(int32_t r, bool ofLastRow) const;
+  bool StripIsGroups() const;
   void MakeRoom(int writer, int64_t column, int64_t row, int n, int runs = 1);
   void PutChromaPlane(int plane, int32_t r, const uint8_t* samples);
 
@@ -194,6 +198,8 @@ class Destination {
 
   int32_t x_ = 0;
   int n_ = 0;
+  bool writesGroups_ = false;
+  const uint8_t* heldLuma_ = nullptr;
   int chromaCount_ = 0;
   int64_t firstChroma_ = 0;                      // plane column of the first chroma sample
   int32_t uColumns_[kStrip], vColumns_[kStrip];  // loop columns

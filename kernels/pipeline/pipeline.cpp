@@ -139,7 +139,7 @@ class Pipeline {
   // or their chroma interleaved or taken apart, in rows as wide as the job.
   void CopyPlanes() {
     const bool unit = engine_.stepX == 0x10000 && engine_.stepY == 0x10000;
-    const bool keepsYuv = engine_.pathKind == PATH_YUV_TO_YUV && !job_.has(kPairChroma) &&
+    const bool keepsYuv = engine_.pathKind == PATH_YUV_TO_YUV && engine_.dstLayout.isPacked == 0 &&
                           !destination_.exchangesLuma();
     if (!unit || !(keepsYuv || KeepsPixels())) return;
     if (job_.mapsLevels() && !destination_.AllInPlace()) return;
@@ -431,7 +431,12 @@ class Pipeline {
   // The usual case: both components of each pixel, or of the second of each pair of pixels.
   void PixelsToYuv(int32_t r, const uint8_t* pixels) {
     const PixelFormat& format = source_.pixelFormat();
-    const Destination::PixelRun run = destination_.StartLuma(r);
+    if (destination_.writesGroups()) {
+      rows_.pixelsToYuv(luma_, pixels, format, yuvTables(), n_);
+      destination_.PutLuma(r, luma_);
+    }
+    const Destination::PixelRun run =
+        destination_.writesGroups() ? Destination::PixelRun() : destination_.StartLuma(r);
     if (run.pixels != nullptr) {
       rows_.pixelsToYuv(run.pixels, pixels + ptrdiff_t{run.first} * format.bytes, format,
                         yuvTables(), run.n);
