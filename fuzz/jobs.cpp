@@ -19,27 +19,46 @@ constexpr size_t kCapacity = size_t{1} << 19;
 constexpr int64_t kMostPixels = int64_t{1} << 15;
 constexpr int64_t kFarthest = 16777216;  // regions that start beyond are not drawn
 
-constexpr uint32_t kListed[] = {
-    FORMAT_NV21,         FORMAT_XBGR8888,
-    FORMAT_I420,         FORMAT_RGB565,
-    FORMAT_BGR565,       FORMAT_RGB666,
-    FORMAT_BGR666,       FORMAT_RGB888,
-    FORMAT_BGR888,       FORMAT_XRGB8888,
-    FORMAT_RGBX8888,     FORMAT_BGRX8888,
-    FORMAT_INDEX1,       FORMAT_INDEX4,
-    FORMAT_INDEX8,       FORMAT_YUYV,
-    FORMAT_YVYU,         FORMAT_UYVY,
-    FORMAT_VYUY,         FORMAT_YUYV_SWAPPED_LUMA,
-    FORMAT_YVYU_SWAPPED_LUMA, FORMAT_UYVY_SWAPPED_LUMA,
-    FORMAT_VYUY_SWAPPED_LUMA, FORMAT_YUV444,
-    FORMAT_YVU444,       FORMAT_UVY444,
-    FORMAT_VUY444,       FORMAT_I422,
-    FORMAT_I440,         FORMAT_I444,
-    FORMAT_YV12,         FORMAT_YV16,
-    FORMAT_YV440,        FORMAT_YV24,
-    FORMAT_GRAY8,        FORMAT_NV12,
-    FORMAT_NV61,         FORMAT_NV16,
-    FORMAT_YUV_SPECIAL8, FORMAT_YUV_SPECIAL9};
+constexpr uint32_t kListed[] = {FORMAT_NV21,
+                                FORMAT_XBGR8888,
+                                FORMAT_I420,
+                                FORMAT_RGB565,
+                                FORMAT_BGR565,
+                                FORMAT_RGB666,
+                                FORMAT_BGR666,
+                                FORMAT_RGB888,
+                                FORMAT_BGR888,
+                                FORMAT_XRGB8888,
+                                FORMAT_RGBX8888,
+                                FORMAT_BGRX8888,
+                                FORMAT_INDEX1,
+                                FORMAT_INDEX4,
+                                FORMAT_INDEX8,
+                                FORMAT_YUYV,
+                                FORMAT_YVYU,
+                                FORMAT_UYVY,
+                                FORMAT_VYUY,
+                                FORMAT_YUYV_SWAPPED_LUMA,
+                                FORMAT_YVYU_SWAPPED_LUMA,
+                                FORMAT_UYVY_SWAPPED_LUMA,
+                                FORMAT_VYUY_SWAPPED_LUMA,
+                                FORMAT_YUV444,
+                                FORMAT_YVU444,
+                                FORMAT_UVY444,
+                                FORMAT_VUY444,
+                                FORMAT_I422,
+                                FORMAT_I440,
+                                FORMAT_I444,
+                                FORMAT_YV12,
+                                FORMAT_YV16,
+                                FORMAT_YV440,
+                                FORMAT_YV24,
+                                FORMAT_GRAY8,
+                                FORMAT_NV12,
+                                FORMAT_NV61,
+                                FORMAT_NV16,
+                                FORMAT_YUV_SPECIAL8,
+                                FORMAT_YUV_SPECIAL9};
 
 int32_t DrawAdjustment(Input* input) {
   switch (input->Between(0, 3)) {
@@ -150,8 +169,8 @@ uint32_t DrawFormat(Input* input) {
            (uint32_t(input->Byte()) & 0x33u);
   }
   if (kind >= 25) {
-    return (input->OneIn(2) ? 0x30000000u : 0x10000000u) |
-           uint32_t(input->Between(5, 7)) << 24 | (input->Word() & 0x1FFFu);
+    return (input->OneIn(2) ? 0x30000000u : 0x10000000u) | uint32_t(input->Between(5, 7)) << 24 |
+           (input->Word() & 0x1FFFu);
   }
   const uint32_t code = input->Pick(kListed);
   return code >> 28 >= 5 ? code | standard : code;
@@ -218,8 +237,9 @@ bool DrawSide(Input* input, int64_t imageWidth, int64_t imageHeight, Side* side)
     if (SizeOf(block, pitch) > kCapacity / 2) pitch = block.rowBytes;
     side->pitches[i] = (kind & 4) != 0 ? -pitch : pitch;
     const int32_t place = input->Byte();
-    side->placement[i] = {(place & 1) != 0 ? GuardedBuffer::Edge::kStart : GuardedBuffer::Edge::kEnd,
-                          1u << (place >> 1 & 7) % 6, uint32_t(place >> 4)};
+    side->placement[i] = {
+        (place & 1) != 0 ? GuardedBuffer::Edge::kStart : GuardedBuffer::Edge::kEnd,
+        1u << (place >> 1 & 7) % 6, uint32_t(place >> 4)};
   }
   if (side->blocks.count == 2) side->pitches[2] = side->pitches[1];
   return true;

@@ -35,9 +35,9 @@ bool DrawSide(Input* input, int64_t imageWidth, int64_t imageHeight, differentia
 
 struct Job {
   differential::Case drawn = {};
-  bool hasImages = false;   // otherwise there is no memory to run it on, only to create its engine
+  bool hasImages = false;  // otherwise there is no memory to run it on, only to create its engine
   bool drawsNothing = false;  // as the library promises for what lies too far away
-  bool isModelled = false;  // the reference converter says what comes out
+  bool isModelled = false;    // the reference converter says what comes out
 };
 
 Job DrawJob(Input* input);

@@ -145,8 +145,11 @@ class Pipeline {
     if (job_.mapsLevels() && !destination_.AllInPlace()) return;
     const PlaneRun luma = destination_.LumaRun();
     if (luma.n > 0) {
-      if (!source_.LumaLiesInPlace(luma.firstX, luma.n)) return;
-      CopyPlane(0, luma);
+      if (source_.LumaLiesInPlace(luma.firstX, luma.n)) {
+        CopyPlane(0, luma);
+      } else if (!ReadPackedLuma(luma)) {
+        return;
+      }
     }
     // Chroma never comes before luma: one packed layout has both in the same byte.
     lumaDone_ = true;
@@ -172,16 +175,15 @@ class Pipeline {
 
   bool CopyChroma(const PlaneRun& run) {
     if (run.n <= 0) return true;
-    const bool sameFactors = engine_.srcSubsample[1] == engine_.dstSubsample[1] &&
-                             engine_.srcSubsample[4] == engine_.dstSubsample[4];
-    if (!sameFactors || engine_.srcLayout.code == CODE_GRAY8 ||
+    if (engine_.srcSubsample[1] != engine_.dstSubsample[1] ||
+        engine_.srcLayout.code == CODE_GRAY8 ||
         !source_.ChromaLiesInPlace(run.firstX, run.lastX, run.n)) {
       return false;
     }
     const int from = source_.chromaPairs();
     const int to = destination_.chromaPairs();
-    if (from == 0 && engine_.srcLayout.step[1] != 1) return false;
-    if (from == to) {
+    const bool packed = from == 0 && engine_.srcLayout.step[1] != 1;
+    if (from == to && !packed) {
       CopyPlane(from == 0 ? 1 : from, run);
       if (from == 0) CopyPlane(2, run);
       return true;
@@ -189,9 +191,48 @@ class Pipeline {
     if (job_.mapsLevels() || !destination_.AllInPlace()) return false;
     for (int32_t r = job_.rect.top; r < job_.rect.bottom; ++r) {
       PlaneRow row;
-      if (LocateRow(1, r, &row)) RearrangeChroma(run, row, from, to);
+      if (!LocateRow(1, r, &row)) continue;
+      if (packed) {
+        ReadPackedChroma(run, row, to);
+      } else {
+        RearrangeChroma(run, row, from, to);
+      }
     }
     return true;
+  }
+
+  // Samples of a packed image become rows of a plane.
+  bool ReadPackedLuma(const PlaneRun& run) {
+    if (job_.mapsLevels() || !destination_.AllInPlace() ||
+        !source_.LumaAdvances(run.firstX, run.n)) {
+      return false;
+    }
+    for (int32_t r = job_.rect.top; r < job_.rect.bottom; ++r) {
+      PlaneRow row;
+      if (!LocateRow(0, r, &row)) continue;
+      rows_.readStrided(destination_.writer(0).Start(run.column, row.destination, run.n),
+                        source_.LumaAt(run.firstX, row.source), engine_.srcLayout.step[0], run.n);
+    }
+    return true;
+  }
+
+  void ReadPackedChroma(const PlaneRun& run, const PlaneRow& row, int to) {
+    const ptrdiff_t step = engine_.srcLayout.step[1];
+    const uint8_t* const u = source_.ChromaAt(1, run.firstX, row.source);
+    const uint8_t* const v = source_.ChromaAt(2, run.firstX, row.source);
+    uint8_t* const samples = destination_.writer(1).Start(run.column, row.destination, run.n);
+    if (to == 0) {
+      rows_.readStrided(samples, u, step, run.n);
+      rows_.readStrided(destination_.writer(2).Start(run.column, row.destination, run.n), v, step,
+                        run.n);
+      return;
+    }
+    for (int i = 0; i < run.n; i += kStrip) {
+      const int n = run.n - i < kStrip ? run.n - i : kStrip;
+      rows_.readStrided(u_, u + step * i, step, n);
+      rows_.readStrided(v_, v + step * i, step, n);
+      rows_.interleave(samples + ptrdiff_t{2} * i, to == 1 ? u_ : v_, to == 1 ? v_ : u_, n);
+    }
   }
 
   void RearrangeChroma(const PlaneRun& run, const PlaneRow& row, int from, int to) {
@@ -228,7 +269,8 @@ class Pipeline {
     // From one row to the next the source advances by one at most: when the ends are as far apart
     // on both sides, so is every row between them. (Rows above the image read one further down, and
     // with those the ends never are.)
-    if (LocateRow(plane, bottom - 1, &last) &&
+    const bool sameRows = plane == 0 || engine_.srcSubsample[4] == engine_.dstSubsample[4];
+    if (sameRows && LocateRow(plane, bottom - 1, &last) &&
         last.source - first.source == last.destination - first.destination) {
       WriteBlock(plane, run, first, int(last.source - first.source) + 1);
       return;

@@ -62,7 +62,7 @@ RowPositions::RowPositions(const Job& job)
     // Rows whose sample, and whose successor's, are above the last one and readable.
     const int64_t last = (int64_t(srcBottom_) - 1) >> shift;
     const int64_t readable = readableLast_ >> shift;
-    plainTo_[shift] = (last < readable ? last : readable) * 65536 << shift;
+    plainTo_[shift] = (last < readable ? last : readable) * (int64_t{65536} << shift);
   }
 }
 

@@ -67,8 +67,18 @@ void Source::SelectColumns(int32_t x, int n) {
   }
   first_.Finish(n);
   second_.Finish(n);
-  // Pixels of RGB are gathered whole.
-  if (job_.engine.srcLayout.code == CODE_RGB) return;
+  if (job_.engine.srcLayout.code == CODE_RGB) {
+    // Pixels are gathered whole; those of two bytes are pairs of them.
+    if (pixels_.bytes != 2 || interpolates_ || palette_ != nullptr) return;
+    int32_t* const second = chromaU_.offset;
+    for (int i = 0; i < n; ++i) second[i] = first_.offset[i] + 1;
+    first_.plan.n = n;
+    first_.plan.first = first_.offset;
+    first_.plan.second = second;
+    first_.plan.stride = 1;
+    rows_.planPairs(&first_.plan);
+    return;
+  }
   if (!interpolates_) {
     first_.Plan(rows_);
   } else {
@@ -186,7 +196,7 @@ bool Source::PixelsLieInPlace(int32_t x, int32_t n) const {
 
 bool Source::LumaLiesInPlace(int32_t x, int32_t n) const {
   const bool packedYuv = job_.engine.srcLayout.code != CODE_RGB && first_.step != 1;
-  return !packedYuv && palette_ == nullptr && !swappedLuma_ && columnPositions_.Advance(x, n);
+  return !packedYuv && LumaAdvances(x, n);
 }
 
 bool Source::ChromaLiesInPlace(int32_t firstX, int32_t lastX, int32_t n) const {
@@ -357,7 +367,11 @@ const uint8_t* Source::Pixels(int32_t r) {
   if (interpolates_ || (taps.weight != 0 && taps.first != taps.second)) return nullptr;
   const uint8_t* const row = RowStart(0, taps.first);
   if (first_.contiguous) return row + first_.offset[0];
-  rows_.gatherPixels(packed_, row, first_.offset, pixels_.bytes, first_.n);
+  if (pixels_.bytes == 2) {
+    rows_.readPairs(packed_, row, first_.plan);
+  } else {
+    rows_.gatherPixels(packed_, row, first_.offset, pixels_.bytes, first_.n);
+  }
   return packed_;
 }
 

@@ -49,6 +49,10 @@ class Source {
   // source row, and the chroma of n loop columns that are a block apart, from the first to the
   // last.
   bool LumaLiesInPlace(int32_t x, int32_t n) const;
+  // Whether n loop columns from x read one source column after the other.
+  bool LumaAdvances(int32_t x, int32_t n) const {
+    return palette_ == nullptr && !swappedLuma_ && columnPositions_.Advance(x, n);
+  }
   bool ChromaLiesInPlace(int32_t firstX, int32_t lastX, int32_t n) const;
   // 1 or 2 when chroma lies in pairs: the component that comes first.
   int chromaPairs() const;
