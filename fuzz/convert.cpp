@@ -56,7 +56,7 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     RunWithoutImages(job);
     return 0;
   }
-  images.Prepare(job.drawn);
+  images.Prepare(job);
   const reference::Job call = images.JobOnProduct();
   uint32_t expected = KESTREL_OK;
   if (job.isModelled) expected = reference::Convert(images.JobOnModel());

@@ -149,7 +149,7 @@ void DrawSizes(Input* input, const MPPPARAM& params, MPPFORMAT* dst, MPPFORMAT* 
   dst->height = swaps ? width : height;
 }
 
-// A pitch with which no row but the first may be reached, when there are `rows`.
+// Rows of this pitch span 2 GiB or more, or one alone does.
 int32_t FarPitch(Input* input, int64_t rows) {
   const int64_t least = (int64_t{1} << 31) / (rows - 1) + 1;
   if (least > INT32_MAX || input->OneIn(4)) return INT32_MIN;
@@ -278,9 +278,14 @@ void DrawImages(Input* input, Job* job) {
                     !(isGrey && drawn.src.nullSlot > 0) &&
                     !(hasNull && (drawn.dst.nullSlot == 0 || drawn.src.nullSlot == 0));
   if (input->OneIn(48) && srcBottom > 1) {
-    // Rows that lie apart by more than any memory: what is behind the first one does not exist.
-    drawn.src.pitches[0] = FarPitch(input, srcBottom);
+    job->farSrcPitch = FarPitch(input, srcBottom);
     drawn.src.blocks.block[0].rows = 1;
+  }
+  if (input->OneIn(64)) {
+    job->farDstPitch = INT32_MIN;
+    drawn.dst.blocks.block[0].rows = 1;
+  }
+  if (job->farSrcPitch != 0 || job->farDstPitch != 0) {
     job->drawsNothing = true;
     job->isModelled = false;
   }
@@ -312,8 +317,9 @@ Images::Images() : paletteMemory_(1024) {
   }
 }
 
-void Images::Prepare(const Case& drawn) {
-  case_ = drawn;
+void Images::Prepare(const Job& job) {
+  job_ = job;
+  const Case& drawn = job_.drawn;
   Random random(drawn.seed, drawn.number);
   for (int i = 0; i < drawn.src.blocks.count; ++i) {
     source_[i] = Place(sourceMemory_[i].get(), drawn.src, i);
@@ -337,33 +343,36 @@ void Images::Prepare(const Case& drawn) {
 }
 
 reference::Job Images::Bind(const PlacedBlock* dst) const {
-  reference::Job job = {};
-  job.dst = case_.dst.record;
-  job.src = case_.src.record;
-  job.src.palette = palette_;
-  job.params = case_.params;
-  job.hasRect = case_.hasRect;
-  job.rect = case_.rect;
-  SetPlanes(case_.src, source_, job.srcPlanes, job.srcPitches);
-  SetPlanes(case_.dst, dst, job.dstPlanes, job.dstPitches);
-  return job;
+  const Case& drawn = job_.drawn;
+  reference::Job call = {};
+  call.dst = drawn.dst.record;
+  call.src = drawn.src.record;
+  call.src.palette = palette_;
+  call.params = drawn.params;
+  call.hasRect = drawn.hasRect;
+  call.rect = drawn.rect;
+  SetPlanes(drawn.src, source_, call.srcPlanes, call.srcPitches);
+  SetPlanes(drawn.dst, dst, call.dstPlanes, call.dstPitches);
+  if (job_.farSrcPitch != 0) call.srcPitches[0] = job_.farSrcPitch;
+  if (job_.farDstPitch != 0) call.dstPitches[0] = job_.farDstPitch;
+  return call;
 }
 
 void Images::RestoreProduct() {
-  for (int i = 0; i < case_.dst.blocks.count; ++i) {
+  for (int i = 0; i < job_.drawn.dst.blocks.count; ++i) {
     std::memcpy(product_[i].watched, before_[i].data(), before_[i].size());
   }
 }
 
 bool Images::ProductUnchanged() const {
-  for (int i = 0; i < case_.dst.blocks.count; ++i) {
+  for (int i = 0; i < job_.drawn.dst.blocks.count; ++i) {
     if (std::memcmp(product_[i].watched, before_[i].data(), before_[i].size()) != 0) return false;
   }
   return true;
 }
 
 bool Images::SourceUnchanged() const {
-  for (int i = 0; i < case_.src.blocks.count; ++i) {
+  for (int i = 0; i < job_.drawn.src.blocks.count; ++i) {
     if (std::memcmp(source_[i].watched, sourceBefore_[i].data(), sourceBefore_[i].size()) != 0) {
       return false;
     }
@@ -372,11 +381,11 @@ bool Images::SourceUnchanged() const {
 }
 
 std::string Images::Difference() const {
-  return differential::Difference(case_.dst, product_, model_);
+  return differential::Difference(job_.drawn.dst, product_, model_);
 }
 
 void Images::ExpectProduct() {
-  for (int i = 0; i < case_.dst.blocks.count; ++i) {
+  for (int i = 0; i < job_.drawn.dst.blocks.count; ++i) {
     std::memcpy(model_[i].watched, product_[i].watched, product_[i].watchedSize);
   }
 }

@@ -38,6 +38,9 @@ struct Job {
   bool hasImages = false;  // otherwise there is no memory to run it on, only to create its engine
   bool drawsNothing = false;  // as the library promises for what lies too far away
   bool isModelled = false;    // the reference converter says what comes out
+  // Taken for the pitch of the first plane when not 0: rows so far apart that no memory holds two.
+  int32_t farDstPitch = 0;
+  int32_t farSrcPitch = 0;
 };
 
 Job DrawJob(Input* input);
@@ -50,8 +53,8 @@ class Images {
  public:
   Images();
 
-  // Fills sources, palette and destinations with bytes that the case determines.
-  void Prepare(const differential::Case& drawn);
+  // Fills sources, palette and destinations with bytes that the job determines.
+  void Prepare(const Job& job);
 
   // The job on the destination that products draw on, or on the one of the model.
   reference::Job JobOnProduct() const { return Bind(product_); }
@@ -77,7 +80,7 @@ class Images {
   differential::PlacedBlock source_[3], product_[3], model_[3];
   std::vector<uint8_t> before_[3], sourceBefore_[3];
   const uint8_t* palette_ = nullptr;
-  differential::Case case_ = {};
+  Job job_;
 };
 
 }  // namespace fuzz

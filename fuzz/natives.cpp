@@ -55,12 +55,8 @@ jobject DrawBitmap(Input* input, Machine* machine) {
   const uint32_t width = uint32_t(input->Between(0, 60));
   const uint32_t height = uint32_t(input->Between(0, 60));
   const uint32_t padding = input->OneIn(3) ? uint32_t(input->Between(0, 37)) : 0;
-  constexpr int32_t kFormats[] = {ANDROID_BITMAP_FORMAT_RGB_565,
-                                  ANDROID_BITMAP_FORMAT_RGBA_4444,
-                                  ANDROID_BITMAP_FORMAT_A_8,
-                                  ANDROID_BITMAP_FORMAT_NONE,
-                                  9,
-                                  -1};
+  constexpr int32_t kFormats[] = {ANDROID_BITMAP_FORMAT_RGB_565, 7, ANDROID_BITMAP_FORMAT_A_8,
+                                  ANDROID_BITMAP_FORMAT_NONE,    9, -1};
   const int32_t format = input->OneIn(8) ? input->Pick(kFormats) : ANDROID_BITMAP_FORMAT_RGBA_8888;
   jobject reference = machine->BitmapArgument(width, height, width * 4 + padding, format);
   Bitmap& bitmap = machine->BitmapOf(reference);

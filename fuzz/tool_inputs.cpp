@@ -141,7 +141,7 @@ void ReadValues(Input* input) {
             "an empty region is accepted");
   } else if (kind == 2) {
     const kestrel::tools::Format format = kestrel::tools::ParseFormat(text);
-    Require(TotalBytes(LayOutPlanes(format.code, {1, 1})) > 0, "a format without bytes");
+    Require(TotalBytes(LayOutPlanes(format.code, Size{1, 1})) > 0, "a format without bytes");
     Require(!kestrel::tools::FormatText(format.code).empty(), "a format without a name");
   } else if (kind == 3) {
     const uint32_t standard = kestrel::tools::ParseStandard(text);

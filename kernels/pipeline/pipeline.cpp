@@ -38,10 +38,7 @@ class Pipeline {
       CopyPlanes();
       if (lumaDone_ && chromaDone_) return;
       if (ConvertRgbInPlace()) return;
-      // Nothing needs a buffer where pixels are in place on both sides: strips are whole rows then.
-      const bool whole = engine_.pathKind == PATH_YUV_TO_RGB && destination_.writer(0).inPlace() &&
-                         source_.PixelsLieInPlace(job_.rect.left, Width());
-      stripWidth_ = whole ? Width() : destination_.stripWidth();
+      if (ConvertYuvInPlace()) return;
       for (int32_t x = job_.rect.left; x < job_.rect.right; x += stripWidth_) {
         SelectColumns(x);
         for (int32_t r = job_.rect.top; r < job_.rect.bottom;) r += ConvertRows(r);
@@ -125,6 +122,29 @@ class Pipeline {
       chromaOfSeconds_ = !job_.has(kPairChroma) && uStep_ >= 1 && uStep_ <= 2 &&
                          (destination_.chromaCount() == 0 || uColumns_[0] + 1 >= uStep_);
     }
+  }
+
+  // YUV that is in place in the source becomes pixels in the order of the picture's rows, because
+  // strips would write a large picture in short pieces, far apart. Where pixels are in place in the
+  // destination too, rows need no buffer and no strips. False where that is not so, and in quarter
+  // turns.
+  bool ConvertYuvInPlace() {
+    PlaneWriter& writer = destination_.writer(0);
+    if (engine_.pathKind != PATH_YUV_TO_RGB || writer.tiles() ||
+        !source_.PixelsLieInPlace(job_.rect.left, Width())) {
+      return false;
+    }
+    if (writer.inPlace()) stripWidth_ = Width();
+    mostRows_ = writer.inPlace() ? INT32_MAX : PlaneWriter::kTileSize / stripWidth_;
+    for (int32_t r = job_.rect.top; r < job_.rect.bottom;) {
+      int rows = 0;
+      for (int32_t x = job_.rect.left; x < job_.rect.right; x += stripWidth_) {
+        SelectColumns(x);
+        rows = ConvertRows(r);  // the same for all strips
+      }
+      r += rows;
+    }
+    return true;
   }
 
   static int CommonStep(const int32_t* columns, int n) {
@@ -366,7 +386,8 @@ class Pipeline {
   // The number of rows done: rows that are in place on both sides are converted at once, and short
   // ones that are not are collected, because preparing to convert costs as much as many pixels.
   int YuvToRgb(int32_t r) {
-    const int room = destination_.RoomForRows(r, job_.rect.bottom - r);
+    const int32_t rest = job_.rect.bottom - r;
+    const int room = destination_.RoomForRows(r, rest < mostRows_ ? rest : mostRows_);
     const uint8_t* const y = source_.LumaInPlace(r);
     if (y != nullptr && source_.ChromaIsInPlace()) {
       const int rows = source_.RowsInPlace(r, room);
@@ -578,6 +599,7 @@ class Pipeline {
   Carry carry_ = {};
   FieldShifts carryShifts_ = {};
   int32_t stripWidth_ = 0;
+  int32_t mostRows_ = INT32_MAX;  // to convert at once
   int n_ = 0;
   bool lumaDone_ = false, chromaDone_ = false;   // by CopyPlanes
   int32_t uColumns_[kStrip], vColumns_[kStrip];  // loop columns, or columns of the strip

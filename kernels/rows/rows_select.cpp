@@ -14,6 +14,7 @@ namespace {
 // Bits of CPUID and of XGETBV.
 constexpr uint32_t kLeaf1Sse41 = 1u << 19;
 constexpr uint32_t kLeaf1SystemSavesState = 1u << 27;
+constexpr uint32_t kLeaf1Avx = 1u << 28;
 constexpr uint32_t kLeaf7Avx2 = 1u << 5;
 constexpr uint32_t kStateOfSseAndAvx = 6;
 
@@ -26,13 +27,16 @@ struct CpuFeatures {
 CpuFeatures AskCpu() {
   uint32_t a, b, c, d;
   CpuFeatures found = {false, false};
-  if (__get_cpuid(1, &a, &b, &c, &d) == 0) return found;
+  __cpuid(1, a, b, c, d);
   found.sse41 = (c & kLeaf1Sse41) != 0;
-  if ((c & kLeaf1SystemSavesState) == 0) return found;
+  constexpr uint32_t kWide = kLeaf1SystemSavesState | kLeaf1Avx;
+  if ((c & kWide) != kWide) return found;
   uint32_t state, high;
   __asm__("xgetbv" : "=a"(state), "=d"(high) : "c"(0));
   if ((state & kStateOfSseAndAvx) != kStateOfSseAndAvx) return found;
-  found.avx2 = __get_cpuid_count(7, 0, &a, &b, &c, &d) != 0 && (b & kLeaf7Avx2) != 0;
+  // A CPU with AVX has this leaf: the one that describes the state is a later one.
+  __cpuid_count(7, 0, a, b, c, d);
+  found.avx2 = (b & kLeaf7Avx2) != 0;
   return found;
 }
 

@@ -202,6 +202,16 @@ inline void Store4(uint8_t* p, Bytes a, Bytes b, Bytes c, Bytes d) {
   const uint8x16x4_t pixels = {{a.v, b.v, c.v, d.v}};
   vst4q_u8(p, pixels);
 }
+// There is one order only.
+inline Bytes InTurn(Bytes b) {
+  return b;
+}
+inline Words InTurn(Words w) {
+  return w;
+}
+inline void Store4InTurn(uint8_t* p, Bytes a, Bytes b, Bytes c, Bytes d) {
+  Store4(p, a, b, c, d);
+}
 inline PixelBytes Load3(const uint8_t* p) {
   const uint8x16x3_t pixels = vld3q_u8(p);
   return {{pixels.val[0]}, {pixels.val[1]}, {pixels.val[2]}, SetBytes(0)};

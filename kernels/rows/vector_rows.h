@@ -503,25 +503,31 @@ constexpr bool IsPairs(ChromaLayout layout) {
   return layout == ChromaLayout::kPairsOfAB || layout == ChromaLayout::kPairsOfBA;
 }
 
-template <YuvToRgbForm kForm, ChromaLayout kLayout>
+// Samples as the pixels of kPixel bytes are stored.
+template <int kPixel, typename Samples>
+inline Samples Ordered(Samples samples) {
+  return kPixel == 4 ? InTurn(samples) : samples;
+}
+
+template <YuvToRgbForm kForm, ChromaLayout kLayout, int kPixel>
 inline void LoadTerms(const ColourStage<kForm>& stage, const uint8_t* a, const uint8_t* b,
                       ChromaTerms<kForm>* low, ChromaTerms<kForm>* high) {
   if constexpr (!IsHalf(kLayout)) {
-    const WordsPair wideA = Widen(LoadBytes(a));
-    const WordsPair wideB = Widen(LoadBytes(b));
+    const WordsPair wideA = Widen(Ordered<kPixel>(LoadBytes(a)));
+    const WordsPair wideB = Widen(Ordered<kPixel>(LoadBytes(b)));
     *low = stage.Terms(wideA.low, wideB.low);
     *high = stage.Terms(wideA.high, wideB.high);
     return;
   }
   ChromaTerms<kForm> terms;
   if constexpr (IsPairs(kLayout)) {
-    const Words pairs = LoadWords(a);
+    const Words pairs = Ordered<kPixel>(LoadWords(a));
     const Words first = pairs & SetWords(0xFF);
     const Words second = ShiftRightUnsigned<8>(pairs);
     terms = kLayout == ChromaLayout::kPairsOfAB ? stage.Terms(first, second)
                                                 : stage.Terms(second, first);
   } else {
-    terms = stage.Terms(LoadHalf(a), LoadHalf(b));
+    terms = stage.Terms(Ordered<kPixel>(LoadHalf(a)), Ordered<kPixel>(LoadHalf(b)));
   }
 #pragma GCC unroll 5  // or the terms would go through memory
   for (int k = 0; k < ChromaTerms<kForm>::kCount; ++k) {
@@ -535,12 +541,17 @@ template <YuvToRgbForm kForm, int kPixel>
 inline void ConvertLine(const ColourStage<kForm>& stage, uint8_t* dst, const uint8_t* y,
                         const ChromaTerms<kForm>& low, const ChromaTerms<kForm>& high,
                         Bytes alpha) {
-  const WordsPair luma = Widen(LoadBytes(y));
+  const WordsPair luma = Widen(Ordered<kPixel>(LoadBytes(y)));
   const auto first = stage.Add(luma.low, low.term);
   const auto second = stage.Add(luma.high, high.term);
-  StorePixels<kPixel>(dst, stage.Clamp(first.low, second.low),
-                      stage.Clamp(first.middle, second.middle),
-                      stage.Clamp(first.high, second.high), alpha);
+  const Bytes channels[] = {stage.Clamp(first.low, second.low),
+                            stage.Clamp(first.middle, second.middle),
+                            stage.Clamp(first.high, second.high)};
+  if constexpr (kPixel == 4) {
+    Store4InTurn(dst, channels[0], channels[1], channels[2], alpha);
+  } else {
+    StorePixels<kPixel>(dst, channels[0], channels[1], channels[2], alpha);
+  }
 }
 
 // n pixels of each row, whole vectors of them.
@@ -559,7 +570,7 @@ void ConvertVectors(const void* colourStage, const PixelLines& lines, uint8_t al
     const uint8_t* b = lines.b + chromaRow * lines.bPitch;
     for (int i = 0; i < n; i += kBytes) {
       ChromaTerms<kForm> low, high;
-      LoadTerms<kForm, kLayout>(stage, a, b, &low, &high);
+      LoadTerms<kForm, kLayout, kPixel>(stage, a, b, &low, &high);
       ConvertLine<kForm, kPixel>(stage, dst, y, low, high, alpha);
       if (two) {
         ConvertLine<kForm, kPixel>(stage, dst + lines.dstPitch, y + lines.yPitch, low, high, alpha);

@@ -307,6 +307,25 @@ inline Quads Interleave4(Bytes a, Bytes b, Bytes c, Bytes d) {
   return {{KESTREL_SIMD(unpacklo_epi16)(ab0, cd0), KESTREL_SIMD(unpackhi_epi16)(ab0, cd0),
            KESTREL_SIMD(unpacklo_epi16)(ab1, cd1), KESTREL_SIMD(unpackhi_epi16)(ab1, cd1)}};
 }
+// Samples in the order in which Store4InTurn writes whole registers: both lanes of each hold
+// neighbouring pixels.
+inline Register InTurn(Register v) {
+#ifdef __AVX2__
+  return _mm256_permutevar8x32_epi32(v, _mm256_setr_epi32(0, 2, 4, 6, 1, 3, 5, 7));
+#else
+  return v;
+#endif
+}
+inline Bytes InTurn(Bytes b) {
+  return {InTurn(b.v)};
+}
+inline Words InTurn(Words w) {
+  return {InTurn(w.v)};
+}
+inline void Store4InTurn(uint8_t* p, Bytes a, Bytes b, Bytes c, Bytes d) {
+  const Quads quads = Interleave4(a, b, c, d);
+  for (int i = 0; i < 4; ++i) Store(p + kBytes * i, quads.v[i]);
+}
 inline void Store4(uint8_t* p, Bytes a, Bytes b, Bytes c, Bytes d) {
   const Quads quads = Interleave4(a, b, c, d);
   for (int i = 0; i < 4; ++i) StoreLanes(p, i, 4, quads.v[i]);
@@ -362,7 +381,9 @@ inline void StoreReversed(uint8_t* p, const uint8_t* src) {
                              : _mm_setr_epi8(12, 13, 14, 15, 8, 9, 10, 11, 4, 5, 6, 7, 0, 1, 2, 3));
   const Register v = KESTREL_SIMD(shuffle_epi8)(Load(src), order);
 #ifdef __AVX2__
-  Store(p, _mm256_permute4x64_epi64(v, 0x4E));
+  // By halves: whole vectors would lie across two cache lines more often than not.
+  Store16(p, HighLane(v));
+  Store16(p + 16, LowLane(v));
 #else
   Store(p, v);
 #endif
