@@ -272,11 +272,10 @@ void DrawImages(Input* input, Job* job) {
   const bool isGrey = drawn.dst.isKnown && drawn.dst.format.IsGrey();
   if (input->OneIn(32)) drawn.dst.nullSlot = input->Between(0, 2);
   if (input->OneIn(32)) drawn.src.nullSlot = input->Between(0, 2);
-  const bool hasNull = drawn.dst.nullSlot >= 0 || drawn.src.nullSlot >= 0;
-  // Whether grey output needs chroma planes, or one plane those of three, is nobody's promise.
+  // Whether grey output needs chroma planes is nobody's promise.
   job->isModelled = !isFar && !(IsGiven(params.srcRect) && IsEmpty(params.srcRect)) &&
-                    !(isGrey && drawn.src.nullSlot > 0) &&
-                    !(hasNull && (drawn.dst.nullSlot == 0 || drawn.src.nullSlot == 0));
+                    !(isGrey && drawn.src.nullSlot > 0) && drawn.dst.nullSlot != 0 &&
+                    drawn.src.nullSlot != 0;
   if (input->OneIn(48) && srcBottom > 1) {
     job->farSrcPitch = FarPitch(input, srcBottom);
     drawn.src.blocks.block[0].rows = 1;

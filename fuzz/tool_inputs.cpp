@@ -1,5 +1,5 @@
-// What the command-line tools read: Y4M and raw files, command lines, values of options. Everything
-// malformed must end in the error that the tools report.
+// What the command-line tools read: Y4M, raw, PNG and JPEG files, command lines, values of options.
+// Everything malformed must end in the error that the tools report.
 #include <sys/mman.h>
 #include <unistd.h>
 
@@ -106,6 +106,35 @@ void ReadRaw(Input* input) {
   ReadFrames(OpenRaw(file.path(), {code, false}, options).get());
 }
 
+uint32_t BigEndian(const std::string& bytes, size_t at, size_t count) {
+  uint32_t value = 0;
+  for (size_t i = 0; i < count; ++i) value = value << 8 | uint8_t(bytes[at + i]);
+  return value;
+}
+
+bool IsSmall(uint32_t width, uint32_t height) {
+  return uint64_t(width) * height <= 1 << 20;
+}
+
+// Pictures of millions of pixels cost time and show nothing more.
+void ReadPng(Input* input) {
+  const std::string bytes = input->Text(kMostBytes);
+  if (bytes.size() >= 24 && !IsSmall(BigEndian(bytes, 16, 4), BigEndian(bytes, 20, 4))) return;
+  const File file(bytes);
+  ReadFrames(kestrel::tools::OpenPng(file.path()).get());
+}
+
+void ReadJpeg(Input* input) {
+  const bool asYuv = input->OneIn(2);
+  const std::string bytes = input->Text(kMostBytes);
+  for (size_t at = 0; at + 9 <= bytes.size(); ++at) {  // whatever may be a start of frame
+    const bool isFrame = bytes[at] == '\xff' && (uint8_t(bytes[at + 1]) & 0xF0) == 0xC0;
+    if (isFrame && !IsSmall(BigEndian(bytes, at + 5, 2), BigEndian(bytes, at + 7, 2))) return;
+  }
+  const File file(bytes);
+  ReadFrames(kestrel::tools::OpenJpeg(file.path(), asYuv).get());
+}
+
 // Arguments are separated by line ends.
 void ReadCommandLine(Input* input) {
   std::vector<std::string> words = {"kestrel-convert"};
@@ -157,20 +186,9 @@ void ReadValues(Input* input) {
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
   Input input(data, size);
   try {
-    switch (input.Between(0, 3)) {
-      case 0:
-        ReadY4m(&input);
-        break;
-      case 1:
-        ReadRaw(&input);
-        break;
-      case 2:
-        ReadCommandLine(&input);
-        break;
-      default:
-        ReadValues(&input);
-        break;
-    }
+    constexpr void (*kReaders[])(Input*) = {ReadY4m, ReadRaw,  ReadCommandLine,
+                                            ReadPng, ReadJpeg, ReadValues};
+    input.Pick(kReaders)(&input);
   } catch (const ToolError& error) {
     Require(error.what()[0] != '\0', "an error without a message");
     Require(error.code() != kestrel::tools::ExitCode::kSuccess, "an error that is a success");

@@ -40,26 +40,25 @@ int ChooseI420ToI422(const Question& q) {
   }
 }
 
+// The first of the table's first 58 lines that accepts the job. Levels are never changed here.
+int ChooseYuvToYuv(const Question& q) {
+  if (q.engine.needsLevelTable != 0 || q.engine.pathKind != PATH_YUV_TO_YUV) return kDeclined;
+  for (int line = id::I422_TO_I420_NORESAMPLE_4x4; line <= id::YUYVtoYUYVFast_N_RESAMPLE_R0_4x4;
+       ++line) {
+    const KernelRow& row = kKernels[line];
+    if (q.fromTo(row.sources, row.destinations) && Accepts(row, q.engine)) return line;
+  }
+  return kDeclined;
+}
+
 }  // namespace
 
 extern "C" {
 
-// The first of the table's first 58 lines that accepts the job. Levels are never changed here.
 uint32_t YUV2YUV_Fast(const MRECT* rect, const int32_t* dstPitches, const int32_t* srcPitches,
                       uint8_t* const* dstPlanes, const uint8_t* const* srcPlanes,
                       const EngineContext* context) {
-  if (context == nullptr) return KESTREL_BAD_ARGUMENT;
-  if (context->needsLevelTable != 0 || context->pathKind != PATH_YUV_TO_YUV) {
-    return KESTREL_UNSUPPORTED;
-  }
-  for (int line = id::I422_TO_I420_NORESAMPLE_4x4; line <= id::YUYVtoYUYVFast_N_RESAMPLE_R0_4x4;
-       ++line) {
-    if (RunKernel(kKernels[line], rect, dstPitches, srcPitches, dstPlanes, srcPlanes, context) ==
-        KESTREL_OK) {
-      return KESTREL_OK;
-    }
-  }
-  return KESTREL_UNSUPPORTED;
+  return Dispatch(ChooseYuvToYuv, rect, dstPitches, srcPitches, dstPlanes, srcPlanes, context);
 }
 
 uint32_t I420_To_I422_Fast(const MRECT* rect, const int32_t* dstPitches, const int32_t* srcPitches,
