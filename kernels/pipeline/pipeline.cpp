@@ -21,6 +21,7 @@ class Pipeline {
         dithers_(clampedCarry_ || (engine_.dither != 0 && engine_.pathKind == PATH_YUV_TO_RGB &&
                                    !job.has(kNoDither))) {
     stripWidth_ = destination_.stripWidth();
+    keepsPixels_ = KeepsPixels();
     PrepareCarry();
     PrepareSums();
   }
@@ -161,7 +162,7 @@ class Pipeline {
     const bool unit = engine_.stepX == 0x10000 && engine_.stepY == 0x10000;
     const bool keepsYuv = engine_.pathKind == PATH_YUV_TO_YUV && engine_.dstLayout.isPacked == 0 &&
                           !destination_.exchangesLuma();
-    if (!unit || !(keepsYuv || KeepsPixels())) return;
+    if (!unit || !(keepsYuv || keepsPixels_)) return;
     if (job_.mapsLevels() && !destination_.AllInPlace()) return;
     const PlaneRun luma = destination_.LumaRun();
     if (luma.n > 0) {
@@ -459,8 +460,12 @@ class Pipeline {
       const Destination::PixelRun to = destination_.StartPixels(r, 1);
       if (to.pixels == nullptr) return;
       const PixelFormat& from = source_.pixelFormat();
-      rows_.repackPixels(to.pixels, pixels + ptrdiff_t{to.first} * from.bytes, from,
-                         destination_.pixelFormat(), to.n);
+      const uint8_t* const first = pixels + ptrdiff_t{to.first} * from.bytes;
+      if (keepsPixels_) {
+        memcpy(to.pixels, first, size_t(to.n) * size_t(from.bytes));
+      } else {
+        rows_.repackPixels(to.pixels, first, from, destination_.pixelFormat(), to.n);
+      }
       destination_.FinishPixels();
       return;
     }
@@ -595,6 +600,7 @@ class Pipeline {
   Source source_;
   Destination destination_;
   bool clampedCarry_, dithers_;
+  bool keepsPixels_;  // RGB to RGB of the same format
   kestrel::YuvToRgb colour_ = {};
   Carry carry_ = {};
   FieldShifts carryShifts_ = {};
