@@ -253,22 +253,28 @@ void Destination::SelectColumns(int32_t x, int n) {
     }
     first = i + 1;
   }
-  writesGroups_ = StripIsGroups();
+  writesGroups_ = firstPixel_ == 0 && pixelEnd_ == n_ &&
+                  AreGroups(int64_t(x_) - job_.rect.left, n_, firstChroma_, chromaCount_);
 }
 
-// Luma and chroma of the strip begin in the same group of four bytes and end in the same.
-bool Destination::StripIsGroups() const {
+// Whether samples of packed 4:2:2 begin in the same group of four bytes and end in the same.
+bool Destination::AreGroups(int64_t lumaColumn, int lumaCount, int64_t chromaColumn,
+                            int chromaCount) const {
   const PlaneLayout& layout = engine_.dstLayout;
   const bool packed = layout.isPacked != 0 && layout.step[0] == 2 && planes_[0].columnStep == 2;
-  if (!packed || exchange_ != LumaExchange::kNone || chromaCount_ == 0 || firstPixel_ != 0 ||
-      pixelEnd_ != n_ || n_ != 2 * chromaCount_) {
+  if (!packed || exchange_ != LumaExchange::kNone || chromaCount <= 0 ||
+      lumaCount != 2 * chromaCount) {
     return false;
   }
-  const uint8_t* const luma = planes_[0].At(int64_t(x_) - job_.rect.left, 0);
-  const uint8_t* const group = luma - layout.yOffset;
-  return planes_[1].At(firstChroma_, 0) == group + layout.uOffset &&
-         planes_[2].At(firstChroma_, 0) == group + layout.vOffset && layout.yOffset < 2 &&
+  const uint8_t* const group = planes_[0].At(lumaColumn, 0) - layout.yOffset;
+  return planes_[1].At(chromaColumn, 0) == group + layout.uOffset &&
+         planes_[2].At(chromaColumn, 0) == group + layout.vOffset && layout.yOffset < 2 &&
          (layout.uOffset ^ layout.vOffset) == 2 && ((layout.uOffset ^ layout.yOffset) & 1) == 1;
+}
+
+uint8_t* Destination::GroupsAt(const PlaneRun& luma, const PlaneRun& chroma, int32_t r) const {
+  if (!AreGroups(luma.column, luma.n, chroma.column, chroma.n)) return nullptr;
+  return planes_[0].At(luma.column, int64_t(r) - job_.rect.top) - engine_.dstLayout.yOffset;
 }
 
 // All writers store together and in order: in one packed layout a chroma sample takes the place of

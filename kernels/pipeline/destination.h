@@ -140,6 +140,8 @@ class Destination {
   };
   PlaneRun LumaRun() const;
   PlaneRun ChromaRun() const;
+  // Where the first group of a row of packed 4:2:2 begins; null unless the runs are whole groups.
+  uint8_t* GroupsAt(const PlaneRun& luma, const PlaneRun& chroma, int32_t r) const;
   bool ContainsLumaRow(int32_t r) const {
     return planes_[0].rows.Contains(int64_t(r) - job_.rect.top);
   }
@@ -176,7 +178,7 @@ class Destination {
   int32_t LastXOfChroma(int64_t column) const;
   int64_t BlockOfRow(int64_t r) const;
   bool WritesChroma(int32_t r, bool ofLastRow) const;
-  bool StripIsGroups() const;
+  bool AreGroups(int64_t lumaColumn, int lumaCount, int64_t chromaColumn, int chromaCount) const;
   void MakeRoom(int writer, int64_t column, int64_t row, int n, int runs = 1);
   void PutChromaPlane(int plane, int32_t r, const uint8_t* samples);
 

@@ -36,10 +36,11 @@ class Pipeline {
         }
       }
     } else {
+      if (CopyGroups()) return;
       CopyPlanes();
       if (lumaDone_ && chromaDone_) return;
       if (ConvertRgbInPlace()) return;
-      if (ConvertYuvInPlace()) return;
+      if (ConvertYuvByRows()) return;
       for (int32_t x = job_.rect.left; x < job_.rect.right; x += stripWidth_) {
         SelectColumns(x);
         for (int32_t r = job_.rect.top; r < job_.rect.bottom;) r += ConvertRows(r);
@@ -125,18 +126,19 @@ class Pipeline {
     }
   }
 
-  // YUV that is in place in the source becomes pixels in the order of the picture's rows, because
-  // strips would write a large picture in short pieces, far apart. Where pixels are in place in the
-  // destination too, rows need no buffer and no strips. False where that is not so, and in quarter
-  // turns.
-  bool ConvertYuvInPlace() {
+  // YUV at 1:1 becomes pixels in the order of the picture's rows, because strips would read and
+  // write a large picture in short pieces, far apart; selecting columns costs nothing there. Where
+  // pixels are in place on both sides rows need no buffer and no strips. False where that is not
+  // so, and in quarter turns.
+  bool ConvertYuvByRows() {
     PlaneWriter& writer = destination_.writer(0);
-    if (engine_.pathKind != PATH_YUV_TO_RGB || writer.tiles() ||
-        !source_.PixelsLieInPlace(job_.rect.left, Width())) {
+    if (engine_.pathKind != PATH_YUV_TO_RGB || writer.tiles() || engine_.srcSubsample[1] > 2 ||
+        !source_.LumaAdvances(job_.rect.left, Width())) {
       return false;
     }
-    if (writer.inPlace()) stripWidth_ = Width();
-    mostRows_ = writer.inPlace() ? INT32_MAX : PlaneWriter::kTileSize / stripWidth_;
+    const bool inPlace = source_.PixelsLieInPlace(job_.rect.left, Width());
+    if (inPlace && writer.inPlace()) stripWidth_ = Width();
+    mostRows_ = !inPlace ? 1 : writer.inPlace() ? INT32_MAX : PlaneWriter::kTileSize / stripWidth_;
     for (int32_t r = job_.rect.top; r < job_.rect.bottom;) {
       int rows = 0;
       for (int32_t x = job_.rect.left; x < job_.rect.right; x += stripWidth_) {
@@ -177,6 +179,30 @@ class Pipeline {
     chromaDone_ = !destination_.hasChroma();
     // The block about column 0 is wider than the others.
     if (!chromaDone_ && job_.rect.left >= 0) chromaDone_ = CopyChroma(destination_.ChromaRun());
+  }
+
+  // Packed 4:2:2 to the same layout, untransformed: groups of two pixels are copied whole.
+  bool CopyGroups() {
+    const bool unit = engine_.stepX == 0x10000 && engine_.stepY == 0x10000;
+    if (!unit || engine_.pathKind != PATH_YUV_TO_YUV || job_.mapsLevels() ||
+        engine_.srcLayout.code != engine_.dstLayout.code || job_.rect.left < 0 ||
+        engine_.swapXY != 0) {
+      return false;
+    }
+    const PlaneRun luma = destination_.LumaRun();
+    if (luma.n <= 0 || !destination_.hasChroma()) return false;
+    const PlaneRun chroma = destination_.ChromaRun();
+    const bool inPhase = chroma.n > 0 && chroma.firstX == luma.firstX + 1 &&
+                         source_.LumaAdvances(luma.firstX, luma.n) &&
+                         source_.ColumnOf(luma.firstX) % 2 == 0;
+    if (!inPhase || destination_.GroupsAt(luma, chroma, job_.rect.top) == nullptr) return false;
+    for (int32_t r = job_.rect.top; r < job_.rect.bottom; ++r) {
+      if (!destination_.ContainsLumaRow(r)) continue;
+      const uint8_t* const from =
+          source_.LumaAt(luma.firstX, source_.SourceRow(r, 1)) - engine_.srcLayout.yOffset;
+      memcpy(destination_.GroupsAt(luma, chroma, r), from, size_t{2} * size_t(luma.n));
+    }
+    return true;
   }
 
   // Whether pixels of RGB keep every bit.

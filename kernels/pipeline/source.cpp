@@ -154,6 +154,11 @@ PixelChroma Source::ChromaOfPixels(int32_t r, uint8_t* intoU, uint8_t* intoV) {
                job_.srcPitches[2], job_.engine.srcSubsample[4] == 2 ? 1 : 0},
               phase_};
     case PixelChromaRead::kStrided:
+      // In packed 4:2:2 every other byte is chroma: U and V in turn.
+      if (chromaU_.step == 4 && (v - u == 2 || u - v == 2)) {
+        rows_.readStrided(packed_, (u < v ? u : v) + start, 2, 2 * chromaCount_);
+        return {{packed_ + (u < v ? 0 : 1), packed_ + (u < v ? 1 : 0), shift_, 2, 0, 0, 0}, phase_};
+      }
       rows_.readStrided(intoU, u + start, chromaU_.step, chromaCount_);
       rows_.readStrided(intoV, v + start, chromaU_.step, chromaCount_);
       return {{intoU, intoV, shift_, 1, 0, 0, 0}, phase_};

@@ -56,6 +56,7 @@ class Source {
   bool ChromaLiesInPlace(int32_t firstX, int32_t lastX, int32_t n) const;
   // 1 or 2 when chroma lies in pairs: the component that comes first.
   int chromaPairs() const;
+  int32_t ColumnOf(int32_t x) const { return columnPositions_.At(x).first; }
   const uint8_t* LumaAt(int32_t x, int32_t row) const;
   const uint8_t* ChromaAt(int plane, int32_t x, int32_t row) const;
   int32_t SourceRow(int32_t r, uint32_t factor) const { return rowPositions_.At(r, factor).first; }
