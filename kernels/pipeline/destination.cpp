@@ -149,8 +149,10 @@ DestinationPlane Destination::Plane(int i) const {
   const bool mirrorY = c.mirrorY != 0;
   const int64_t startX = mirrorX ? int64_t(region.left) + region.right - left - 1 : left;
   const int64_t startY = mirrorY ? int64_t(region.top) + region.bottom - top - 1 : top;
-  PlaneAxis across = {startX / int32_t(c.dstPlaneFactors[3 + i]), mirrorX ? -1 : 1, INT64_MAX};
-  const PlaneAxis down = {startY / int32_t(c.dstPlaneFactors[6 + i]), mirrorY ? -1 : 1, INT64_MAX};
+  PlaneAxis across = {startX / int32_t(c.dstPlaneFactors[3 + i]), mirrorX ? -1 : 1,
+                      PlaneAxis::kNoLimit};
+  const PlaneAxis down = {startY / int32_t(c.dstPlaneFactors[6 + i]), mirrorY ? -1 : 1,
+                          PlaneAxis::kNoLimit};
   if (i == 0 && exchange_ != LumaExchange::kNone) {
     // A row of pairs ends with the pair that holds its last pixel.
     const int64_t width = int64_t(swap ? r.bottom : r.right) - left;

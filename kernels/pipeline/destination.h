@@ -13,7 +13,9 @@ namespace kestrel {
 struct PlaneAxis {
   int64_t origin = 0;
   int32_t direction = 1;
-  int64_t limit = int64_t{1} << 40;  // none
+  int64_t limit = kNoLimit;
+
+  static constexpr int64_t kNoLimit = int64_t{1} << 40;  // sums with coordinates do not overflow
 
   bool Contains(int64_t k) const {
     const int64_t coordinate = origin + direction * k;
