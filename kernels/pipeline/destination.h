@@ -21,11 +21,12 @@ struct PlaneAxis {
     const int64_t coordinate = origin + direction * k;
     return coordinate >= 0 && coordinate < limit;
   }
-  // Takes off what is outside at both ends of samples [*first, *end).
+  // Takes off what is outside at both ends of samples [*first, *end); leaves an empty run between
+  // them when that is all.
   void Clip(int64_t* first, int64_t* end) const {
     const int64_t inside = direction > 0 ? -origin : origin - limit + 1;
-    if (*first < inside) *first = inside;
-    if (*end > inside + limit) *end = inside + limit;
+    if (*first < inside) *first = inside < *end ? inside : *end;
+    if (*end > inside + limit) *end = inside + limit > *first ? inside + limit : *first;
   }
 };
 
