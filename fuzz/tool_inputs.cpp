@@ -145,6 +145,7 @@ void ReadCommandLine(Input* input) {
     at = end + 1;
   }
   std::vector<const char*> argv;
+  argv.reserve(words.size() + 1);
   for (const std::string& word : words) argv.push_back(word.c_str());
   argv.push_back(nullptr);
   kestrel::tools::Options options;

@@ -39,6 +39,7 @@ struct BufferLayout {
     kVFirst
   } kind;
   uint8_t horizontal, vertical;  // chroma factors
+  bool vFirst = false;           // planar, V in front of U
 
   bool hasChroma() const { return kind == kPlanar || kind == kUFirst || kind == kVFirst; }
   bool roundsUp() const { return hasChroma() || kind == kGrey; }
@@ -68,8 +69,9 @@ BufferLayout CommonLayout(uint32_t format) {
     case FORMAT_GRAY8 | kFull:
       return {BufferLayout::kGrey, 0, 0};
     case FORMAT_I420:
-    case FORMAT_YV12:
       return {BufferLayout::kPlanar, 2, 2};
+    case FORMAT_YV12:
+      return {BufferLayout::kPlanar, 2, 2, true};
     case FORMAT_I422:
     case FORMAT_I422 | kFull:
       return {BufferLayout::kPlanar, 2, 1};
@@ -140,7 +142,11 @@ uint64_t BlockSize(const BufferLayout& layout, const Pitches& pitches, int64_t h
   if (layout.hasChroma()) {
     const uint64_t chromaRows = rows / layout.vertical;
     size += chromaRows * uint64_t(pitches.of[1]);
-    if (layout.kind == BufferLayout::kPlanar) size += chromaRows * uint64_t(pitches.of[2]);
+    // Engines walk the U plane with pitch 1 wherever it is: in slot 2 when V comes first.
+    const bool longer = layout.vFirst && pitches.of[1] > pitches.of[2];
+    if (layout.kind == BufferLayout::kPlanar) {
+      size += chromaRows * uint64_t(pitches.of[longer ? 1 : 2]);
+    }
   }
   return size;
 }

@@ -247,6 +247,8 @@ TEST_F(Buffers, KeepThreeGivenPitches) {
     uint32_t size;
     int32_t plane1, plane2;
   } rows[] = {{FORMAT_I420, 64 * 200 + 32 * 90 + 32 * 80, 64 * 200, 64 * 200 + 32 * 90},
+              // V comes first: the U plane, in slot 2, is walked with pitch 1.
+              {FORMAT_YV12, 64 * 200 + 32 * 90 + 32 * 90, 64 * 200, 64 * 200 + 32 * 90},
               {FORMAT_I422, 64 * (200 + 90 + 80), 64 * 200, 64 * 200 + 64 * 90},
               {FORMAT_I440, 64 * 200 + 32 * 90 + 32 * 80, 64 * 200, 64 * 200 + 32 * 90},
               {FORMAT_I444, 64 * (200 + 90 + 80), 64 * 200, 64 * 200 + 64 * 90},
