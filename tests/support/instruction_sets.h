@@ -5,6 +5,7 @@
 #ifndef KESTREL_TESTS_SUPPORT_INSTRUCTION_SETS_H
 #define KESTREL_TESTS_SUPPORT_INSTRUCTION_SETS_H
 
+#include <ostream>
 #include <string>
 #include <vector>
 
@@ -16,6 +17,10 @@ struct InstructionSet {
   std::string name;
   const KestrelRowOps* rows;  // null: as creation selects
 };
+
+inline void PrintTo(const InstructionSet& set, std::ostream* out) {
+  *out << set.name;
+}
 
 // The fastest first.
 const std::vector<InstructionSet>& InstructionSets();
