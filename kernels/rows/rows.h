@@ -1,7 +1,7 @@
 // Row operations: plain functions on a run of n samples or pixels. They know nothing of engines,
 // images or rectangles, never touch a byte beyond the runs they are given, and every instruction
-// set's version gives the same bytes. Source and destination runs do not overlap, except that the
-// destination of an operation on bytes may be one of its sources.
+// set's version gives the same bytes. Source and destination runs do not overlap, except that
+// blendColumns, blendRows, mapLevels and narrowWithCarry may write over one of their sources.
 #ifndef KESTREL_KERNELS_ROWS_ROWS_H
 #define KESTREL_KERNELS_ROWS_ROWS_H
 
@@ -171,7 +171,8 @@ struct KestrelRowOps {
                        const kestrel::YuvToRgbWide& sums, int n);
   void (*yuvToRgbCarry)(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u, const uint8_t* v,
                         const kestrel::YuvToRgbWide& sums, kestrel::Carry* carry, int n);
-  // Whole packed pixels.
+  // Whole packed pixels. Fields of 16-bit pixels are narrowed as the sums say; what the six-bit
+  // form gives for them, and all that other fields narrower than 8 bits get, is truncated.
   void (*yuvToPixels)(const kestrel::PixelRows& rows, const kestrel::ChromaRows& chroma,
                       const kestrel::YuvToRgb& colour, const kestrel::PixelFormat& format,
                       kestrel::AlphaFill alpha, int n);
