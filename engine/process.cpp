@@ -74,6 +74,18 @@ void DispatchBand(const PassEngine& engine, const MRECT& band) {
                             engine.context);
 }
 
+// Quarter turns are cut into bands, which show where remainders are carried, where chroma shares
+// samples across a border, and in what begins anew with every odd row. Whole bytes of RGB show none
+// of that: they may come as one piece, whose kernel knows best how to walk it.
+bool BandsShow(const PassEngine& engine, const MRECT& rect) {
+  const EngineContext& c = *engine.context;
+  const uint32_t* bits = c.dstChannelSize;
+  const bool wholeBytes =
+      c.dstFormat.code == CODE_RGB && bits[0] == 8 && bits[1] == 8 && bits[2] == 8;
+  const bool evenRows = (int64_t(rect.bottom) - rect.top) % 2 == 0;
+  return !wholeBytes || !evenRows || c.dither != 0 || rect.left < 0 || rect.top < 0;
+}
+
 int32_t RoundUpTowardZero(int32_t value, int32_t grid) {
   return SaturateToInt32((int64_t(value) + grid - 1) / grid * grid);
 }
@@ -217,7 +229,7 @@ uint32_t MPProcessRect(PassEngine* engine, uint8_t* const* dstPlanes, const MREC
   // above row 0 draws nothing.
   int32_t done = 0;
   int32_t top = rect.top;
-  if (engine->swapXY != 0) {
+  if (engine->swapXY != 0 && BandsShow(*engine, rect)) {
     const int32_t band = engine->bandSelector == 4 ? 64 : 32;
     for (; int64_t(rect.bottom) - top > band; top += band) {
       done = top + band;

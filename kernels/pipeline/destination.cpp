@@ -120,6 +120,7 @@ Destination::Destination(const Job& job)
     writers_[1].Set(planes_[1], 1, tiles, buffer_ + kPlane, &rows_);
     writers_[2].Set(planes_[2], 1, tiles, buffer_ + 2 * kPlane, &rows_);
   }
+  order_ = OrderOfPixels();
   if (job.has(kPairChroma)) {
     // A mirrored walk meets the pixel that is first in memory last.
     const bool firstInMemoryIsLast = engine_.mirrorX != 0;
@@ -172,6 +173,15 @@ DestinationPlane Destination::Plane(int i) const {
     plane.rows = across;
   }
   return plane;
+}
+
+Destination::Order Destination::OrderOfPixels() const {
+  const ptrdiff_t unit = pixels_.bytes;
+  if (engine_.pathKind != PATH_YUV_TO_RGB) return Order::kWalk;
+  if (engine_.swapXY == 0) return planes_[0].columnStep == -unit ? Order::kMirrored : Order::kWalk;
+  return planes_[0].rowStep == unit    ? Order::kTurned
+         : planes_[0].rowStep == -unit ? Order::kTurnedBackwards
+                                       : Order::kWalk;
 }
 
 int64_t Destination::ChromaColumn(int32_t x) const {
@@ -351,16 +361,28 @@ int Destination::RoomForRows(int32_t r, int most) const {
   int64_t end = row + most;
   planes_[0].rows.Clip(&first, &end);
   if (n <= 0 || first > row || end - row < 2) return 1;
+  if (order_ != Order::kWalk) return int(end - row);
   const int64_t column = int64_t(x_) + firstPixel_ - job_.rect.left;
   return writers_[0].Room(column, row, n, int(end - row));
+}
+
+Destination::PixelRun Destination::PlacePixels(int32_t r, int rows) const {
+  const DestinationPlane& plane = planes_[0];
+  const int64_t row = int64_t(r) - job_.rect.top;
+  const int n = pixelEnd_ - firstPixel_;
+  if (!IsInside(row, rows)) return {nullptr, 0, 0, 0};
+  const int64_t column = int64_t(x_) + firstPixel_ - job_.rect.left;
+  if (order_ == Order::kMirrored) {
+    return {plane.At(column + n - 1, row), plane.rowStep, firstPixel_, n};
+  }
+  const int64_t leftmost = order_ == Order::kTurnedBackwards ? row + rows - 1 : row;
+  return {plane.At(column, leftmost), plane.columnStep, firstPixel_, n};
 }
 
 Destination::PixelRun Destination::StartPixels(int32_t r, int rows) {
   const int64_t row = int64_t(r) - job_.rect.top;
   const int n = pixelEnd_ - firstPixel_;
-  const bool inside =
-      n > 0 && planes_[0].rows.Contains(row) && planes_[0].rows.Contains(row + rows - 1);
-  if (!inside) return {nullptr, 0, 0, 0};
+  if (!IsInside(row, rows)) return {nullptr, 0, 0, 0};
   const int64_t column = int64_t(x_) + firstPixel_ - job_.rect.left;
   MakeRoom(0, column, row, n, rows);
   uint8_t* const pixels = writers_[0].Start(column, row, n, rows);

@@ -3,7 +3,7 @@
 #ifndef KESTREL_KERNELS_PIPELINE_DESTINATION_H
 #define KESTREL_KERNELS_PIPELINE_DESTINATION_H
 
-#include "kernels/pipeline/job.h"
+#include "kernels/pipeline/arranged_samples.h"
 
 namespace kestrel {
 
@@ -160,6 +160,15 @@ class Destination {
 
   // RGB. Memory for the pixels of some rows; null when they are outside the image.
   PixelRun StartPixels(int32_t r, int rows);
+  // Where the pixels of YUV have another order than the walk they are written as they lie, from
+  // samples in that order.
+  enum class Order { kWalk, kMirrored, kTurned, kTurnedBackwards };
+  Order pixelOrder() const { return order_; }
+  // The destination's memory for some rows of the strip: the first pixel in that order, and the
+  // pitch of its rows. (`first` and `n` still count columns of the strip.)
+  PixelRun PlacePixels(int32_t r, int rows) const;
+  // For samples in that order.
+  uint8_t* arrangingMemory() { return buffer_; }
   // How many of `most` rows from r on one StartPixels can be for.
   int RoomForRows(int32_t r, int most) const;
   void FinishPixels() { writers_[0].Finish(); }
@@ -177,6 +186,11 @@ class Destination {
   enum class LumaExchange { kNone, kColumns, kRows };
 
   DestinationPlane Plane(int i) const;
+  Order OrderOfPixels() const;
+  bool IsInside(int64_t row, int rows) const {
+    return pixelEnd_ > firstPixel_ && planes_[0].rows.Contains(row) &&
+           planes_[0].rows.Contains(row + rows - 1);
+  }
   int64_t ChromaColumn(int32_t x) const;
   int32_t LastXOfChroma(int64_t column) const;
   int64_t BlockOfRow(int64_t r) const;
@@ -196,6 +210,7 @@ class Destination {
   AlphaFill alphaFill_ = {~0u, 0};  // the engine's alpha, for sources that have none
   bool hasChroma_;
   LumaExchange exchange_;
+  Order order_ = Order::kWalk;
   // Which pixel of a chroma block gives U and V: its last in loop order, or with pair chroma one
   // its first and the other its last, by their order in memory.
   bool uOfLastColumn_ = true, vOfLastColumn_ = true;
@@ -209,7 +224,9 @@ class Destination {
   int64_t firstChroma_ = 0;                      // plane column of the first chroma sample
   int32_t uColumns_[kStrip], vColumns_[kStrip];  // loop columns
   int firstPixel_ = 0, pixelEnd_ = 0;            // columns of the strip that are inside plane 0
-  uint8_t buffer_[4 * PlaneWriter::kTileSize];   // of all writers; planes of YUV share it
+  // Of all writers (planes of YUV share it), or of samples that are arranged.
+  uint8_t buffer_[ArrangedSamples::kSize];
+  static_assert(sizeof(buffer_) >= 4 * PlaneWriter::kTileSize, "pixels have up to four bytes");
 };
 
 }  // namespace kestrel

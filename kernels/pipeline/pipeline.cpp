@@ -17,6 +17,7 @@ class Pipeline {
         engine_(job.engine),
         source_(job),
         destination_(job),
+        arranged_(rows_, destination_.arrangingMemory()),
         clampedCarry_(job.has(kClampedCarry) && (engine_.dither != 0 || !job.has(kCarryIfAsked))),
         dithers_(clampedCarry_ || (engine_.dither != 0 && engine_.pathKind == PATH_YUV_TO_RGB &&
                                    !job.has(kNoDither))) {
@@ -52,6 +53,11 @@ class Pipeline {
 
  private:
   using PlaneRun = Destination::PlaneRun;
+  using PixelOrder = Destination::Order;
+
+  // Samples of short rows that are converted at once, and rows that are mirrored at once.
+  static constexpr int kCollected = 1024;
+  static constexpr int kMirroredRows = ArrangedSamples::kPixels / kStrip;
 
   // Where a loop row of a plane is on both sides.
   struct PlaneRow {
@@ -138,7 +144,11 @@ class Pipeline {
     }
     const bool inPlace = source_.PixelsLieInPlace(job_.rect.left, Width());
     if (inPlace && writer.inPlace()) stripWidth_ = Width();
-    mostRows_ = !inPlace ? 1 : writer.inPlace() ? INT32_MAX : PlaneWriter::kTileSize / stripWidth_;
+    mostRows_ = !inPlace           ? 1
+                : writer.inPlace() ? INT32_MAX
+                : destination_.pixelOrder() == PixelOrder::kMirrored
+                    ? kMirroredRows
+                    : PlaneWriter::kTileSize / stripWidth_;
     for (int32_t r = job_.rect.top; r < job_.rect.bottom;) {
       int rows = 0;
       for (int32_t x = job_.rect.left; x < job_.rect.right; x += stripWidth_) {
@@ -414,35 +424,119 @@ class Pipeline {
   // ones that are not are collected, because preparing to convert costs as much as many pixels.
   int YuvToRgb(int32_t r) {
     const int32_t rest = job_.rect.bottom - r;
-    const int room = destination_.RoomForRows(r, rest < mostRows_ ? rest : mostRows_);
+    int most = destination_.RoomForRows(r, rest < mostRows_ ? rest : mostRows_);
+    switch (destination_.pixelOrder()) {
+      case PixelOrder::kTurned:
+      case PixelOrder::kTurnedBackwards:
+        return TurnRows(r, most);
+      case PixelOrder::kMirrored: {
+        if (most > kMirroredRows) most = kMirroredRows;
+        const SampleRows rows = ReadRows(r, most);
+        const Destination::PixelRun run = destination_.PlacePixels(r, rows.rows);
+        if (run.pixels != nullptr) {
+          ConvertPixels(run, arranged_.Mirror(FromColumn(rows, run.first), run.n), run.n);
+        }
+        return rows.rows;
+      }
+      default: {
+        const SampleRows rows = ReadRows(r, most);
+        const Destination::PixelRun run = destination_.StartPixels(r, rows.rows);
+        if (run.pixels != nullptr) {
+          ConvertPixels(run, FromColumn(rows, run.first), run.n);
+          destination_.FinishPixels();
+        }
+        return rows.rows;
+      }
+    }
+  }
+
+  // Up to `most` rows from r on.
+  SampleRows ReadRows(int32_t r, int most) {
     const uint8_t* const y = source_.LumaInPlace(r);
     if (y != nullptr && source_.ChromaIsInPlace()) {
-      const int rows = source_.RowsInPlace(r, room);
-      ConvertPixels(r, {nullptr, 0, y, source_.pitch(0), rows}, source_.ChromaOfPixels(r));
-      return rows;
+      const int rows = source_.RowsInPlace(r, most);
+      return {y, source_.pitch(0), rows, source_.ChromaOfPixels(r)};
     }
-    const int collected = kStrip / n_ < room ? kStrip / n_ : room;
-    if (collected < 2) {
-      ConvertPixels(r, {nullptr, 0, y != nullptr ? y : source_.Luma(r), 0, 1},
-                    source_.ChromaOfPixels(r));
-      return 1;
-    }
-    PixelChroma chroma = {};
-    for (int i = 0; i < collected; ++i) {
-      uint8_t* const into = luma_ + ptrdiff_t{i} * n_;
+    if (most >= 2 && kCollected / n_ >= 2) return CollectRows(r, most);
+    return {y != nullptr ? y : source_.Luma(r), 0, 1, source_.ChromaOfPixels(r)};
+  }
+
+  SampleRows CollectRows(int32_t r, int most) {
+    const int rows = kCollected / n_ < most ? kCollected / n_ : most;
+    SampleRows collected = {collected_[0], n_, rows, {}};
+    for (int i = 0; i < rows; ++i) {
+      uint8_t* const into = collected_[0] + ptrdiff_t{i} * n_;
       const uint8_t* const luma = source_.Luma(r + i, into);
       if (luma != into) memcpy(into, luma, size_t(n_));
       const PixelChroma row = CollectChroma(r + i, i);
-      if (i == 0) chroma = row;
+      if (i == 0) collected.chroma = row;
     }
-    ConvertPixels(r, {nullptr, 0, luma_, n_, collected}, chroma);
     return collected;
+  }
+
+  // Quarter turns, a block of rows at a time.
+  int TurnRows(int32_t r, int most) {
+    constexpr int kRows = ArrangedSamples::kPixels / ArrangedSamples::kTurnedColumns;
+    const bool backwards = destination_.pixelOrder() == PixelOrder::kTurnedBackwards;
+    const int shared = RowsSharingChroma(r, most < 2 * kRows ? most : 2 * kRows);
+    if (shared > 1) {
+      arranged_.BeginTurned(n_, 2 * kRows, backwards);
+      SampleRows rows = ReadRows(r, shared);
+      if (backwards) rows.rows &= ~1;
+      arranged_.Append(rows);
+    } else {
+      arranged_.BeginTurned(n_, kRows, backwards);
+      if (most > kRows) most = kRows;
+      const bool mayShare = shared == 1;
+      do {
+        const int32_t next = r + arranged_.count();
+        arranged_.Append(CollectRows(next, mayShare ? 1 : most - arranged_.count()));
+      } while (arranged_.count() < most &&
+               (!mayShare || RowsSharingChroma(r + arranged_.count(), 2) < 2));
+    }
+    const Destination::PixelRun run = destination_.PlacePixels(r, arranged_.count());
+    if (run.pixels != nullptr) {
+      SampleRows turned = arranged_.turned();
+      turned = FromRow(turned, run.first);
+      turned.rows = run.n;
+      ConvertPixels(run, turned, arranged_.count());
+    }
+    return arranged_.count();
+  }
+
+  // How many of `most` rows from r on are in place, four pixels to a sample of chroma; 1 when it is
+  // not even this one, 0 when none is.
+  int RowsSharingChroma(int32_t r, int most) const {
+    const bool inPlace = source_.ChromaIsInPlace() && engine_.srcSubsample[1] == 2 &&
+                         engine_.srcSubsample[4] == 2 && engine_.stepY == 0x10000;
+    return inPlace ? source_.RowsInPlace(r, most) : 0;
+  }
+
+  // What is left of rows from a column or row on.
+  static SampleRows FromColumn(SampleRows rows, int i) {
+    ChromaRows& chroma = rows.chroma.rows;
+    const int column = i + rows.chroma.phase;
+    rows.y += i;
+    chroma.u += ptrdiff_t{column >> chroma.shift} * chroma.step;
+    chroma.v += ptrdiff_t{column >> chroma.shift} * chroma.step;
+    rows.chroma.phase = column & chroma.shift;
+    return rows;
+  }
+  static SampleRows FromRow(SampleRows rows, int i) {
+    ChromaRows& chroma = rows.chroma.rows;
+    const int row = i + rows.chroma.rowPhase;
+    rows.y += i * rows.yPitch;
+    rows.rows -= i;
+    chroma.u += (row >> chroma.rowShift) * chroma.uPitch;
+    chroma.v += (row >> chroma.rowShift) * chroma.vPitch;
+    rows.chroma.rowPhase = row & chroma.rowShift;
+    return rows;
   }
 
   // Chroma of a row as row i of those collected.
   PixelChroma CollectChroma(int32_t r, int i) {
-    uint8_t* const u = channels_[0] + ptrdiff_t{i} * n_;
-    uint8_t* const v = channels_[1] + ptrdiff_t{i} * n_;
+    uint8_t* const u = collected_[1] + ptrdiff_t{i} * n_;
+    uint8_t* const v = collected_[2] + ptrdiff_t{i} * n_;
     PixelChroma chroma = source_.ChromaOfPixels(r, u, v);
     ChromaRows& rows = chroma.rows;
     if (source_.ChromaIsGrey()) return chroma;
@@ -457,28 +551,22 @@ class Pipeline {
     return {{u, v, rows.shift, 1, n_, n_, 0}, chroma.phase};
   }
 
-  // Fills in where the pixels of `rows` go.
-  void ConvertPixels(int32_t r, PixelRows rows, const PixelChroma& chroma) {
-    const Destination::PixelRun run = destination_.StartPixels(r, rows.rows);
-    if (run.pixels == nullptr) return;
-    const PixelFormat& format = destination_.pixelFormat();
-    rows.dstPitch = run.pitch;
-    const uint8_t* const y = rows.y + run.first;
-    // A run may begin with the second of two pixels that share a sample.
-    int i = 0;
-    while (i < run.n) {
-      const int column = run.first + i + chroma.phase;
-      const int n = (column & chroma.rows.shift) != 0 ? 1 : run.n - i;
-      const ptrdiff_t sample = ptrdiff_t{column >> chroma.rows.shift} * chroma.rows.step;
-      ChromaRows part = chroma.rows;
-      part.u += sample;
-      part.v += sample;
-      rows.dst = run.pixels + ptrdiff_t{i} * format.bytes;
-      rows.y = y + i;
-      rows_.yuvToPixels(rows, part, colour_, format, destination_.alphaFill(), n);
-      i += n;
+  void ConvertPixels(const Destination::PixelRun& run, const SampleRows& rows, int n) {
+    // Rows may begin with the second of two pixels that share a sample, and columns likewise.
+    for (int row = 0; row < rows.rows;) {
+      SampleRows line = FromRow(rows, row);
+      if (line.chroma.rowPhase != 0) line.rows = 1;
+      for (int i = 0; i < n;) {
+        const SampleRows part = FromColumn(line, i);
+        const int count = part.chroma.phase != 0 ? 1 : n - i;
+        uint8_t* const pixels =
+            run.pixels + row * run.pitch + ptrdiff_t{i} * destination_.pixelFormat().bytes;
+        rows_.yuvToPixels({pixels, run.pitch, part.y, part.yPitch, part.rows}, part.chroma.rows,
+                          colour_, destination_.pixelFormat(), destination_.alphaFill(), count);
+        i += count;
+      }
+      row += line.rows;
     }
-    destination_.FinishPixels();
   }
 
   void RgbToRgb(int32_t r) {
@@ -625,6 +713,7 @@ class Pipeline {
   const EngineContext& engine_;
   Source source_;
   Destination destination_;
+  ArrangedSamples arranged_;
   bool clampedCarry_, dithers_;
   bool keepsPixels_;  // RGB to RGB of the same format
   kestrel::YuvToRgb colour_ = {};
@@ -639,6 +728,7 @@ class Pipeline {
   bool chromaOfSeconds_ = false;                 // every pixel, or the second of each two, decides
   uint8_t channels_[3][kStrip];
   uint8_t luma_[kStrip], u_[kStrip], v_[kStrip];
+  uint8_t collected_[3][kCollected];  // short rows of luma, U and V
 };
 
 static_assert(sizeof(Pipeline) < size_t{56} * 1024, "camera threads have small stacks");

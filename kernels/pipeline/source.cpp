@@ -143,7 +143,7 @@ void Source::SelectPixelChroma(int32_t x, int n) {
 }
 
 PixelChroma Source::ChromaOfPixels(int32_t r, uint8_t* intoU, uint8_t* intoV) {
-  if (pixelChroma_ == PixelChromaRead::kGrey) return {{u_, v_, 0, 1, 0, 0, 0}, 0};
+  if (pixelChroma_ == PixelChromaRead::kGrey) return {{u_, v_, 0, 1, 0, 0, 0}};
   const int32_t row = rowPositions_.At(r, job_.engine.srcSubsample[4]).first;
   const uint8_t* const u = RowStart(1, row);
   const uint8_t* const v = RowStart(2, row);
@@ -165,9 +165,9 @@ PixelChroma Source::ChromaOfPixels(int32_t r, uint8_t* intoU, uint8_t* intoV) {
     case PixelChromaRead::kPairs:
       rows_.readPairs(packed_, u, chromaU_.plan);
       rows_.deinterleave(intoU, intoV, packed_, chromaCount_);
-      return {{intoU, intoV, 0, 1, 0, 0, 0}, 0};
+      return {{intoU, intoV, 0, 1, 0, 0, 0}};
     default:
-      return {{ReadSamples(intoU, u, chromaU_), ReadSamples(intoV, v, chromaU_), 0, 1, 0, 0, 0}, 0};
+      return {{ReadSamples(intoU, u, chromaU_), ReadSamples(intoV, v, chromaU_), 0, 1, 0, 0, 0}};
   }
 }
 

@@ -27,10 +27,20 @@ struct RgbRun {
   const uint8_t* alpha;  // null unless the source has an alpha byte
 };
 
-// Chroma for the pixels of a strip: pixel i has sample (i + phase) >> rows.shift.
+// Chroma for the pixels of a strip: pixel i has sample (i + phase) >> rows.shift, and row j has row
+// (j + rowPhase) >> rows.rowShift of them.
 struct PixelChroma {
   ChromaRows rows;
-  int phase;
+  int phase = 0;
+  int rowPhase = 0;
+};
+
+// Rows of luma and their chroma, to become pixels.
+struct SampleRows {
+  const uint8_t* y;
+  ptrdiff_t yPitch;
+  int rows;
+  PixelChroma chroma;
 };
 
 class Source {

@@ -554,6 +554,14 @@ inline void ConvertLine(const ColourStage<kForm>& stage, uint8_t* dst, const uin
   }
 }
 
+// Asks for the cache lines of some rows of a block that is narrower than the picture it lies in.
+// Nothing else would: they are stored to once, far from those before.
+inline void PrefetchRows(const uint8_t* dst, ptrdiff_t pitch, int rows, int bytes) {
+  for (int row = 0; row < rows; ++row) {
+    for (int i = 0; i < bytes; i += 64) __builtin_prefetch(dst + row * pitch + i, 1);
+  }
+}
+
 // n pixels of each row, whole vectors of them.
 template <YuvToRgbForm kForm, ChromaLayout kLayout, int kPixel>
 void ConvertVectors(const void* colourStage, const PixelLines& lines, uint8_t alphaByte, int n) {
@@ -561,7 +569,11 @@ void ConvertVectors(const void* colourStage, const PixelLines& lines, uint8_t al
   const ColourStage<kForm> stage = *static_cast<const ColourStage<kForm>*>(colourStage);
   const Bytes alpha = SetBytes(alphaByte);
   const int share = 1 << lines.rowShift;
+  const bool isNarrow = lines.rows > share &&
+                        2 * n * kPixel < (lines.dstPitch < 0 ? -lines.dstPitch : lines.dstPitch);
   for (int row = 0; row < lines.rows; row += share) {
+    if (isNarrow && row + 2 * share <= lines.rows)
+      PrefetchRows(lines.dst + (row + share) * lines.dstPitch, lines.dstPitch, share, n * kPixel);
     const ptrdiff_t chromaRow = row >> lines.rowShift;
     const bool two = share == 2 && row + 1 < lines.rows;
     uint8_t* dst = lines.dst + row * lines.dstPitch;

@@ -1,0 +1,48 @@
+// Luma and chroma of a block of pixels, turned by a quarter or mirrored before they are converted:
+// they are fewer bytes than the pixels that they become, and those can then be written in long runs
+// that lie in the destination as they are made.
+#ifndef KESTREL_KERNELS_PIPELINE_ARRANGED_SAMPLES_H
+#define KESTREL_KERNELS_PIPELINE_ARRANGED_SAMPLES_H
+
+#include "kernels/pipeline/source.h"
+
+namespace kestrel {
+
+class ArrangedSamples {
+ public:
+  // Pixels of a block, when each may have its own samples of chroma. Twice as many can be turned
+  // where four share them.
+  static constexpr int kPixels = 64 * 64;
+  static constexpr int kTurnedColumns = 64;
+  // Bytes. (A run may begin and end in the middle of a sample of chroma.)
+  static constexpr int kSize = 3 * kPixels + 2 * kTurnedColumns;
+
+  ArrangedSamples(const RowOps& rows, uint8_t* memory) : rows_(rows), memory_(memory) {}
+
+  // Begins to collect rows of n pixels, at most `most` of them, each of which becomes a column: the
+  // first row the leftmost one, or the rightmost when `backwards`.
+  void BeginTurned(int n, int most, bool backwards);
+  // Rows that share chroma are the only ones of their block; backwards they are one, or an even
+  // number. Others have their components of chroma apart.
+  void Append(const SampleRows& in);
+  int count() const { return count_; }
+  // What was collected: n rows of count() pixels.
+  SampleRows turned() const;
+
+  // n pixels of each row, in the reverse order.
+  SampleRows Mirror(const SampleRows& in, int n);
+
+ private:
+  // Of chroma, in the block: samples of a row.
+  int chromaMost() const { return most_ >> chroma_.rows.rowShift; }
+
+  const RowOps& rows_;
+  uint8_t* memory_;
+  int n_ = 0, most_ = 0, count_ = 0;
+  bool backwards_ = false;
+  PixelChroma chroma_ = {};  // of the rows that were collected
+};
+
+}  // namespace kestrel
+
+#endif
