@@ -24,12 +24,8 @@ int64_t ScaleBy256th(int64_t value, int32_t multiplier) {
   return (value < 0) != (multiplier < 0) ? -scaled : scaled;
 }
 
-uint8_t ClampToByte(int64_t value) {
+uint8_t ClampToByte(int32_t value) {
   return uint8_t(value < 0 ? 0 : value > 255 ? 255 : value);
-}
-
-uint32_t LowHalf(int32_t value) {
-  return uint32_t(value) & 0xFFFFu;
 }
 
 void* AllocateTable(EngineContext* c, uint32_t size) {
@@ -48,12 +44,55 @@ void DescribeClamp(bool is16Bit, uint32_t bits, YuvToRgbSums* sums, int channel)
   sums->maximum[channel] = narrow ? (1 << bits) - 1 : 255;
 }
 
+// `feet` zeros, 0..maximum, and `heads` times the maximum.
+uint8_t* WriteClampTable(uint8_t* table, int feet, int maximum, int heads) {
+  MMemSet(table, 0, uint32_t(feet));
+  table += feet;
+  for (int value = 0; value <= maximum; ++value) table[value] = uint8_t(value);
+  table += maximum + 1;
+  MMemSet(table, maximum, uint32_t(heads));
+  return table + heads;
+}
+
 void WriteClampTables(bool is16Bit, uint8_t* block) {
   if (is16Bit) {
-    for (int k = 0; k < 160; ++k) block[k] = uint8_t(k < 64 ? 0 : k > 95 ? 31 : k - 64);
-    for (int k = 0; k < 320; ++k) block[160 + k] = uint8_t(k < 128 ? 0 : k > 191 ? 63 : k - 128);
+    block = WriteClampTable(block, 64, 31, 64);
+    WriteClampTable(block, 128, 63, 128);
   } else {
-    for (int k = 0; k < 1280; ++k) block[k] = ClampToByte(k - 512);
+    WriteClampTable(block, 512, 255, 512);
+  }
+}
+
+// first + i * gain for 0 <= i < 256. Written by adding up, which compilers turn into vectors also
+// where these have no product of 32 bits. Unsigned, because the sum after the last may wrap.
+struct Sum {
+  int32_t first, gain;
+};
+
+void WriteLine(const Sum& sum, uint32_t* table) {
+  const uint32_t gain = uint32_t(sum.gain);
+  uint32_t value = uint32_t(sum.first);
+  for (int i = 0; i < 128; ++i, value += gain) {
+    table[i] = value;
+    table[128 + i] = value + 128 * gain;
+  }
+}
+
+// Two sums without their twelve lowest bits, in the low and the high half of each word.
+void WriteChromaLine(const Sum& lowHalf, const Sum& highHalf, uint32_t* table) {
+  uint32_t low = uint32_t(lowHalf.first) * 16;
+  uint32_t high = uint32_t(highHalf.first) * 16;
+  const uint32_t lowGain = uint32_t(lowHalf.gain) * 16;
+  const uint32_t highGain = uint32_t(highHalf.gain) * 16;
+  for (int i = 0; i < 256; ++i, low += lowGain, high += highGain) {
+    table[i] = low >> 16 | (high & 0xFFFF0000);
+  }
+}
+
+void WriteLevelLine(const Sum& sum, uint8_t* levels) {
+  uint32_t value = uint32_t(sum.first);
+  for (int i = 0; i < 256; ++i, value += uint32_t(sum.gain)) {
+    levels[i] = ClampToByte(int32_t(value) >> 16);
   }
 }
 
@@ -116,30 +155,25 @@ void BuildYuvToRgb(EngineContext* c) {
   c->tableOffsets[1] = (size - kChannelTableSize) / 4;
   c->tableOffsets[2] = (size - 3 * kChannelTableSize) / 4;
   WriteClampTables(is16Bit, static_cast<uint8_t*>(c->table));
-  uint32_t* words = static_cast<uint32_t*>(c->table);
-  for (int32_t i = 0; i < 256; ++i) {
-    words[c->tableOffsets[2] + i] = uint32_t(i * s.yGain) << 4;
-    words[c->tableOffsets[0] + i] =
-        LowHalf((i * s.uToG) >> 12) | LowHalf((s.offset[2] + i * s.uToB) >> 12) << 16;
-    words[c->tableOffsets[1] + i] =
-        LowHalf((s.offset[1] + i * s.vToG) >> 12) | LowHalf((s.offset[0] + i * s.vToR) >> 12) << 16;
-  }
+  uint32_t* const words = static_cast<uint32_t*>(c->table);
+  WriteLine({0, s.yGain * 16}, words + c->tableOffsets[2]);
+  WriteChromaLine({0, s.uToG}, {s.offset[2], s.uToB}, words + c->tableOffsets[0]);
+  WriteChromaLine({s.offset[1], s.vToG}, {s.offset[0], s.vToR}, words + c->tableOffsets[1]);
 }
 
 void BuildRgbToYuv(EngineContext* c) {
   const RgbToYuvCoeffs& row = RgbToYuvRow(c->dstFormat.colourStandard);
   if (AllocateTable(c, kYuvBlockSize) == nullptr) return;
   const int32_t foot = (c->dstFormat.colourStandard & CS_VIDEO_RANGE) != 0 ? kVideoLumaFoot : 0;
-  int32_t(*table)[256] = static_cast<int32_t(*)[256]>(c->table);
-  for (int32_t i = 0; i < 256; ++i) {
-    table[0][i] = foot + i * row.rToY;
-    table[1][i] = i * row.gToY;
-    table[2][i] = i * row.bToY;
-    table[3][i] = -i * row.rToU;
-    table[4][i] = -i * row.gToU;
-    table[5][i] = kChromaCentre + i * row.rToV;  // bToU is the same number in every row
-    table[6][i] = -i * row.gToV;
-    table[7][i] = -i * row.bToV;
+  const Sum lines[] = {
+      {foot, row.rToY}, {0, row.gToY},
+      {0, row.bToY},    {0, -row.rToU},
+      {0, -row.gToU},   {kChromaCentre, row.rToV},  // bToU is the same number in every row
+      {0, -row.gToV},   {0, -row.bToV}};
+  uint32_t* words = static_cast<uint32_t*>(c->table);
+  for (const Sum& line : lines) {
+    WriteLine(line, words);
+    words += 256;
   }
 }
 
@@ -174,11 +208,9 @@ void BuildLevelTable(EngineContext* c) {
       AdjustOffset(map.chromaOffset, p.contrast, p.saturation, map.chromaGain);
   c->levelSums = {{lumaGain, chromaGain}, {lumaOffset + kHalf, chromaOffset + kHalf}};
   if (AllocateTable(c, kLevelBlockSize) == nullptr) return;
-  uint8_t* levels = static_cast<uint8_t*>(c->table);
-  for (int64_t i = 0; i < 256; ++i) {
-    levels[i] = ClampToByte((lumaOffset + kHalf + i * lumaGain) >> 16);
-    levels[256 + i] = ClampToByte((chromaOffset + kHalf + i * chromaGain) >> 16);
-  }
+  uint8_t* const levels = static_cast<uint8_t*>(c->table);
+  WriteLevelLine({lumaOffset + kHalf, lumaGain}, levels);
+  WriteLevelLine({chromaOffset + kHalf, chromaGain}, levels + 256);
 }
 
 }  // namespace

@@ -18,6 +18,7 @@ T* AllocateZeroed() {
 // is not positive.
 uint32_t Step(int64_t numerator, int64_t denominator) {
   if (numerator <= 0 || denominator <= 0) return 0;
+  if (numerator == denominator) return 0x10000;
   const double step = 65536.0 * double(numerator) / double(denominator);
   return step >= 4294967295.0 ? UINT32_MAX : uint32_t(step);
 }
@@ -125,7 +126,9 @@ void DescribeChannels(const FormatDesc& format, uint32_t* sizes, uint32_t* posit
 int32_t Covered(int32_t source, int32_t srcOrigin, uint32_t step, int32_t dstOrigin) {
   const int64_t centre = int64_t(step >> 1) + 32768;
   const int64_t position = (int64_t(source) - srcOrigin) * 65536 + centre;
-  return SaturateToInt32(position / int64_t(step) + dstOrigin);
+  // The step of most engines, which needs no division.
+  const int64_t steps = step == 0x10000 ? position / 0x10000 : position / int64_t(step);
+  return SaturateToInt32(steps + dstOrigin);
 }
 
 struct GeometryOf {

@@ -222,11 +222,15 @@ constexpr LayoutRow kLayouts[] = {
     {CODE_YUV_SPECIAL9, LayoutRow::kPacked, 8, 4, 4, 0, 1, 2, 1, 1},
 };
 
+// Codes ascend in the table, so halves of it can be left out.
 const LayoutRow* FindLayout(uint32_t code) {
-  for (const LayoutRow& row : kLayouts) {
-    if (row.code == code) return &row;
+  constexpr uint32_t kRows = sizeof(kLayouts) / sizeof(kLayouts[0]);
+  static_assert(kRows < 32, "the steps below reach row 31");
+  uint32_t found = 0;
+  for (uint32_t step = 16; step > 0; step /= 2) {
+    if (found + step < kRows && kLayouts[found + step].code <= code) found += step;
   }
-  return nullptr;
+  return kLayouts[found].code == code ? &kLayouts[found] : nullptr;
 }
 
 // RGB layouts under the small codes of older callers.

@@ -22,8 +22,7 @@ struct CpuFeatures {
   bool sse41, avx2;
 };
 
-// Asked for every engine, since the library keeps no state. It takes microseconds where the CPU is
-// a virtual one, for which an engine of several passes asks once.
+// Takes microseconds where the CPU is a virtual one, because these instructions are emulated.
 CpuFeatures AskCpu() {
   uint32_t a, b, c, d;
   CpuFeatures found = {false, false};
@@ -58,8 +57,26 @@ RowOpsList AvailableRowOps() {
   return list;
 }
 
+#if defined(KESTREL_LOADER_MAY_SELECT) && defined(__GLIBC__)
+
+// The loader asks, once: it takes one of these functions for SelectRowOps and keeps its address
+// among those of all functions, which nobody can write afterwards. So an engine costs no question
+// although the library keeps no state. Loaders of other C libraries do not all choose functions.
+extern "C" decltype(SelectRowOps)* KestrelResolveSelectRowOps() {
+  const CpuFeatures features = AskCpu();
+  if (features.avx2) return [] { return &kAvx2Rows; };
+  if (features.sse41) return [] { return &kSse41Rows; };
+  return [] { return &kScalarRows; };
+}
+
+__attribute__((ifunc("KestrelResolveSelectRowOps"))) const RowOps* SelectRowOps();
+
+#else
+
 const RowOps* SelectRowOps() {
   return AvailableRowOps().ops[0];
 }
+
+#endif
 
 }  // namespace kestrel
