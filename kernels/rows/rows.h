@@ -220,12 +220,13 @@ extern const RowOps kScalarRows;
 #if defined(__x86_64__)
 extern const RowOps kSse41Rows;
 extern const RowOps kAvx2Rows;
+extern const RowOps kAvx512Rows;
 #elif defined(__ARM_NEON)
 extern const RowOps kNeonRows;
 #endif
 
 // The tables that this CPU can run, the fastest first and the scalar one last; null after that.
-constexpr int kMostRowOps = 3;
+constexpr int kMostRowOps = 4;
 struct RowOpsList {
   const RowOps* ops[kMostRowOps + 1];
 };

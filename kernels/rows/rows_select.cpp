@@ -16,16 +16,19 @@ constexpr uint32_t kLeaf1Sse41 = 1u << 19;
 constexpr uint32_t kLeaf1SystemSavesState = 1u << 27;
 constexpr uint32_t kLeaf1Avx = 1u << 28;
 constexpr uint32_t kLeaf7Avx2 = 1u << 5;
+constexpr uint32_t kLeaf7Avx512 = 1u << 16 | 1u << 17 | 1u << 30 | 1u << 31;  // F, DQ, BW and VL
+constexpr uint32_t kLeaf7Vbmi = 1u << 1;                                      // in ECX
 constexpr uint32_t kStateOfSseAndAvx = 6;
+constexpr uint32_t kStateOfAvx512 = 0xE6;
 
 struct CpuFeatures {
-  bool sse41, avx2;
+  bool sse41, avx2, avx512;
 };
 
 // Takes microseconds where the CPU is a virtual one, because these instructions are emulated.
 CpuFeatures AskCpu() {
   uint32_t a, b, c, d;
-  CpuFeatures found = {false, false};
+  CpuFeatures found = {false, false, false};
   __cpuid(1, a, b, c, d);
   found.sse41 = (c & kLeaf1Sse41) != 0;
   constexpr uint32_t kWide = kLeaf1SystemSavesState | kLeaf1Avx;
@@ -36,6 +39,8 @@ CpuFeatures AskCpu() {
   // A CPU with AVX has this leaf: the one that describes the state is a later one.
   __cpuid_count(7, 0, a, b, c, d);
   found.avx2 = (b & kLeaf7Avx2) != 0;
+  found.avx512 = (state & kStateOfAvx512) == kStateOfAvx512 && (b & kLeaf7Avx512) == kLeaf7Avx512 &&
+                 (c & kLeaf7Vbmi) != 0;
   return found;
 }
 
@@ -48,6 +53,7 @@ RowOpsList AvailableRowOps() {
   int n = 0;
 #if defined(__x86_64__)
   const CpuFeatures features = AskCpu();
+  if (features.avx512) list.ops[n++] = &kAvx512Rows;
   if (features.avx2) list.ops[n++] = &kAvx2Rows;
   if (features.sse41) list.ops[n++] = &kSse41Rows;
 #elif defined(__ARM_NEON)

@@ -5,6 +5,7 @@
 #include <sys/mman.h>
 
 #include <algorithm>
+#include <cctype>
 #include <cstring>
 #include <functional>
 #include <memory>
@@ -165,7 +166,9 @@ TEST_P(StackUseOf, EveryPairOfFormats) {
 INSTANTIATE_TEST_SUITE_P(Rows, StackUseOf, testing::ValuesIn(testing_support::InstructionSets()),
                          [](const auto& test) {
                            std::string name = test.param.name;
-                           std::replace(name.begin(), name.end(), '.', '_');
+                           std::replace_if(
+                               name.begin(), name.end(),
+                               [](unsigned char letter) { return std::isalnum(letter) == 0; }, '_');
                            return name;
                          });
 

@@ -1,0 +1,275 @@
+// How samples move within and between registers of AVX-512, whose permutations of bytes across all
+// lanes cost no more than those within them. Part of vector_x86.h, whose first lines hold here too.
+#ifndef KESTREL_KERNELS_ROWS_VECTOR_X86_AVX512_H
+#define KESTREL_KERNELS_ROWS_VECTOR_X86_AVX512_H
+
+#include "kernels/rows/rows_scalar.h"
+#include "kernels/rows/vector_x86_words.h"
+
+namespace kestrel {
+namespace {
+
+// ---- Order within a register
+struct Order {
+  alignas(kBytes) uint8_t of[kBytes];
+};
+// Byte i of the result is byte order.of[i].
+inline Register Reorder(Register v, const Order& order) {
+  return _mm512_permutexvar_epi8(Load(order.of), v);
+}
+inline Register Reorder(__m256i v, const Order& order) {
+  return Reorder(_mm512_castsi256_si512(v), order);
+}
+inline __m256i LowHalf(Register v) {
+  return _mm512_castsi512_si256(v);
+}
+inline Register Join(__m128i a, __m128i b, __m128i c, __m128i d) {
+  const __m256i low = _mm256_inserti128_si256(_mm256_castsi128_si256(a), b, 1);
+  const __m256i high = _mm256_inserti128_si256(_mm256_castsi128_si256(c), d, 1);
+  return _mm512_inserti64x4(_mm512_castsi256_si512(low), high, 1);
+}
+
+inline __m256i Load32(const void* p) {
+  return _mm256_loadu_si256(static_cast<const __m256i*>(p));
+}
+inline Words LoadHalf(const uint8_t* p) {
+  return {_mm512_cvtepu8_epi16(Load32(p))};
+}
+// Words clamped to bytes, half a vector of them.
+inline void StoreHalf(uint8_t* p, Words w) {
+  const Register twice = Narrow(w, w).v;
+  _mm256_storeu_si256(
+      reinterpret_cast<__m256i*>(p),
+      LowHalf(_mm512_permutexvar_epi64(_mm512_setr_epi64(0, 2, 4, 6, 0, 2, 4, 6), twice)));
+}
+// Words of a vector's pixels, in order.
+inline void StorePixelWords(uint8_t* p, WordsPair w) {
+  const Register first = _mm512_setr_epi64(0, 1, 8, 9, 2, 3, 10, 11);
+  const Register second = _mm512_setr_epi64(4, 5, 12, 13, 6, 7, 14, 15);
+  Store(p, _mm512_permutex2var_epi64(w.low.v, first, w.high.v));
+  Store(p + kBytes, _mm512_permutex2var_epi64(w.low.v, second, w.high.v));
+}
+inline WordsPair LoadPixelWords(const uint8_t* p) {
+  const Register a = Load(p);
+  const Register b = Load(p + kBytes);
+  const Register low = _mm512_setr_epi64(0, 1, 4, 5, 8, 9, 12, 13);
+  const Register high = _mm512_setr_epi64(2, 3, 6, 7, 10, 11, 14, 15);
+  return {{_mm512_permutex2var_epi64(a, low, b)}, {_mm512_permutex2var_epi64(a, high, b)}};
+}
+
+// ---- Packed and planar
+// kUnit registers hold kBytes pixels of as many bytes. To take them apart registers are turned
+// until all have bytes of different channels at each place. Then each channel is selected by masks,
+// which cost less than permutations, and at last put in order. Putting pixels together is the
+// reverse.
+template <int kUnit>
+struct Turned {
+  // Channel and number of the pixel that byte i of turned register r belongs to. Registers of three
+  // bytes to a pixel need no turn; the others are turned by r bytes within each four.
+  static constexpr int Channel(int r, int i) {
+    return kUnit == 3 ? (i + r) % 3 : (i + 4 - r) % kUnit;
+  }
+  static constexpr int Pixel(int r, int i) {
+    return (kBytes * r + (kUnit == 3 ? i : (i & ~3) + (i + 4 - r) % 4)) / kUnit;
+  }
+  static constexpr int RegisterOf(int channel, int i) {
+    int r = 0;
+    while (Channel(r, i) != channel) ++r;
+    return r;
+  }
+  // Between what is selected of a channel and its samples in order.
+  static constexpr Order ToPlanar(int channel) {
+    Order order = {};
+    for (int i = 0; i < kBytes; ++i) order.of[Pixel(RegisterOf(channel, i), i)] = uint8_t(i);
+    return order;
+  }
+  static constexpr Order ToPacked(int channel) {
+    Order order = {};
+    for (int i = 0; i < kBytes; ++i) order.of[i] = uint8_t(Pixel(RegisterOf(channel, i), i));
+    return order;
+  }
+};
+template <int kUnit, int kChannel>
+constexpr Order kToPlanar = Turned<kUnit>::ToPlanar(kChannel);
+template <int kUnit, int kChannel>
+constexpr Order kToPacked = Turned<kUnit>::ToPacked(kChannel);
+
+template <int kPlaces>
+inline Register Turn(Register v) {
+  return _mm512_rol_epi32(v, 8 * kPlaces);
+}
+// a, and b where the mask has ones.
+inline Register Select(uint64_t mask, Register a, Register b) {
+  return _mm512_mask_blend_epi8(mask, a, b);
+}
+constexpr uint64_t kOddPlaces = 0xAAAAAAAAAAAAAAAA;
+
+// Bytes of kBytes pairs apart.
+inline void Load2(const uint8_t* p, Bytes* first, Bytes* second) {
+  const Register a = Load(p);
+  const Register b = Turn<1>(Load(p + kBytes));
+  first->v = Reorder(Select(kOddPlaces, a, b), kToPlanar<2, 0>);
+  second->v = Reorder(Select(kOddPlaces, b, a), kToPlanar<2, 1>);
+}
+inline void Store2(uint8_t* p, Bytes first, Bytes second) {
+  const Register a = Reorder(first.v, kToPacked<2, 0>);
+  const Register b = Reorder(second.v, kToPacked<2, 1>);
+  Store(p, Select(kOddPlaces, a, b));
+  Store(p + kBytes, Turn<3>(Select(kOddPlaces, b, a)));
+}
+
+// Places i take bytes of a, b and c in turn.
+inline Register InThrees(Register a, Register b, Register c) {
+  return Select(0x4924924924924924, Select(0x2492492492492492, a, b), c);
+}
+inline PixelBytes Load3(const uint8_t* p) {
+  const Register a = Load(p);
+  const Register b = Load(p + kBytes);
+  const Register c = Load(p + 2 * kBytes);
+  return {{Reorder(InThrees(a, c, b), kToPlanar<3, 0>)},
+          {Reorder(InThrees(b, a, c), kToPlanar<3, 1>)},
+          {Reorder(InThrees(c, b, a), kToPlanar<3, 2>)},
+          SetBytes(0)};
+}
+inline void Store3(uint8_t* p, Bytes low, Bytes middle, Bytes high) {
+  const Register a = Reorder(low.v, kToPacked<3, 0>);
+  const Register b = Reorder(middle.v, kToPacked<3, 1>);
+  const Register c = Reorder(high.v, kToPacked<3, 2>);
+  Store(p, InThrees(a, b, c));
+  Store(p + kBytes, InThrees(b, c, a));
+  Store(p + 2 * kBytes, InThrees(c, a, b));
+}
+
+// Byte i of result k is from register (i - k) modulo 4, by which registers become channels and
+// channels registers.
+inline Quads SelectQuads(Register a, Register b, Register c, Register d) {
+  const Register ab = Select(kOddPlaces, a, b);
+  const Register ba = Select(kOddPlaces, b, a);
+  const Register cd = Select(kOddPlaces, c, d);
+  const Register dc = Select(kOddPlaces, d, c);
+  constexpr uint64_t kUpperTwo = 0xCCCCCCCCCCCCCCCC;
+  constexpr uint64_t kMiddleTwo = 0x6666666666666666;
+  return {{Select(kUpperTwo, ab, cd), Select(kMiddleTwo, dc, ba), Select(kUpperTwo, cd, ab),
+           Select(kMiddleTwo, ba, dc)}};
+}
+inline PixelBytes Load4(const uint8_t* p) {
+  const Quads channels = SelectQuads(Load(p), Turn<1>(Load(p + kBytes)),
+                                     Turn<2>(Load(p + 2 * kBytes)), Turn<3>(Load(p + 3 * kBytes)));
+  return {{Reorder(channels.v[0], kToPlanar<4, 0>)},
+          {Reorder(channels.v[1], kToPlanar<4, 1>)},
+          {Reorder(channels.v[2], kToPlanar<4, 2>)},
+          {Reorder(channels.v[3], kToPlanar<4, 3>)}};
+}
+inline void Store4(uint8_t* p, Bytes a, Bytes b, Bytes c, Bytes d) {
+  const Quads quads = SelectQuads(Reorder(a.v, kToPacked<4, 0>), Reorder(b.v, kToPacked<4, 1>),
+                                  Reorder(c.v, kToPacked<4, 2>), Reorder(d.v, kToPacked<4, 3>));
+  Store(p, quads.v[0]);
+  Store(p + kBytes, Turn<3>(quads.v[1]));
+  Store(p + 2 * kBytes, Turn<2>(quads.v[2]));
+  Store(p + 3 * kBytes, Turn<1>(quads.v[3]));
+}
+
+// Samples in the order in which Store4InTurn writes whole registers: the lanes of each hold
+// neighbouring pixels. Twice is in plain order again.
+inline Register InTurn(Register v) {
+  return _mm512_permutexvar_epi32(
+      _mm512_setr_epi32(0, 4, 8, 12, 1, 5, 9, 13, 2, 6, 10, 14, 3, 7, 11, 15), v);
+}
+inline Bytes InTurn(Bytes b) {
+  return {InTurn(b.v)};
+}
+inline Words InTurn(Words w) {
+  return {InTurn(w.v)};
+}
+inline void Store4InTurn(uint8_t* p, Bytes a, Bytes b, Bytes c, Bytes d) {
+  const Quads quads = Interleave4(a, b, c, d);
+  for (int i = 0; i < 4; ++i) Store(p + kBytes * i, quads.v[i]);
+}
+
+// ---- Order of bytes
+template <int kUnit>
+constexpr Order Reversed() {
+  Order order = {};
+  for (int i = 0; i < kBytes; ++i) {
+    order.of[i] = uint8_t(kBytes - kUnit - i / kUnit * kUnit + i % kUnit);
+  }
+  return order;
+}
+template <int kUnit>
+constexpr Order kReversed = Reversed<kUnit>();
+// The last unit first.
+template <int kUnit>
+inline void StoreReversed(uint8_t* p, const uint8_t* src) {
+  Store(p, Reorder(Load(src), kReversed<kUnit>));
+}
+
+// kWords pairs of a plan, as words: first byte low, second byte high.
+inline Words GatherPairs(const uint8_t* src, const PairPlan::Eight* eights) {
+  const auto windows = [=](int half) {
+    return Join(Load16(src + eights[0].window[half]), Load16(src + eights[1].window[half]),
+                Load16(src + eights[2].window[half]), Load16(src + eights[3].window[half]));
+  };
+  const Register shuffle = Join(Load16(eights[0].shuffle), Load16(eights[1].shuffle),
+                                Load16(eights[2].shuffle), Load16(eights[3].shuffle));
+  constexpr uint64_t kUpperHalves = 0xFF00FF00FF00FF00;
+  return {_mm512_mask_shuffle_epi8(_mm512_shuffle_epi8(windows(0), shuffle), kUpperHalves,
+                                   windows(1), shuffle)};
+}
+
+// The odd bytes of two vectors.
+inline Bytes Seconds(Bytes a, Bytes b) {
+  const Bytes narrow = Narrow(ShiftRightUnsigned<8>(Words{a.v}), ShiftRightUnsigned<8>(Words{b.v}));
+  return {_mm512_permutexvar_epi64(_mm512_setr_epi64(0, 2, 4, 6, 1, 3, 5, 7), narrow.v)};
+}
+
+// ---- Pixels of four bytes
+// Register i of kBytes pixels, and of the second ones of as many pairs, in an order that
+// NarrowedQuads knows to set right when each pixel has become a byte.
+inline Register LoadQuads(const uint8_t* p, int i) {
+  return Load(p + kBytes * i);
+}
+inline Register LoadSecondQuads(const uint8_t* p, int i) {
+  const Register seconds =
+      _mm512_setr_epi32(1, 3, 5, 7, 9, 11, 13, 15, 17, 19, 21, 23, 25, 27, 29, 31);
+  return _mm512_permutex2var_epi32(Load(p + 2 * kBytes * i), seconds,
+                                   Load(p + 2 * kBytes * i + kBytes));
+}
+inline Bytes NarrowedQuads(Bytes b) {
+  return InTurn(b);
+}
+inline __m128i GatherFourQuads(const uint8_t* src, const int32_t* offsets) {
+  const auto quad = [src](int32_t offset) {
+    int32_t value;
+    __builtin_memcpy(&value, src + offset, 4);
+    return value;
+  };
+  __m128i v = _mm_cvtsi32_si128(quad(offsets[0]));
+  v = _mm_insert_epi32(v, quad(offsets[1]), 1);
+  v = _mm_insert_epi32(v, quad(offsets[2]), 2);
+  return _mm_insert_epi32(v, quad(offsets[3]), 3);
+}
+inline Bytes GatherQuads(const uint8_t* src, const int32_t* offsets) {
+  return {Join(GatherFourQuads(src, offsets), GatherFourQuads(src, offsets + 4),
+               GatherFourQuads(src, offsets + 8), GatherFourQuads(src, offsets + 12))};
+}
+// Byte i of a vector's pixels in words is of pixel i / 8 of each lane's half: its weight's place.
+template <int kHalf>
+constexpr Order WeightsOfQuads() {
+  Order order = {};
+  for (int i = 0; i < kBytes; ++i) {
+    order.of[i] = uint8_t(2 * (4 * (i / 16) + 2 * kHalf + i % 16 / 8) + i % 2);
+  }
+  return order;
+}
+constexpr Order kWeightsOfLow = WeightsOfQuads<0>();
+constexpr Order kWeightsOfHigh = WeightsOfQuads<1>();
+// Each of a vector's pixels' weights for all its bytes.
+inline WordsPair SpreadToQuads(const uint16_t* weights) {
+  const __m256i w = Load32(weights);
+  return {{Reorder(w, kWeightsOfLow)}, {Reorder(w, kWeightsOfHigh)}};
+}
+
+}  // namespace
+}  // namespace kestrel
+
+#endif

@@ -1,0 +1,253 @@
+// How samples move within and between registers of SSE4.1 and AVX2. AVX2 works on two lanes of 16
+// bytes each. Part of vector_x86.h, whose first lines hold here too.
+#ifndef KESTREL_KERNELS_ROWS_VECTOR_X86_LANES_H
+#define KESTREL_KERNELS_ROWS_VECTOR_X86_LANES_H
+
+#include "kernels/rows/rows_scalar.h"
+#include "kernels/rows/vector_x86_words.h"
+
+namespace kestrel {
+namespace {
+
+// ---- Loads and stores
+#ifdef __AVX2__
+inline Register Join(__m128i low, __m128i high) {
+  return _mm256_inserti128_si256(_mm256_castsi128_si256(low), high, 1);
+}
+inline __m128i LowLane(Register v) {
+  return _mm256_castsi256_si128(v);
+}
+inline __m128i HighLane(Register v) {
+  return _mm256_extracti128_si256(v, 1);
+}
+// Register i of `count` that together hold a run: each lane works on its own half of the run, so
+// that results of operations within lanes are in order.
+inline Register LoadLanes(const uint8_t* p, int i, int count) {
+  return Join(Load16(p + 16 * i), Load16(p + 16 * (count + i)));
+}
+inline void StoreLanes(uint8_t* p, int i, int count, Register v) {
+  Store16(p + 16 * i, LowLane(v));
+  Store16(p + 16 * (count + i), HighLane(v));
+}
+inline Words LoadHalf(const uint8_t* p) {
+  return {_mm256_cvtepu8_epi16(Load16(p))};
+}
+// Words clamped to bytes, half a vector of them.
+inline void StoreHalf(uint8_t* p, Words w) {
+  Store16(p, _mm_packus_epi16(LowLane(w.v), HighLane(w.v)));
+}
+#else
+inline Register LoadLanes(const uint8_t* p, int i, int) {
+  return Load16(p + 16 * i);
+}
+inline void StoreLanes(uint8_t* p, int i, int, Register v) {
+  Store16(p + 16 * i, v);
+}
+inline Words LoadHalf(const uint8_t* p) {
+  return {_mm_cvtepu8_epi16(Load8(p))};
+}
+inline void StoreHalf(uint8_t* p, Words w) {
+  _mm_storel_epi64(reinterpret_cast<__m128i*>(p), _mm_packus_epi16(w.v, w.v));
+}
+#endif
+
+// ---- Packed and planar
+// Bytes of kBytes pairs apart.
+inline void Load2(const uint8_t* p, Bytes* first, Bytes* second) {
+  const Words a = {LoadLanes(p, 0, 2)};
+  const Words b = {LoadLanes(p, 1, 2)};
+  const Words mask = SetWords(0xFF);
+  *first = Narrow(a & mask, b & mask);
+  *second = Narrow(ShiftRightUnsigned<8>(a), ShiftRightUnsigned<8>(b));
+}
+inline void Store2(uint8_t* p, Bytes first, Bytes second) {
+  StoreLanes(p, 0, 2, KESTREL_SIMD(unpacklo_epi8)(first.v, second.v));
+  StoreLanes(p, 1, 2, KESTREL_SIMD(unpackhi_epi8)(first.v, second.v));
+}
+// Words of a vector's pixels, in order.
+inline void StorePixelWords(uint8_t* p, WordsPair w) {
+  StoreLanes(p, 0, 2, w.low.v);
+  StoreLanes(p, 1, 2, w.high.v);
+}
+inline WordsPair LoadPixelWords(const uint8_t* p) {
+  return {{LoadLanes(p, 0, 2)}, {LoadLanes(p, 1, 2)}};
+}
+
+inline PixelBytes Load4(const uint8_t* p) {
+  // 0 4 8 12  1 5 9 13 ...: four bytes of each channel beside each other.
+  const Register order =
+      Broadcast(_mm_setr_epi8(0, 4, 8, 12, 1, 5, 9, 13, 2, 6, 10, 14, 3, 7, 11, 15));
+  const Register a = KESTREL_SIMD(shuffle_epi8)(LoadLanes(p, 0, 4), order);
+  const Register b = KESTREL_SIMD(shuffle_epi8)(LoadLanes(p, 1, 4), order);
+  const Register c = KESTREL_SIMD(shuffle_epi8)(LoadLanes(p, 2, 4), order);
+  const Register d = KESTREL_SIMD(shuffle_epi8)(LoadLanes(p, 3, 4), order);
+  const Register low01 = KESTREL_SIMD(unpacklo_epi32)(a, b);
+  const Register low23 = KESTREL_SIMD(unpacklo_epi32)(c, d);
+  const Register high01 = KESTREL_SIMD(unpackhi_epi32)(a, b);
+  const Register high23 = KESTREL_SIMD(unpackhi_epi32)(c, d);
+  return {{KESTREL_SIMD(unpacklo_epi64)(low01, low23)},
+          {KESTREL_SIMD(unpackhi_epi64)(low01, low23)},
+          {KESTREL_SIMD(unpacklo_epi64)(high01, high23)},
+          {KESTREL_SIMD(unpackhi_epi64)(high01, high23)}};
+}
+
+// Four-byte pixels in four registers, four pixels per lane.
+
+// neighbouring pixels.
+inline Register InTurn(Register v) {
+#ifdef __AVX2__
+  return _mm256_permutevar8x32_epi32(v, _mm256_setr_epi32(0, 2, 4, 6, 1, 3, 5, 7));
+#else
+  return v;
+#endif
+}
+inline Bytes InTurn(Bytes b) {
+  return {InTurn(b.v)};
+}
+inline Words InTurn(Words w) {
+  return {InTurn(w.v)};
+}
+inline void Store4InTurn(uint8_t* p, Bytes a, Bytes b, Bytes c, Bytes d) {
+  const Quads quads = Interleave4(a, b, c, d);
+  for (int i = 0; i < 4; ++i) Store(p + kBytes * i, quads.v[i]);
+}
+inline void Store4(uint8_t* p, Bytes a, Bytes b, Bytes c, Bytes d) {
+  const Quads quads = Interleave4(a, b, c, d);
+  for (int i = 0; i < 4; ++i) StoreLanes(p, i, 4, quads.v[i]);
+}
+
+// Byte i of the channel is byte 3 * i + c of the 48 that three registers hold.
+template <int kChannel>
+inline Bytes PickOfThree(Register a, Register b, Register c) {
+  alignas(16) int8_t order[3][16];
+  for (int i = 0; i < 16; ++i) {
+    for (int part = 0; part < 3; ++part) {
+      const int from = 3 * i + kChannel - 16 * part;
+      order[part][i] = int8_t(from >= 0 && from < 16 ? from : -1);
+    }
+  }
+  const Words x = {KESTREL_SIMD(shuffle_epi8)(a, Broadcast(Load16(order[0])))};
+  const Words y = {KESTREL_SIMD(shuffle_epi8)(b, Broadcast(Load16(order[1])))};
+  const Words z = {KESTREL_SIMD(shuffle_epi8)(c, Broadcast(Load16(order[2])))};
+  return {(x | y | z).v};
+}
+inline PixelBytes Load3(const uint8_t* p) {
+  const Register a = LoadLanes(p, 0, 3);
+  const Register b = LoadLanes(p, 1, 3);
+  const Register c = LoadLanes(p, 2, 3);
+  return {PickOfThree<0>(a, b, c), PickOfThree<1>(a, b, c), PickOfThree<2>(a, b, c), SetBytes(0)};
+}
+inline void Store3(uint8_t* p, Bytes a, Bytes b, Bytes c) {
+  const Quads quads = Interleave4(a, b, c, c);
+  // Twelve bytes of each register, the fourth byte of each pixel left out.
+  const Register order =
+      Broadcast(_mm_setr_epi8(0, 1, 2, 4, 5, 6, 8, 9, 10, 12, 13, 14, -1, -1, -1, -1));
+  Register v[4];
+  for (int i = 0; i < 4; ++i) v[i] = KESTREL_SIMD(shuffle_epi8)(quads.v[i], order);
+  const auto join = [](Register x, Register y) { return (Words{x} | Words{y}).v; };
+#ifdef __AVX2__
+#define KESTREL_LANE_SHIFT(direction) _mm256_b##direction##li_epi128
+#else
+#define KESTREL_LANE_SHIFT(direction) _mm_b##direction##li_si128
+#endif
+  StoreLanes(p, 0, 3, join(v[0], KESTREL_LANE_SHIFT(sl)(v[1], 12)));
+  StoreLanes(p, 1, 3, join(KESTREL_LANE_SHIFT(sr)(v[1], 4), KESTREL_LANE_SHIFT(sl)(v[2], 8)));
+  StoreLanes(p, 2, 3, join(KESTREL_LANE_SHIFT(sr)(v[2], 8), KESTREL_LANE_SHIFT(sl)(v[3], 4)));
+#undef KESTREL_LANE_SHIFT
+}
+
+// ---- Order of bytes
+// The last unit first.
+template <int kUnit>
+inline void StoreReversed(uint8_t* p, const uint8_t* src) {
+  const Register order =
+      Broadcast(kUnit == 1   ? _mm_setr_epi8(15, 14, 13, 12, 11, 10, 9, 8, 7, 6, 5, 4, 3, 2, 1, 0)
+                : kUnit == 2 ? _mm_setr_epi8(14, 15, 12, 13, 10, 11, 8, 9, 6, 7, 4, 5, 2, 3, 0, 1)
+                             : _mm_setr_epi8(12, 13, 14, 15, 8, 9, 10, 11, 4, 5, 6, 7, 0, 1, 2, 3));
+  const Register v = KESTREL_SIMD(shuffle_epi8)(Load(src), order);
+#ifdef __AVX2__
+  // By halves: whole vectors would lie across two cache lines more often than not.
+  Store16(p, HighLane(v));
+  Store16(p + 16, LowLane(v));
+#else
+  Store(p, v);
+#endif
+}
+// kWords pairs of a plan, as words: first byte low, second byte high.
+inline __m128i GatherEight(const uint8_t* src, const PairPlan::Eight& eight) {
+  return _mm_unpacklo_epi64(
+      _mm_shuffle_epi8(Load16(src + eight.window[0]), Load8(eight.shuffle[0])),
+      _mm_shuffle_epi8(Load16(src + eight.window[1]), Load8(eight.shuffle[1])));
+}
+inline Words GatherPairs(const uint8_t* src, const PairPlan::Eight* eights) {
+#ifdef __AVX2__
+  return {Join(GatherEight(src, eights[0]), GatherEight(src, eights[1]))};
+#else
+  return {GatherEight(src, eights[0])};
+#endif
+}
+
+// ---- Pixels of four bytes
+// Register i of kBytes pixels, and of the second ones of as many pairs, in an order that
+// NarrowedQuads knows to set right when each pixel has become a byte.
+inline Register LoadQuads(const uint8_t* p, int i) {
+  return LoadLanes(p, i, 4);
+}
+inline Register LoadSecondQuads(const uint8_t* p, int i) {
+  const Register a = LoadLanes(p, 2 * i, 8);
+  const Register b = LoadLanes(p, 2 * i + 1, 8);
+#ifdef __AVX2__
+  return _mm256_castps_si256(
+      _mm256_shuffle_ps(_mm256_castsi256_ps(a), _mm256_castsi256_ps(b), 0xDD));
+#else
+  return _mm_castps_si128(_mm_shuffle_ps(_mm_castsi128_ps(a), _mm_castsi128_ps(b), 0xDD));
+#endif
+}
+inline Bytes NarrowedQuads(Bytes b) {
+  return b;
+}
+inline __m128i GatherFourQuads(const uint8_t* src, const int32_t* offsets) {
+  const auto quad = [src](int32_t offset) {
+    int32_t value;
+    __builtin_memcpy(&value, src + offset, 4);
+    return value;
+  };
+  __m128i v = _mm_cvtsi32_si128(quad(offsets[0]));
+  v = _mm_insert_epi32(v, quad(offsets[1]), 1);
+  v = _mm_insert_epi32(v, quad(offsets[2]), 2);
+  return _mm_insert_epi32(v, quad(offsets[3]), 3);
+}
+inline Bytes GatherQuads(const uint8_t* src, const int32_t* offsets) {
+#ifdef __AVX2__
+  return {Join(GatherFourQuads(src, offsets), GatherFourQuads(src, offsets + 4))};
+#else
+  return {GatherFourQuads(src, offsets)};
+#endif
+}
+// Each of a vector's pixels' weights for all its bytes.
+inline WordsPair SpreadToQuads(const uint16_t* weights) {
+  const __m128i low = _mm_setr_epi8(0, 1, 0, 1, 0, 1, 0, 1, 2, 3, 2, 3, 2, 3, 2, 3);
+  const __m128i high = _mm_setr_epi8(4, 5, 4, 5, 4, 5, 4, 5, 6, 7, 6, 7, 6, 7, 6, 7);
+#ifdef __AVX2__
+  const Register w = Join(Load8(weights), Load8(weights + 4));
+#else
+  const Register w = Load8(weights);
+#endif
+  return {{KESTREL_SIMD(shuffle_epi8)(w, Broadcast(low))},
+          {KESTREL_SIMD(shuffle_epi8)(w, Broadcast(high))}};
+}
+
+// The odd bytes of two vectors.
+inline Bytes Seconds(Bytes a, Bytes b) {
+  const Bytes narrow = Narrow(ShiftRightUnsigned<8>(Words{a.v}), ShiftRightUnsigned<8>(Words{b.v}));
+#ifdef __AVX2__
+  return {_mm256_permute4x64_epi64(narrow.v, 0xD8)};
+#else
+  return narrow;
+#endif
+}
+
+}  // namespace
+}  // namespace kestrel
+
+#endif
