@@ -70,6 +70,7 @@ RowOpsList AvailableRowOps() {
 // although the library keeps no state. Loaders of other C libraries do not all choose functions.
 extern "C" decltype(SelectRowOps)* KestrelResolveSelectRowOps() {
   const CpuFeatures features = AskCpu();
+  if (features.avx512) return [] { return &kAvx512Rows; };
   if (features.avx2) return [] { return &kAvx2Rows; };
   if (features.sse41) return [] { return &kSse41Rows; };
   return [] { return &kScalarRows; };
