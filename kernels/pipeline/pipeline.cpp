@@ -463,9 +463,9 @@ class Pipeline {
 
   SampleRows CollectRows(int32_t r, int most) {
     const int rows = kCollected / n_ < most ? kCollected / n_ : most;
-    SampleRows collected = {collected_[0], n_, rows, {}};
+    SampleRows collected = {collectedLuma_, n_, rows, {}};
     for (int i = 0; i < rows; ++i) {
-      uint8_t* const into = collected_[0] + ptrdiff_t{i} * n_;
+      uint8_t* const into = collectedLuma_ + ptrdiff_t{i} * n_;
       const uint8_t* const luma = source_.Luma(r + i, into);
       if (luma != into) memcpy(into, luma, size_t(n_));
       const PixelChroma row = CollectChroma(r + i, i);
@@ -535,20 +535,26 @@ class Pipeline {
 
   // Chroma of a row as row i of those collected.
   PixelChroma CollectChroma(int32_t r, int i) {
-    uint8_t* const u = collected_[1] + ptrdiff_t{i} * n_;
-    uint8_t* const v = collected_[2] + ptrdiff_t{i} * n_;
-    PixelChroma chroma = source_.ChromaOfPixels(r, u, v);
+    uint8_t* const into = collectedChroma_ + ptrdiff_t{i} * 2 * n_;
+    PixelChroma chroma = source_.ChromaOfPixels(r, into);
     ChromaRows& rows = chroma.rows;
     if (source_.ChromaIsGrey()) return chroma;
-    const int samples = ((n_ - 1 + chroma.phase) >> rows.shift) + 1;
+    const size_t samples = size_t(source_.chromaCount());
+    const bool isThere = rows.u == into || rows.v == into;
     if (rows.step == 2) {
-      rows_.deinterleave(rows.u < rows.v ? u : v, rows.u < rows.v ? v : u,
-                         rows.u < rows.v ? rows.u : rows.v, samples);
-    } else if (rows.u != u) {
-      memcpy(u, rows.u, size_t(samples));
-      memcpy(v, rows.v, size_t(samples));
+      const uint8_t* const pairs = rows.u < rows.v ? rows.u : rows.v;
+      if (!isThere) memcpy(into, pairs, 2 * samples);
+      rows.u = into + (rows.u - pairs);
+      rows.v = into + (rows.v - pairs);
+    } else if (!isThere) {
+      memcpy(into, rows.u, samples);
+      memcpy(into + samples, rows.v, samples);
+      rows.u = into;
+      rows.v = into + samples;
     }
-    return {{u, v, rows.shift, 1, n_, n_, 0}, chroma.phase};
+    rows.uPitch = rows.vPitch = ptrdiff_t{2} * n_;
+    rows.rowShift = 0;
+    return chroma;
   }
 
   void ConvertPixels(const Destination::PixelRun& run, const SampleRows& rows, int n) {
@@ -728,7 +734,7 @@ class Pipeline {
   bool chromaOfSeconds_ = false;                 // every pixel, or the second of each two, decides
   uint8_t channels_[3][kStrip];
   uint8_t luma_[kStrip], u_[kStrip], v_[kStrip];
-  uint8_t collected_[3][kCollected];  // short rows of luma, U and V
+  uint8_t collectedLuma_[kCollected], collectedChroma_[2 * kCollected];  // of short rows
 };
 
 static_assert(sizeof(Pipeline) < size_t{56} * 1024, "camera threads have small stacks");

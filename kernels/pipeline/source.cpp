@@ -142,12 +142,13 @@ void Source::SelectPixelChroma(int32_t x, int n) {
   }
 }
 
-PixelChroma Source::ChromaOfPixels(int32_t r, uint8_t* intoU, uint8_t* intoV) {
+PixelChroma Source::ChromaOfPixels(int32_t r, uint8_t* into) {
   if (pixelChroma_ == PixelChromaRead::kGrey) return {{u_, v_, 0, 1, 0, 0, 0}};
   const int32_t row = rowPositions_.At(r, job_.engine.srcSubsample[4]).first;
   const uint8_t* const u = RowStart(1, row);
   const uint8_t* const v = RowStart(2, row);
   const int32_t start = chromaU_.offset[0];
+  uint8_t* const second = into + chromaCount_;
   switch (pixelChroma_) {
     case PixelChromaRead::kInPlace:
       return {{u + start, v + start, shift_, int32_t(chromaU_.step), job_.srcPitches[1],
@@ -156,18 +157,17 @@ PixelChroma Source::ChromaOfPixels(int32_t r, uint8_t* intoU, uint8_t* intoV) {
     case PixelChromaRead::kStrided:
       // In packed 4:2:2 every other byte is chroma: U and V in turn.
       if (chromaU_.step == 4 && (v - u == 2 || u - v == 2)) {
-        rows_.readStrided(packed_, (u < v ? u : v) + start, 2, 2 * chromaCount_);
-        return {{packed_ + (u < v ? 0 : 1), packed_ + (u < v ? 1 : 0), shift_, 2, 0, 0, 0}, phase_};
+        rows_.readStrided(into, (u < v ? u : v) + start, 2, 2 * chromaCount_);
+        return {{into + (u < v ? 0 : 1), into + (u < v ? 1 : 0), shift_, 2, 0, 0, 0}, phase_};
       }
-      rows_.readStrided(intoU, u + start, chromaU_.step, chromaCount_);
-      rows_.readStrided(intoV, v + start, chromaU_.step, chromaCount_);
-      return {{intoU, intoV, shift_, 1, 0, 0, 0}, phase_};
+      rows_.readStrided(into, u + start, chromaU_.step, chromaCount_);
+      rows_.readStrided(second, v + start, chromaU_.step, chromaCount_);
+      return {{into, second, shift_, 1, 0, 0, 0}, phase_};
     case PixelChromaRead::kPairs:
-      rows_.readPairs(packed_, u, chromaU_.plan);
-      rows_.deinterleave(intoU, intoV, packed_, chromaCount_);
-      return {{intoU, intoV, 0, 1, 0, 0, 0}};
+      rows_.readPairs(into, u, chromaU_.plan);
+      return {{into, into + 1, 0, 2, 0, 0, 0}};
     default:
-      return {{ReadSamples(intoU, u, chromaU_), ReadSamples(intoV, v, chromaU_), 0, 1, 0, 0, 0}};
+      return {{ReadSamples(into, u, chromaU_), ReadSamples(second, v, chromaU_), 0, 1, 0, 0, 0}};
   }
 }
 

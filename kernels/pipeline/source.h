@@ -82,8 +82,10 @@ class Source {
   // whole bytes. Not to be mixed with Rgb in a strip.
   const uint8_t* Pixels(int32_t r);
   const PixelFormat& pixelFormat() const { return pixels_; }
-  PixelChroma ChromaOfPixels(int32_t r) { return ChromaOfPixels(r, u_, v_); }
-  PixelChroma ChromaOfPixels(int32_t r, uint8_t* u, uint8_t* v);
+  PixelChroma ChromaOfPixels(int32_t r) { return ChromaOfPixels(r, packed_); }
+  // What is not in place is made in `into`, two bytes for each of chromaCount().
+  PixelChroma ChromaOfPixels(int32_t r, uint8_t* into);
+  int chromaCount() const { return chromaCount_; }
   bool ChromaIsGrey() const { return pixelChroma_ == PixelChromaRead::kGrey; }
   // Where the luma of the strip lies in the source as it is wanted; null when it does not.
   const uint8_t* LumaInPlace(int32_t r) const;

@@ -209,6 +209,9 @@ inline Bytes InTurn(Bytes b) {
 inline Words InTurn(Words w) {
   return w;
 }
+inline WordsPair LoadPixelWordsInTurn(const uint8_t* p) {
+  return LoadPixelWords(p);
+}
 inline void Store4InTurn(uint8_t* p, Bytes a, Bytes b, Bytes c, Bytes d) {
   Store4(p, a, b, c, d);
 }

@@ -409,7 +409,15 @@ struct ChromaShare {
 };
 
 // Chroma as it is taken from memory: a for the pixel's low channel and b for its high one.
-enum class ChromaLayout { kEveryPixel, kPlanes, kPairsOfAB, kPairsOfBA };
+// Half as many samples as pixels, or as many; in planes or in pairs.
+enum class ChromaLayout {
+  kHalfPlanes,
+  kHalfPairsOfAB,
+  kHalfPairsOfBA,
+  kPlanes,
+  kPairsOfAB,
+  kPairsOfBA
+};
 
 template <YuvToRgbForm kForm>
 struct ChromaTerms {
@@ -497,10 +505,18 @@ struct PixelLines {
 };
 
 constexpr bool IsHalf(ChromaLayout layout) {
-  return layout != ChromaLayout::kEveryPixel;
+  return layout < ChromaLayout::kPlanes;
 }
 constexpr bool IsPairs(ChromaLayout layout) {
-  return layout == ChromaLayout::kPairsOfAB || layout == ChromaLayout::kPairsOfBA;
+  return layout != ChromaLayout::kPlanes && layout != ChromaLayout::kHalfPlanes;
+}
+constexpr bool IsBFirst(ChromaLayout layout) {
+  return layout == ChromaLayout::kPairsOfBA || layout == ChromaLayout::kHalfPairsOfBA;
+}
+// Bytes of each plane for some pixels, of the pairs if there are such.
+constexpr int ChromaBytes(ChromaLayout layout, int pixels) {
+  const int samples = IsHalf(layout) ? pixels / 2 : pixels;
+  return IsPairs(layout) ? 2 * samples : samples;
 }
 
 // Samples as the pixels of kPixel bytes are stored.
@@ -509,23 +525,32 @@ inline Samples Ordered(Samples samples) {
   return kPixel == 4 ? InTurn(samples) : samples;
 }
 
+// The terms of words of pairs.
+template <YuvToRgbForm kForm, ChromaLayout kLayout>
+inline ChromaTerms<kForm> TermsOfPairs(const ColourStage<kForm>& stage, Words pairs) {
+  const Words first = pairs & SetWords(0xFF);
+  const Words second = ShiftRightUnsigned<8>(pairs);
+  return IsBFirst(kLayout) ? stage.Terms(second, first) : stage.Terms(first, second);
+}
+
 template <YuvToRgbForm kForm, ChromaLayout kLayout, int kPixel>
 inline void LoadTerms(const ColourStage<kForm>& stage, const uint8_t* a, const uint8_t* b,
                       ChromaTerms<kForm>* low, ChromaTerms<kForm>* high) {
-  if constexpr (!IsHalf(kLayout)) {
+  if constexpr (kLayout == ChromaLayout::kPlanes) {
     const WordsPair wideA = Widen(Ordered<kPixel>(LoadBytes(a)));
     const WordsPair wideB = Widen(Ordered<kPixel>(LoadBytes(b)));
     *low = stage.Terms(wideA.low, wideB.low);
     *high = stage.Terms(wideA.high, wideB.high);
     return;
+  } else if constexpr (!IsHalf(kLayout)) {
+    const WordsPair pairs = kPixel == 4 ? LoadPixelWordsInTurn(a) : LoadPixelWords(a);
+    *low = TermsOfPairs<kForm, kLayout>(stage, pairs.low);
+    *high = TermsOfPairs<kForm, kLayout>(stage, pairs.high);
+    return;
   }
   ChromaTerms<kForm> terms;
   if constexpr (IsPairs(kLayout)) {
-    const Words pairs = Ordered<kPixel>(LoadWords(a));
-    const Words first = pairs & SetWords(0xFF);
-    const Words second = ShiftRightUnsigned<8>(pairs);
-    terms = kLayout == ChromaLayout::kPairsOfAB ? stage.Terms(first, second)
-                                                : stage.Terms(second, first);
+    terms = TermsOfPairs<kForm, kLayout>(stage, Ordered<kPixel>(LoadWords(a)));
   } else {
     terms = stage.Terms(Ordered<kPixel>(LoadHalf(a)), Ordered<kPixel>(LoadHalf(b)));
   }
@@ -565,7 +590,7 @@ inline void PrefetchRows(const uint8_t* dst, ptrdiff_t pitch, int rows, int byte
 // n pixels of each row, whole vectors of them.
 template <YuvToRgbForm kForm, ChromaLayout kLayout, int kPixel>
 void ConvertVectors(const void* colourStage, const PixelLines& lines, uint8_t alphaByte, int n) {
-  constexpr int kChroma = IsHalf(kLayout) && !IsPairs(kLayout) ? kBytes / 2 : kBytes;
+  constexpr int kChroma = ChromaBytes(kLayout, kBytes);
   const ColourStage<kForm> stage = *static_cast<const ColourStage<kForm>*>(colourStage);
   const Bytes alpha = SetBytes(alphaByte);
   const int share = 1 << lines.rowShift;
@@ -620,7 +645,7 @@ struct PixelConversion {
 
  private:
   PixelLines At(const PixelLines& lines, int i, int row) const {
-    const int sample = IsHalf(layout) && !IsPairs(layout) ? i / 2 : i;
+    const int sample = ChromaBytes(layout, i);
     PixelLines at = lines;
     at.dst += row * lines.dstPitch + ptrdiff_t{i} * pixel;
     at.y += row * lines.yPitch + i;
@@ -633,15 +658,15 @@ struct PixelConversion {
   // The first rows of `lines`, as many as share chroma.
   void ConvertRest(const PixelLines& lines, int n) const {
     uint8_t y[2][kBytes] = {};
-    uint8_t a[kBytes] = {};
+    uint8_t a[2 * kBytes] = {};
     uint8_t b[kBytes] = {};
     uint8_t pixels[2][4 * kBytes];
     const int share = 1 << lines.rowShift;
     const int rows = share < lines.rows ? share : lines.rows;
     for (int row = 0; row < rows; ++row) memcpy(y[row], lines.y + row * lines.yPitch, size_t(n));
-    const int samples = IsHalf(layout) ? (n + 1) / 2 : n;
-    memcpy(a, lines.a, size_t(IsPairs(layout) ? 2 * samples : samples));
-    if (!IsPairs(layout)) memcpy(b, lines.b, size_t(samples));
+    const int bytes = ChromaBytes(layout, IsHalf(layout) ? n + 1 : n);
+    memcpy(a, lines.a, size_t(bytes));
+    if (!IsPairs(layout)) memcpy(b, lines.b, size_t(bytes));
     vectors(stage, {pixels[0], 4 * kBytes, y[0], kBytes, a, b, 0, 0, rows, lines.rowShift}, alpha,
             kBytes);
     for (int row = 0; row < rows; ++row) {
@@ -652,7 +677,9 @@ struct PixelConversion {
 
 template <YuvToRgbForm kForm, int kPixel>
 constexpr decltype(PixelConversion::vectors) kConverters[] = {
-    ConvertVectors<kForm, ChromaLayout::kEveryPixel, kPixel>,
+    ConvertVectors<kForm, ChromaLayout::kHalfPlanes, kPixel>,
+    ConvertVectors<kForm, ChromaLayout::kHalfPairsOfAB, kPixel>,
+    ConvertVectors<kForm, ChromaLayout::kHalfPairsOfBA, kPixel>,
     ConvertVectors<kForm, ChromaLayout::kPlanes, kPixel>,
     ConvertVectors<kForm, ChromaLayout::kPairsOfAB, kPixel>,
     ConvertVectors<kForm, ChromaLayout::kPairsOfBA, kPixel>,
@@ -671,13 +698,10 @@ void ConvertYuv(const PixelRows& rows, const ChromaRows& chroma, const YuvToRgbW
   const uint8_t* b = aIsU ? chroma.v : chroma.u;
   const ptrdiff_t aPitch = aIsU ? chroma.uPitch : chroma.vPitch;
   const ptrdiff_t bPitch = aIsU ? chroma.vPitch : chroma.uPitch;
-  ChromaLayout layout = ChromaLayout::kEveryPixel;
-  if (chroma.shift != 0) {
-    layout = chroma.step == 1 ? ChromaLayout::kPlanes
-             : a < b          ? ChromaLayout::kPairsOfAB
-                              : ChromaLayout::kPairsOfBA;
-  }
-  if (layout == ChromaLayout::kPairsOfBA) a = b;  // where the pairs begin
+  const ChromaLayout planes = chroma.shift != 0 ? ChromaLayout::kHalfPlanes : ChromaLayout::kPlanes;
+  const int order = chroma.step == 1 ? 0 : a < b ? 1 : 2;
+  const ChromaLayout layout = ChromaLayout(int(planes) + order);
+  if (IsBFirst(layout)) a = b;  // where the pairs begin
   const auto& converters = shape.bytes == 4   ? kConverters<kForm, 4>
                            : shape.bytes == 3 ? kConverters<kForm, 3>
                                               : kConverters<kForm, 2>;
@@ -691,9 +715,7 @@ void YuvToPixels(const PixelRows& rows, const ChromaRows& chroma, const YuvToRgb
                  const PixelFormat& format, AlphaFill alpha, int n) {
   const PixelShape shape(format);
   const uint8_t fill = AlphaOf(alpha);
-  // (Pairs for every pixel are taken apart before they come here.)
-  const bool known = shape.bytes != 0 && (chroma.shift != 0 || chroma.step == 1);
-  if (!known) return scalar::YuvToPixels(rows, chroma, colour, format, alpha, n);
+  if (shape.bytes == 0) return scalar::YuvToPixels(rows, chroma, colour, format, alpha, n);
   switch (colour.form) {
     case YuvToRgbForm::kTable:
       return ConvertYuv<YuvToRgbForm::kTable>(rows, chroma, colour.wide, shape, fill, n);

@@ -181,6 +181,12 @@ inline Bytes InTurn(Bytes b) {
 inline Words InTurn(Words w) {
   return {InTurn(w.v)};
 }
+// Words of a vector's pixels, in that order.
+inline WordsPair LoadPixelWordsInTurn(const uint8_t* p) {
+  const Register order = _mm512_setr_epi64(0, 4, 1, 5, 2, 6, 3, 7);
+  return {{_mm512_permutexvar_epi64(order, Load(p))},
+          {_mm512_permutexvar_epi64(order, Load(p + kBytes))}};
+}
 inline void Store4InTurn(uint8_t* p, Bytes a, Bytes b, Bytes c, Bytes d) {
   const Quads quads = Interleave4(a, b, c, d);
   for (int i = 0; i < 4; ++i) Store(p + kBytes * i, quads.v[i]);

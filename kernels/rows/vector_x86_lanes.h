@@ -107,6 +107,15 @@ inline Bytes InTurn(Bytes b) {
 inline Words InTurn(Words w) {
   return {InTurn(w.v)};
 }
+// Words of a vector's pixels, in that order.
+inline WordsPair LoadPixelWordsInTurn(const uint8_t* p) {
+#ifdef __AVX2__
+  return {{_mm256_permute4x64_epi64(Load(p), 0xD8)},
+          {_mm256_permute4x64_epi64(Load(p + kBytes), 0xD8)}};
+#else
+  return LoadPixelWords(p);
+#endif
+}
 inline void Store4InTurn(uint8_t* p, Bytes a, Bytes b, Bytes c, Bytes d) {
   const Quads quads = Interleave4(a, b, c, d);
   for (int i = 0; i < 4; ++i) Store(p + kBytes * i, quads.v[i]);
