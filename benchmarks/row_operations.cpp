@@ -104,6 +104,7 @@ struct Runs {
     plan.second = neighbours.data();
     plan.stride = 1;
     plan.weights = weights.data();
+    plan.blends = blends.data();
     inChannels[0] = a.data();
     inChannels[1] = b.data();
     inChannels[2] = c.data();
@@ -125,6 +126,7 @@ struct Runs {
   std::vector<uint8_t> out[3];
   std::vector<int32_t> scaled, scaledPixels, neighbours;
   std::vector<uint16_t> weights;
+  std::vector<uint8_t> blends = std::vector<uint8_t>(4 * kPairs);
   kestrel::PairPlan plan = {};
   kestrel::Carry carry = {{7, 3, 7}, {0, 0, 0}};
   const uint8_t* inChannels[3];

@@ -23,6 +23,16 @@ void SampleColumns::Plan(const RowOps& rows) {
   plan.first = offset;
   plan.second = offset + 1;
   plan.stride = 2;
+  plan.weights = nullptr;
+  rows.planPairs(&plan);
+}
+
+void SampleColumns::PlanWith(const int32_t* second, const uint16_t* weights, const RowOps& rows) {
+  plan.n = n;
+  plan.first = offset;
+  plan.second = second;
+  plan.stride = 1;
+  plan.weights = weights;
   rows.planPairs(&plan);
 }
 
@@ -72,22 +82,14 @@ void Source::SelectColumns(int32_t x, int n) {
     if (pixels_.bytes != 2 || interpolates_ || palette_ != nullptr) return;
     int32_t* const second = chromaU_.offset;
     for (int i = 0; i < n; ++i) second[i] = first_.offset[i] + 1;
-    first_.plan.n = n;
-    first_.plan.first = first_.offset;
-    first_.plan.second = second;
-    first_.plan.stride = 1;
-    rows_.planPairs(&first_.plan);
+    first_.PlanWith(second, nullptr, rows_);
     return;
   }
   if (!interpolates_) {
     first_.Plan(rows_);
   } else {
-    blend_.n = n;
-    blend_.first = first_.offset;
-    blend_.second = second_.offset;
-    blend_.stride = 1;
-    blend_.weights = weights_;
-    rows_.planPairs(&blend_);
+    first_.plan.blends = blends_;
+    first_.PlanWith(second_.offset, weights_, rows_);
   }
 }
 
@@ -130,11 +132,8 @@ void Source::SelectPixelChroma(int32_t x, int n) {
   if (grouped) {
     pixelChroma_ = PixelChromaRead::kPairs;
     for (int i = 0; i < n; ++i) chromaV_.offset[i] = chromaU_.offset[i] + int32_t(vFromU);
-    chromaU_.plan.n = n;
-    chromaU_.plan.first = chromaU_.offset;
-    chromaU_.plan.second = chromaV_.offset;
-    chromaU_.plan.stride = 1;
-    rows_.planPairs(&chromaU_.plan);
+    chromaU_.n = n;
+    chromaU_.PlanWith(chromaV_.offset, nullptr, rows_);
   } else {
     pixelChroma_ = PixelChromaRead::kGathered;
     chromaU_.Finish(n);
@@ -264,7 +263,7 @@ void Source::ReadPixels(uint8_t* const rgb[3], const uint8_t* row, const SampleC
 void Source::FillLumaLine(Line* line, int32_t row) {
   const uint8_t* start = RowStart(0, row);
   if (interpolates_) {
-    rows_.blendPairs(line->samples[0], start, blend_);
+    rows_.blendPairs(line->samples[0], start, first_.plan);
     line->channel[0] = line->samples[0];
   } else {
     line->channel[0] = ReadSamples(line->samples[0], start, first_);

@@ -14,11 +14,13 @@ struct SampleColumns {
   ptrdiff_t step = 1;       // bytes between neighbouring samples of the row
   bool contiguous = false;  // offsets rise by exactly `step`
   int32_t offset[kStrip];   // bytes from the start of the row
-  PairPlan plan;            // of neighbouring columns; for ReadSamples, unless contiguous
+  PairPlan plan;            // of neighbouring columns for ReadSamples, or of each with another
 
   void Set(int i, int64_t sample) { offset[i] = int32_t(sample * step); }
   void Finish(int count);
   void Plan(const RowOps& rows);
+  // Pairs of each column's sample and another, with weights or null.
+  void PlanWith(const int32_t* second, const uint16_t* weights, const RowOps& rows);
 };
 
 // A run of channel values; points into the strip's buffers or straight into the source.
@@ -138,7 +140,7 @@ class Source {
 
   SampleColumns first_, second_, chromaU_, chromaV_;
   uint16_t weights_[kStrip];
-  PairPlan blend_;  // of first_ and second_, where the strip interpolates
+  uint8_t blends_[4 * kStrip];  // of first_.plan, where the strip interpolates
   PixelChromaRead pixelChroma_ = PixelChromaRead::kGrey;
   int chromaCount_ = 0, phase_ = 0, shift_ = 0;
   Line lines_[2];

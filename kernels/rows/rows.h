@@ -97,18 +97,18 @@ struct LevelMap {
 // for itself. The lists are the caller's: byte offsets from the start of a row.
 struct PairPlan {
   static constexpr int kMost = 512;
-  int n;
-  const int32_t* first;  // of pair i: first[i * stride], second[i * stride]
-  const int32_t* second;
-  int stride;
-  const uint16_t* weights;  // for blendPairs: a weight for each pair
-  bool hasWindows;          // everywhere
-  // Of each eight pairs: a window of 16 bytes for each half of them, and where in it their bytes
-  // are.
-  struct Eight {
-    int32_t window[2];
-    uint8_t shuffle[2][8];
-  } eights[kMost / 8];
+  int n = 0;
+  const int32_t* first = nullptr;  // of pair i: first[i * stride], second[i * stride]
+  const int32_t* second = nullptr;
+  int stride = 1;
+  const uint16_t* weights = nullptr;  // for blendPairs: a weight for each pair
+  uint8_t* blends = nullptr;          // and memory for four bytes for each pair
+
+  // Of each eight pairs: one or two windows of 16 bytes, for all or for half of them, or -1 where
+  // there is none, and where in the windows their bytes are; by blocks as vectors take them.
+  int windows;      // of each eight
+  bool hasWindows;  // everywhere
+  uint8_t prepared[3 * kMost];
 };
 
 // Byte offsets of two neighbouring pixels, and the weight of the second.
@@ -139,7 +139,7 @@ struct KestrelRowOps {
   void (*gather)(uint8_t* dst, const uint8_t* src, const int32_t* offsets, int n);
   // Pixels of `bytes` bytes at src + offsets[i], packed together.
   void (*gatherPixels)(uint8_t* dst, const uint8_t* src, const int32_t* offsets, int bytes, int n);
-  // Prepares a plan whose n (at most kMost) and lists are set.
+  // Prepares a plan whose n (at most kMost) and lists are set, and, if it has weights, its memory.
   void (*planPairs)(kestrel::PairPlan* plan);
   // The first and second bytes of pairs in turn.
   void (*readPairs)(uint8_t* dst, const uint8_t* src, const kestrel::PairPlan& plan);

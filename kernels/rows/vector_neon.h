@@ -239,18 +239,73 @@ inline Bytes SwapNeighbours(Bytes b) {
   return {vrev16q_u8(b.v)};
 }
 
-// Eight pairs of a plan, as words: first byte low, second byte high.
-inline uint8x8_t GatherFour(const uint8_t* window, const uint8_t* shuffle) {
+// ---- Pairs of bytes
+// kPairs of them, taken apart.
+constexpr int kPairs = 16;
+struct Pairs {
+  uint8x16_t first, second;
+};
+inline void StorePairs(uint8_t* p, Pairs pairs) {
+  const uint8x16x2_t both = {{pairs.first, pairs.second}};
+  vst2q_u8(p, both);
+}
+// Of a window's pairs the first bytes, then the second ones.
+template <int kShared>
+inline void SetShuffle(uint8_t* shuffle, const uint8_t (&at)[16]) {
+  for (int k = 0; k < 8; ++k) {
+    uint8_t* const window = shuffle + k / kShared * 2 * kShared + k % kShared;
+    window[0] = at[2 * k];
+    window[kShared] = at[2 * k + 1];
+  }
+}
+// All bits where a blend begins with the second byte, and the weights.
+inline void SetBlends(uint8_t* blends, const uint16_t* weights) {
+  const Words low = LoadWords(weights);
+  const Words high = LoadWords(weights + 8);
+  vst1q_u8(blends,
+           vcombine_u8(vmovn_u16(ShiftRight<15>(low).v), vmovn_u16(ShiftRight<15>(high).v)));
+  StoreWords(blends + 16, low);
+  StoreWords(blends + 32, high);
+}
+// What a blend adds to the byte that it begins with, modulo 256.
+inline uint8x8_t Share(uint8x8_t first, uint8x8_t second, const uint8_t* weights) {
+  const int16x8_t difference = vreinterpretq_s16_u16(vsubl_u8(second, first));
+  const int16x8_t product = vqdmulhq_s16(difference, Signed(LoadWords(weights)));
+  return vreinterpret_u8_s8(vshrn_n_s16(product, 1));
+}
+inline void StoreBlended(uint8_t* p, Pairs pairs, const uint8_t* blends) {
+  const uint8x16_t base = vbslq_u8(vld1q_u8(blends), pairs.second, pairs.first);
+  const uint8x8_t low = Share(vget_low_u8(pairs.first), vget_low_u8(pairs.second), blends + 16);
+  const uint8x8_t high = Share(vget_high_u8(pairs.first), vget_high_u8(pairs.second), blends + 32);
+  vst1q_u8(p, vaddq_u8(base, vcombine_u8(low, high)));
+}
+inline uint8x8_t Pick(uint8x16_t window, uint8x8_t shuffle) {
 #ifdef __aarch64__
-  return vqtbl1_u8(vld1q_u8(window), vld1_u8(shuffle));
+  return vqtbl1_u8(window, shuffle);
 #else
-  const uint8x16_t v = vld1q_u8(window);
-  return vtbl2_u8({{vget_low_u8(v), vget_high_u8(v)}}, vld1_u8(shuffle));
+  return vtbl2_u8({{vget_low_u8(window), vget_high_u8(window)}}, shuffle);
 #endif
 }
-inline Words GatherPairs(const uint8_t* src, const PairPlan::Eight* eight) {
-  return {vreinterpretq_u16_u8(vcombine_u8(GatherFour(src + eight->window[0], eight->shuffle[0]),
-                                           GatherFour(src + eight->window[1], eight->shuffle[1])))};
+// Eight pairs of a plan's block: first bytes, then second ones.
+template <int kWindows>
+inline uint8x16_t GatherEight(const uint8_t* src, const int32_t* window, uint8x16_t shuffle) {
+  const uint8x16_t bytes = vld1q_u8(src + window[0]);
+  const uint8x8_t low = Pick(bytes, vget_low_u8(shuffle));
+  const uint8x8_t high =
+      Pick(kWindows == 1 ? bytes : vld1q_u8(src + window[1]), vget_high_u8(shuffle));
+  if constexpr (kWindows == 1) return vcombine_u8(low, high);
+  // Four first bytes and four second ones of either window.
+  const uint32x2x2_t halves = vtrn_u32(vreinterpret_u32_u8(low), vreinterpret_u32_u8(high));
+  return vcombine_u8(vreinterpret_u8_u32(halves.val[0]), vreinterpret_u8_u32(halves.val[1]));
+}
+template <int kWindows>
+inline Pairs GatherPairs(const uint8_t* src, const uint8_t* block) {
+  int32_t window[2 * kWindows];
+  __builtin_memcpy(window, block, sizeof(window));
+  const uint8x16_t a = GatherEight<kWindows>(src, window, vld1q_u8(block + kPairs));
+  const uint8x16_t b = GatherEight<kWindows>(src, window + kWindows, vld1q_u8(block + kPairs + 16));
+  return {vcombine_u8(vget_low_u8(a), vget_low_u8(b)),
+          vcombine_u8(vget_high_u8(a), vget_high_u8(b))};
 }
 
 // ---- Pixels of four bytes

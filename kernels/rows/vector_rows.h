@@ -133,77 +133,107 @@ void BlendPixelRows(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t w
       Units{a, 1}, Units{b, 1});
 }
 
-// Four pairs that share a window. No window reaches beyond the bytes that the run reads anyway,
-// [lowest, end). False when there is none.
-bool PlanWindow(const int32_t (&offsets)[8], int32_t lowest, int32_t end, int32_t* window,
-                uint8_t (&shuffle)[8]) {
+// Pairs that share a window: where it begins, and where in it their bytes are. No window reaches
+// beyond the bytes that the run reads anyway, [lowest, end). False when there is none.
+template <int kPairs>
+bool PlanWindow(const int32_t* offsets, int32_t lowest, int32_t end, int32_t* window, uint8_t* at) {
   int32_t first = offsets[0];
   int32_t last = offsets[0];
-  for (const int32_t offset : offsets) {
-    if (offset < first) first = offset;
-    if (offset > last) last = offset;
+  for (int k = 1; k < 2 * kPairs; ++k) {
+    if (offsets[k] < first) first = offsets[k];
+    if (offsets[k] > last) last = offsets[k];
   }
   if (first > end - 16) first = end - 16;
   const bool fits = first >= lowest && last - first < 16;
   *window = fits ? first : -1;
-  for (int k = 0; k < 8; ++k) shuffle[k] = uint8_t(fits ? offsets[k] - first : 0);
+  for (int k = 0; k < 2 * kPairs; ++k) at[k] = uint8_t(fits ? offsets[k] - first : 0);
   return fits;
 }
 
-void PlanPairs(PairPlan* plan) {
-  const int n = plan->n;
+// A plan's pairs in blocks of kPairs: first the windows of each eight of them (with room for two),
+// then two bytes for each pair.
+inline int32_t WindowAt(const uint8_t* block, int i) {
+  int32_t window;
+  memcpy(&window, block + 4 * i, 4);
+  return window;
+}
+
+// Whether all pairs have windows. One for each eight pairs is given up with the first that has
+// none.
+template <int kWindows>
+bool PlanWindows(PairPlan* plan, int32_t lowest, int32_t end) {
+  plan->windows = kWindows;
   plan->hasWindows = true;
-  if (n == 0) return;
+  for (int i = 0; i < plan->n; i += 8) {
+    int32_t offsets[16];
+    for (int k = 0; k < 8; ++k) {
+      const int pair = (i + k < plan->n ? i + k : plan->n - 1) * plan->stride;
+      offsets[2 * k] = plan->first[pair];
+      offsets[2 * k + 1] = plan->second[pair];
+    }
+    const int eight = i % kPairs / 8;
+    uint8_t* const block = plan->prepared + 3 * (i - i % kPairs);
+    uint8_t at[16];
+    constexpr int kShared = 8 / kWindows;
+    for (int w = 0; w < kWindows; ++w) {
+      int32_t window;
+      const bool fits = PlanWindow<kShared>(offsets + 2 * kShared * w, lowest, end, &window,
+                                            at + 2 * kShared * w);
+      memcpy(block + 4 * (eight * kWindows + w), &window, 4);
+      if (!fits) plan->hasWindows = false;
+    }
+    if (kWindows == 1 && !plan->hasWindows) return false;
+    SetShuffle<kShared>(block + kPairs + 16 * eight, at);
+  }
+  return plan->hasWindows;
+}
+
+void PlanPairs(PairPlan* plan) {
   int32_t lowest = INT32_MAX;
   int32_t end = 0;
-  for (int i = 0; i < n; ++i) {
+  for (int i = 0; i < plan->n; ++i) {
     const int32_t offsets[2] = {plan->first[i * plan->stride], plan->second[i * plan->stride]};
     for (const int32_t offset : offsets) {
       if (offset < lowest) lowest = offset;
       if (offset >= end) end = offset + 1;
     }
   }
-  for (int i = 0; i < n; i += 4) {
-    int32_t offsets[8];
-    for (int k = 0; k < 4; ++k) {
-      const int pair = (i + k < n ? i + k : n - 1) * plan->stride;
-      offsets[2 * k] = plan->first[pair];
-      offsets[2 * k + 1] = plan->second[pair];
-    }
-    PairPlan::Eight& eight = plan->eights[i / 8];
-    const int half = i / 4 % 2;
-    if (!PlanWindow(offsets, lowest, end, &eight.window[half], eight.shuffle[half])) {
-      plan->hasWindows = false;
-    }
+  if (!PlanWindows<1>(plan, lowest, end)) PlanWindows<2>(plan, lowest, end);
+  if (plan->weights == nullptr) return;
+  for (int i = 0; i + kPairs <= plan->n; i += kPairs) {
+    SetBlends(plan->blends + 4 * i, plan->weights + i);
   }
 }
 
-bool HasWindows(const PairPlan::Eight* eights) {
+// Whether the pairs of a block have windows, two for each eight.
+bool HasWindows(const uint8_t* block) {
   int32_t windows = 0;
-  for (int i = 0; i < kWords / 8; ++i) windows |= eights[i].window[0] | eights[i].window[1];
+  for (int k = 0; k < kPairs / 4; ++k) windows |= WindowAt(block, k);
   return windows >= 0;
 }
 
-// Calls block(i, pairs) for each kWords pairs that have windows, other(i, end) for all others and
-// for those that do not fill a vector.
+// Calls block(i, pairs) for each kPairs pairs that have windows, other(i, end) for all others and
+// for those that do not fill a block.
 template <typename Block, typename Other>
 inline void ForPairs(const uint8_t* src, const PairPlan& plan, const Block& block,
                      const Other& other) {
-  const int whole = plan.n / kWords * kWords;
-  const PairPlan::Eight* eights = plan.eights;
-  if (plan.hasWindows) {
-    for (int i = 0; i < whole; i += kWords) {
-      block(i, GatherPairs(src, eights));
-      eights += kWords / 8;
+  const int whole = plan.n / kPairs * kPairs;
+  const uint8_t* prepared = plan.prepared;
+  if (plan.windows == 1) {
+    for (int i = 0; i < whole; i += kPairs, prepared += 3 * kPairs) {
+      block(i, GatherPairs<1>(src, prepared));
+    }
+  } else if (plan.hasWindows) {
+    for (int i = 0; i < whole; i += kPairs, prepared += 3 * kPairs) {
+      block(i, GatherPairs<2>(src, prepared));
     }
   } else {
-    for (int i = 0; i < whole; i += kWords) {
-      if (HasWindows(eights)) {
-        block(i, GatherPairs(src, eights));
+    for (int i = 0; i < whole; i += kPairs, prepared += 3 * kPairs) {
+      if (HasWindows(prepared)) {
+        block(i, GatherPairs<2>(src, prepared));
       } else {
-        other(i, i + kWords);
+        other(i, i + kPairs);
       }
-      eights += kWords / 8;
     }
   }
   other(whole, plan.n);
@@ -211,18 +241,14 @@ inline void ForPairs(const uint8_t* src, const PairPlan& plan, const Block& bloc
 
 void ReadPairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan) {
   ForPairs(
-      src, plan, [=](int i, Words pairs) { StoreWords(dst + 2 * i, pairs); },
+      src, plan, [=](int i, Pairs pairs) { StorePairs(dst + 2 * i, pairs); },
       [=, &plan](int i, int end) { scalar::ReadSomePairs(dst, src, plan, i, end); });
 }
 
 void BlendPairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan) {
-  const uint16_t* const weights = plan.weights;
+  const uint8_t* const blends = plan.blends;
   ForPairs(
-      src, plan,
-      [=](int i, Words pairs) {
-        StoreHalf(dst + i, Blend(pairs & SetWords(0xFF), ShiftRightUnsigned<8>(pairs),
-                                 LoadWords(weights + i)));
-      },
+      src, plan, [=](int i, Pairs pairs) { StoreBlended(dst + i, pairs, blends + 4 * i); },
       [=, &plan](int i, int end) { scalar::BlendSomePairs(dst, src, plan, i, end); });
 }
 

@@ -21,6 +21,9 @@ namespace kestrel {
 namespace {
 
 // ---- Order of bytes
+inline void StoreBlended(uint8_t* p, Pairs pairs, const uint8_t* blends) {
+  StoreHalf(p, Blended(pairs, blends));
+}
 inline Bytes SwapNeighbours(Bytes b) {
   const Words w = {b.v};
   return {(ShiftLeft<8>(w) | ShiftRightUnsigned<8>(w)).v};

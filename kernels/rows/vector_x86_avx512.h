@@ -209,17 +209,21 @@ inline void StoreReversed(uint8_t* p, const uint8_t* src) {
   Store(p, Reorder(Load(src), kReversed<kUnit>));
 }
 
-// kWords pairs of a plan, as words: first byte low, second byte high.
-inline Words GatherPairs(const uint8_t* src, const PairPlan::Eight* eights) {
-  const auto windows = [=](int half) {
-    return Join(Load16(src + eights[0].window[half]), Load16(src + eights[1].window[half]),
-                Load16(src + eights[2].window[half]), Load16(src + eights[3].window[half]));
+// A block of a plan.
+template <int kWindows>
+inline Pairs GatherPairs(const uint8_t* src, const uint8_t* block) {
+  int32_t window[4 * kWindows];
+  __builtin_memcpy(window, block, sizeof(window));
+  const Register shuffle = Load(block + kPairs);
+  const auto bytes = [&](int half) {
+    return Join(Load16(src + window[half]), Load16(src + window[kWindows + half]),
+                Load16(src + window[2 * kWindows + half]),
+                Load16(src + window[3 * kWindows + half]));
   };
-  const Register shuffle = Join(Load16(eights[0].shuffle), Load16(eights[1].shuffle),
-                                Load16(eights[2].shuffle), Load16(eights[3].shuffle));
+  const Register first = _mm512_shuffle_epi8(bytes(0), shuffle);
+  if constexpr (kWindows == 1) return {first};
   constexpr uint64_t kUpperHalves = 0xFF00FF00FF00FF00;
-  return {_mm512_mask_shuffle_epi8(_mm512_shuffle_epi8(windows(0), shuffle), kUpperHalves,
-                                   windows(1), shuffle)};
+  return {_mm512_mask_shuffle_epi8(first, kUpperHalves, bytes(1), shuffle)};
 }
 
 // The odd bytes of two vectors.

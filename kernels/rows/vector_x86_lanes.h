@@ -182,18 +182,22 @@ inline void StoreReversed(uint8_t* p, const uint8_t* src) {
   Store(p, v);
 #endif
 }
-// kWords pairs of a plan, as words: first byte low, second byte high.
-inline __m128i GatherEight(const uint8_t* src, const PairPlan::Eight& eight) {
-  return _mm_unpacklo_epi64(
-      _mm_shuffle_epi8(Load16(src + eight.window[0]), Load8(eight.shuffle[0])),
-      _mm_shuffle_epi8(Load16(src + eight.window[1]), Load8(eight.shuffle[1])));
-}
-inline Words GatherPairs(const uint8_t* src, const PairPlan::Eight* eights) {
+// A block of a plan.
+template <int kWindows>
+inline Pairs GatherPairs(const uint8_t* src, const uint8_t* block) {
+  int32_t window[kPairs / 8 * kWindows];
+  __builtin_memcpy(window, block, sizeof(window));
+  const Register shuffle = Load(block + kPairs);
+  const auto gather = [&](int half) {
 #ifdef __AVX2__
-  return {Join(GatherEight(src, eights[0]), GatherEight(src, eights[1]))};
+    const Register bytes = Join(Load16(src + window[half]), Load16(src + window[kWindows + half]));
 #else
-  return {GatherEight(src, eights[0])};
+    const Register bytes = Load16(src + window[half]);
 #endif
+    return KESTREL_SIMD(shuffle_epi8)(bytes, shuffle);
+  };
+  if constexpr (kWindows == 1) return {gather(0)};
+  return {KESTREL_SIMD(blend_epi16)(gather(0), gather(1), 0xF0)};
 }
 
 // ---- Pixels of four bytes

@@ -207,6 +207,30 @@ class ChromaWord {
   Words offset_, carry_;
 };
 
+// ---- Pairs of bytes
+// kPairs of them as words: first byte low, second byte high.
+constexpr int kPairs = kWords;
+using Pairs = Words;
+inline void StorePairs(uint8_t* p, Pairs pairs) {
+  StoreWords(p, pairs);
+}
+template <int kShared>
+inline void SetShuffle(uint8_t* shuffle, const uint8_t (&at)[16]) {
+  Store16(shuffle, Load16(at));
+}
+// What each byte of a pair counts in the byte that its blend begins with, and the weights.
+inline void SetBlends(uint8_t* blends, const uint16_t* weights) {
+  const Words isSecond = ShiftRightUnsigned<15>(LoadWords(weights));
+  StoreWords(blends, ShiftLeft<8>(isSecond) | (isSecond ^ SetWords(1)));
+  StoreWords(blends + kBytes, LoadWords(weights));
+}
+inline Words Blended(Pairs pairs, const uint8_t* blends) {
+  const Register minusFirst = KESTREL_SIMD(set1_epi16)(0x01FF);
+  const Words difference = {KESTREL_SIMD(maddubs_epi16)(pairs.v, minusFirst)};
+  const Words base = {KESTREL_SIMD(maddubs_epi16)(pairs.v, Load(blends))};
+  return AddHighProduct(base, difference, LoadWords(blends + kBytes));
+}
+
 // ---- Between bytes and words
 inline WordsPair Widen(Bytes b) {
   return {{KESTREL_SIMD(unpacklo_epi8)(b.v, Zero())}, {KESTREL_SIMD(unpackhi_epi8)(b.v, Zero())}};
