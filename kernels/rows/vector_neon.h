@@ -239,6 +239,45 @@ inline Bytes SwapNeighbours(Bytes b) {
   return {vrev16q_u8(b.v)};
 }
 
+// ---- Bytes that are multiplied
+using Multiplicands = Bytes;
+struct MultiplicandsPair {
+  Multiplicands first, second;
+};
+inline Multiplicands ToMultiplicands(Bytes b) {
+  return b;
+}
+// Of kBytes pairs.
+template <bool kInTurn>
+inline MultiplicandsPair LoadMultiplicands(const uint8_t* p) {
+  MultiplicandsPair pair;
+  Load2(p, &pair.first, &pair.second);
+  return pair;
+}
+struct ByteFactor {
+  explicit ByteFactor(int value) : v(vdup_n_u8(uint8_t(value))) {}
+  uint8x8_t v;
+};
+inline WordsPair MultiplyAdd(WordsPair sum, Multiplicands a, const ByteFactor& f) {
+  return {{vmlal_u8(sum.low.v, vget_low_u8(a.v), f.v)},
+          {vmlal_u8(sum.high.v, vget_high_u8(a.v), f.v)}};
+}
+inline WordsPair MultiplySubtract(WordsPair sum, Multiplicands a, const ByteFactor& f) {
+  return {{vmlsl_u8(sum.low.v, vget_low_u8(a.v), f.v)},
+          {vmlsl_u8(sum.high.v, vget_high_u8(a.v), f.v)}};
+}
+
+// What a blend of a and b adds to the one that it begins with, modulo 256.
+inline uint8x8_t Share(uint8x8_t a, uint8x8_t b, Words weights) {
+  const int16x8_t difference = vreinterpretq_s16_u16(vsubl_u8(b, a));
+  return vreinterpret_u8_s8(vshrn_n_s16(vqdmulhq_s16(difference, Signed(weights)), 1));
+}
+inline Bytes AddShare(Bytes base, Bytes a, Bytes b, Words weight) {
+  const uint8x8_t low = Share(vget_low_u8(a.v), vget_low_u8(b.v), weight);
+  const uint8x8_t high = Share(vget_high_u8(a.v), vget_high_u8(b.v), weight);
+  return {vaddq_u8(base.v, vcombine_u8(low, high))};
+}
+
 // ---- Pairs of bytes
 // kPairs of them, taken apart.
 constexpr int kPairs = 16;
@@ -267,16 +306,12 @@ inline void SetBlends(uint8_t* blends, const uint16_t* weights) {
   StoreWords(blends + 16, low);
   StoreWords(blends + 32, high);
 }
-// What a blend adds to the byte that it begins with, modulo 256.
-inline uint8x8_t Share(uint8x8_t first, uint8x8_t second, const uint8_t* weights) {
-  const int16x8_t difference = vreinterpretq_s16_u16(vsubl_u8(second, first));
-  const int16x8_t product = vqdmulhq_s16(difference, Signed(LoadWords(weights)));
-  return vreinterpret_u8_s8(vshrn_n_s16(product, 1));
-}
 inline void StoreBlended(uint8_t* p, Pairs pairs, const uint8_t* blends) {
   const uint8x16_t base = vbslq_u8(vld1q_u8(blends), pairs.second, pairs.first);
-  const uint8x8_t low = Share(vget_low_u8(pairs.first), vget_low_u8(pairs.second), blends + 16);
-  const uint8x8_t high = Share(vget_high_u8(pairs.first), vget_high_u8(pairs.second), blends + 32);
+  const uint8x8_t low =
+      Share(vget_low_u8(pairs.first), vget_low_u8(pairs.second), LoadWords(blends + 16));
+  const uint8x8_t high =
+      Share(vget_high_u8(pairs.first), vget_high_u8(pairs.second), LoadWords(blends + 32));
   vst1q_u8(p, vaddq_u8(base, vcombine_u8(low, high)));
 }
 inline uint8x8_t Pick(uint8x16_t window, uint8x8_t shuffle) {

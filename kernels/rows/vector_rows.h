@@ -76,11 +76,9 @@ void BlendRowsFrom(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t we
   ForRun<1>(
       dsts, n,
       [=](uint8_t* const* out, const uint8_t* inA, const uint8_t* inB) {
-        const WordsPair first = Widen(LoadBytes(inA));
-        const WordsPair second = Widen(LoadBytes(inB));
-        const WordsPair& base = kFromSecond ? second : first;
-        StoreBytes(out[0], Narrow(AddHighProduct(base.low, second.low - first.low, w),
-                                  AddHighProduct(base.high, second.high - first.high, w)));
+        const Bytes first = LoadBytes(inA);
+        const Bytes second = LoadBytes(inB);
+        StoreBytes(out[0], AddShare(kFromSecond ? second : first, first, second, w));
       },
       Units{a, 1}, Units{b, 1});
 }
@@ -434,6 +432,8 @@ struct ChromaShare {
   int32_t sixBitGain, sixBitOffset, sixBitGreenGain;
 };
 
+constexpr int kGreenOffset = 8669;  // in the six-bit form
+
 // Chroma as it is taken from memory: a for the pixel's low channel and b for its high one.
 // Half as many samples as pixels, or as many; in planes or in pairs.
 enum class ChromaLayout {
@@ -473,7 +473,7 @@ class ColourStage {
   ChromaTerms<kForm> Terms(Words a, Words b) const {
     if constexpr (kForm == YuvToRgbForm::kSixBits) {
       const Words green =
-          MultiplySubtract(MultiplySubtract(SetWords(8669), a, sixGreenA_), b, sixGreenB_);
+          MultiplySubtract(MultiplySubtract(SetWords(kGreenOffset), a, sixGreenA_), b, sixGreenB_);
       return {{ShiftRight<6>(MultiplyAdd(sixOffsetA_, a, sixA_)), ShiftRight<6>(green),
                ShiftRight<6>(MultiplyAdd(sixOffsetB_, b, sixB_))}};
     } else {
@@ -516,6 +516,38 @@ class ColourStage {
   Factor lumaWhole_, lumaPart_;
   Factor sixA_, sixB_, sixGreenA_, sixGreenB_;
   Words sixOffsetA_, sixOffsetB_;
+};
+
+// The six-bit form where each pixel has its own chroma: products are added to luma at once.
+class SixBitStage {
+ public:
+  SixBitStage(const ChromaShare& a, const ChromaShare& b)
+      : a_(a.sixBitGain),
+        b_(b.sixBitGain),
+        greenA_(a.sixBitGreenGain),
+        greenB_(b.sixBitGreenGain),
+        offsetA_(SetWords(a.sixBitOffset)),
+        offsetB_(SetWords(b.sixBitOffset)),
+        greenOffset_(SetWords(kGreenOffset)) {}
+
+  struct Channels {
+    Bytes low, middle, high;
+  };
+  Channels Convert(Bytes y, const Multiplicands& a, const Multiplicands& b) const {
+    const WordsPair wide = Widen(y);
+    const WordsPair luma = {ShiftLeft<6>(wide.low), ShiftLeft<6>(wide.high)};
+    const auto plus = [&](Words offset) {
+      return WordsPair{luma.low + offset, luma.high + offset};
+    };
+    const auto narrow = [](WordsPair sum) { return NarrowShifted<6>(sum.low, sum.high); };
+    return {narrow(MultiplyAdd(plus(offsetA_), a, a_)),
+            narrow(MultiplySubtract(MultiplySubtract(plus(greenOffset_), a, greenA_), b, greenB_)),
+            narrow(MultiplyAdd(plus(offsetB_), b, b_))};
+  }
+
+ private:
+  ByteFactor a_, b_, greenA_, greenB_;
+  Words offsetA_, offsetB_, greenOffset_;
 };
 
 // Rows of pixels with their chroma, 1 << rowShift of them to a row of it.
@@ -588,6 +620,16 @@ inline void LoadTerms(const ColourStage<kForm>& stage, const uint8_t* a, const u
   }
 }
 
+// Pixels from samples that were Ordered.
+template <int kPixel>
+inline void StoreOrdered(uint8_t* dst, Bytes low, Bytes middle, Bytes high, Bytes alpha) {
+  if constexpr (kPixel == 4) {
+    Store4InTurn(dst, low, middle, high, alpha);
+  } else {
+    StorePixels<kPixel>(dst, low, middle, high, alpha);
+  }
+}
+
 template <YuvToRgbForm kForm, int kPixel>
 inline void ConvertLine(const ColourStage<kForm>& stage, uint8_t* dst, const uint8_t* y,
                         const ChromaTerms<kForm>& low, const ChromaTerms<kForm>& high,
@@ -595,14 +637,24 @@ inline void ConvertLine(const ColourStage<kForm>& stage, uint8_t* dst, const uin
   const WordsPair luma = Widen(Ordered<kPixel>(LoadBytes(y)));
   const auto first = stage.Add(luma.low, low.term);
   const auto second = stage.Add(luma.high, high.term);
-  const Bytes channels[] = {stage.Clamp(first.low, second.low),
-                            stage.Clamp(first.middle, second.middle),
-                            stage.Clamp(first.high, second.high)};
-  if constexpr (kPixel == 4) {
-    Store4InTurn(dst, channels[0], channels[1], channels[2], alpha);
+  StoreOrdered<kPixel>(dst, stage.Clamp(first.low, second.low),
+                       stage.Clamp(first.middle, second.middle),
+                       stage.Clamp(first.high, second.high), alpha);
+}
+
+template <ChromaLayout kLayout, int kPixel>
+inline void ConvertLine(const SixBitStage& stage, uint8_t* dst, const uint8_t* y, const uint8_t* a,
+                        const uint8_t* b, Bytes alpha) {
+  MultiplicandsPair chroma;
+  if constexpr (!IsPairs(kLayout)) {
+    chroma = {ToMultiplicands(Ordered<kPixel>(LoadBytes(a))),
+              ToMultiplicands(Ordered<kPixel>(LoadBytes(b)))};
   } else {
-    StorePixels<kPixel>(dst, channels[0], channels[1], channels[2], alpha);
+    chroma = LoadMultiplicands<kPixel == 4>(a);
+    if constexpr (IsBFirst(kLayout)) chroma = {chroma.second, chroma.first};
   }
+  const auto channels = stage.Convert(Ordered<kPixel>(LoadBytes(y)), chroma.first, chroma.second);
+  StoreOrdered<kPixel>(dst, channels.low, channels.middle, channels.high, alpha);
 }
 
 // Asks for the cache lines of some rows of a block that is narrower than the picture it lies in.
@@ -613,11 +665,21 @@ inline void PrefetchRows(const uint8_t* dst, ptrdiff_t pitch, int rows, int byte
   }
 }
 
+template <YuvToRgbForm kForm, bool kChromaIsShared>
+struct StageFor {
+  using Stage = ColourStage<kForm>;
+};
+template <>
+struct StageFor<YuvToRgbForm::kSixBits, false> {
+  using Stage = SixBitStage;
+};
+
 // n pixels of each row, whole vectors of them.
 template <YuvToRgbForm kForm, ChromaLayout kLayout, int kPixel>
 void ConvertVectors(const void* colourStage, const PixelLines& lines, uint8_t alphaByte, int n) {
   constexpr int kChroma = ChromaBytes(kLayout, kBytes);
-  const ColourStage<kForm> stage = *static_cast<const ColourStage<kForm>*>(colourStage);
+  using Stage = typename StageFor<kForm, IsHalf(kLayout)>::Stage;
+  const Stage stage = *static_cast<const Stage*>(colourStage);
   const Bytes alpha = SetBytes(alphaByte);
   const int share = 1 << lines.rowShift;
   const bool isNarrow = lines.rows > share &&
@@ -632,11 +694,19 @@ void ConvertVectors(const void* colourStage, const PixelLines& lines, uint8_t al
     const uint8_t* a = lines.a + chromaRow * lines.aPitch;
     const uint8_t* b = lines.b + chromaRow * lines.bPitch;
     for (int i = 0; i < n; i += kBytes) {
-      ChromaTerms<kForm> low, high;
-      LoadTerms<kForm, kLayout, kPixel>(stage, a, b, &low, &high);
-      ConvertLine<kForm, kPixel>(stage, dst, y, low, high, alpha);
-      if (two) {
-        ConvertLine<kForm, kPixel>(stage, dst + lines.dstPitch, y + lines.yPitch, low, high, alpha);
+      if constexpr (kForm == YuvToRgbForm::kSixBits && !IsHalf(kLayout)) {
+        ConvertLine<kLayout, kPixel>(stage, dst, y, a, b, alpha);
+        if (two) {
+          ConvertLine<kLayout, kPixel>(stage, dst + lines.dstPitch, y + lines.yPitch, a, b, alpha);
+        }
+      } else {
+        ChromaTerms<kForm> low, high;
+        LoadTerms<kForm, kLayout, kPixel>(stage, a, b, &low, &high);
+        ConvertLine<kForm, kPixel>(stage, dst, y, low, high, alpha);
+        if (two) {
+          ConvertLine<kForm, kPixel>(stage, dst + lines.dstPitch, y + lines.yPitch, low, high,
+                                     alpha);
+        }
       }
       dst += kBytes * kPixel;
       y += kBytes;
@@ -720,6 +790,7 @@ void ConvertYuv(const PixelRows& rows, const ChromaRows& chroma, const YuvToRgbW
   const ChromaShare ofV = {s.vToR, s.offset[0] - base(0), s.vToG, s.offset[1], 90, -11485, 46};
   const bool aIsU = shape.blueFirst;
   const ColourStage<kForm> stage(s, aIsU ? ofU : ofV, aIsU ? ofV : ofU, base(1));
+  const SixBitStage sixBitStage(aIsU ? ofU : ofV, aIsU ? ofV : ofU);
   const uint8_t* a = aIsU ? chroma.u : chroma.v;
   const uint8_t* b = aIsU ? chroma.v : chroma.u;
   const ptrdiff_t aPitch = aIsU ? chroma.uPitch : chroma.vPitch;
@@ -731,7 +802,9 @@ void ConvertYuv(const PixelRows& rows, const ChromaRows& chroma, const YuvToRgbW
   const auto& converters = shape.bytes == 4   ? kConverters<kForm, 4>
                            : shape.bytes == 3 ? kConverters<kForm, 3>
                                               : kConverters<kForm, 2>;
-  const PixelConversion conversion = {converters[int(layout)], &stage, layout, shape.bytes, alpha};
+  const bool fused = kForm == YuvToRgbForm::kSixBits && !IsHalf(layout);
+  const void* const chosen = fused ? static_cast<const void*>(&sixBitStage) : &stage;
+  const PixelConversion conversion = {converters[int(layout)], chosen, layout, shape.bytes, alpha};
   conversion.Convert({rows.dst, rows.dstPitch, rows.y, rows.yPitch, a, b, aPitch, bPitch, rows.rows,
                       chroma.rowShift},
                      n);

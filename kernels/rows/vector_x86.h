@@ -20,6 +20,39 @@
 namespace kestrel {
 namespace {
 
+// ---- Bytes that are multiplied
+using Multiplicands = WordsPair;
+struct MultiplicandsPair {
+  Multiplicands first, second;
+};
+inline Multiplicands ToMultiplicands(Bytes b) {
+  return Widen(b);
+}
+// Of kBytes pairs.
+template <bool kInTurn>
+inline MultiplicandsPair LoadMultiplicands(const uint8_t* p) {
+  const WordsPair pairs = kInTurn ? LoadPixelWordsInTurn(p) : LoadPixelWords(p);
+  const Words mask = SetWords(0xFF);
+  return {{pairs.low & mask, pairs.high & mask},
+          {ShiftRightUnsigned<8>(pairs.low), ShiftRightUnsigned<8>(pairs.high)}};
+}
+using ByteFactor = Factor;
+inline WordsPair MultiplyAdd(WordsPair sum, const Multiplicands& a, const ByteFactor& f) {
+  return {MultiplyAdd(sum.low, a.low, f), MultiplyAdd(sum.high, a.high, f)};
+}
+inline WordsPair MultiplySubtract(WordsPair sum, const Multiplicands& a, const ByteFactor& f) {
+  return {MultiplySubtract(sum.low, a.low, f), MultiplySubtract(sum.high, a.high, f)};
+}
+
+// base, which is a or b, and what a blend of the two adds to it.
+inline Bytes AddShare(Bytes base, Bytes a, Bytes b, Words weight) {
+  const WordsPair first = Widen(a);
+  const WordsPair second = Widen(b);
+  const WordsPair sum = Widen(base);
+  return Narrow(AddHighProduct(sum.low, second.low - first.low, weight),
+                AddHighProduct(sum.high, second.high - first.high, weight));
+}
+
 // ---- Order of bytes
 inline void StoreBlended(uint8_t* p, Pairs pairs, const uint8_t* blends) {
   StoreHalf(p, Blended(pairs, blends));
