@@ -34,6 +34,13 @@ void* AllocateTable(EngineContext* c, uint32_t size) {
   return c->table;
 }
 
+// Whether the table of an engine of the same conversion could be taken over.
+bool CopyTable(const EngineContext* like, EngineContext* c) {
+  if (like == nullptr || like->table == nullptr) return false;
+  MMemCpy(c->table, like->table, c->tableSize);
+  return true;
+}
+
 // How a channel of `bits` bits reads the clamp tables: its narrowing, where value 0 lies in the
 // table, and the greatest value. 16-bit pixels have tables of their own; in them every width but
 // six uses the five-bit table's base.
@@ -124,7 +131,7 @@ bool StaysInsideClampTables(const YuvToRgbSums& s, bool is16Bit) {
   return true;
 }
 
-void BuildYuvToRgb(EngineContext* c) {
+void BuildYuvToRgb(const EngineContext* like, EngineContext* c) {
   const MPPPARAM& p = c->params;
   if (c->srcFormat.code == CODE_GRAY8) c->params.contrast = c->params.saturation = 0;
   const YuvToRgbCoeffs& row = YuvToRgbRow(c->srcFormat.colourStandard);
@@ -154,6 +161,7 @@ void BuildYuvToRgb(EngineContext* c) {
   c->tableOffsets[0] = (size - 2 * kChannelTableSize) / 4;
   c->tableOffsets[1] = (size - kChannelTableSize) / 4;
   c->tableOffsets[2] = (size - 3 * kChannelTableSize) / 4;
+  if (CopyTable(like, c)) return;
   WriteClampTables(is16Bit, static_cast<uint8_t*>(c->table));
   uint32_t* const words = static_cast<uint32_t*>(c->table);
   WriteLine({0, s.yGain * 16}, words + c->tableOffsets[2]);
@@ -161,9 +169,9 @@ void BuildYuvToRgb(EngineContext* c) {
   WriteChromaLine({s.offset[1], s.vToG}, {s.offset[0], s.vToR}, words + c->tableOffsets[1]);
 }
 
-void BuildRgbToYuv(EngineContext* c) {
+void BuildRgbToYuv(const EngineContext* like, EngineContext* c) {
   const RgbToYuvCoeffs& row = RgbToYuvRow(c->dstFormat.colourStandard);
-  if (AllocateTable(c, kYuvBlockSize) == nullptr) return;
+  if (AllocateTable(c, kYuvBlockSize) == nullptr || CopyTable(like, c)) return;
   const int32_t foot = (c->dstFormat.colourStandard & CS_VIDEO_RANGE) != 0 ? kVideoLumaFoot : 0;
   const Sum lines[] = {
       {foot, row.rToY}, {0, row.gToY},
@@ -198,7 +206,7 @@ LevelMap ChooseLevelMap(EngineContext* c) {
   return {65536, brightness, 65536, 0};
 }
 
-void BuildLevelTable(EngineContext* c) {
+void BuildLevelTable(const EngineContext* like, EngineContext* c) {
   const MPPPARAM& p = c->params;
   const LevelMap map = ChooseLevelMap(c);
   const int32_t lumaGain = AdjustGain(map.lumaGain, p.contrast, p.saturation, 0);
@@ -207,7 +215,7 @@ void BuildLevelTable(EngineContext* c) {
   const int32_t chromaOffset =
       AdjustOffset(map.chromaOffset, p.contrast, p.saturation, map.chromaGain);
   c->levelSums = {{lumaGain, chromaGain}, {lumaOffset + kHalf, chromaOffset + kHalf}};
-  if (AllocateTable(c, kLevelBlockSize) == nullptr) return;
+  if (AllocateTable(c, kLevelBlockSize) == nullptr || CopyTable(like, c)) return;
   uint8_t* const levels = static_cast<uint8_t*>(c->table);
   WriteLevelLine({lumaOffset + kHalf, lumaGain}, levels);
   WriteLevelLine({chromaOffset + kHalf, chromaGain}, levels + 256);
@@ -234,16 +242,16 @@ int32_t AdjustOffset(int32_t offset, int32_t contrast, int32_t saturation, int32
   return int32_t(centred + ScaleBy256th(centred - kChromaCentre, 4 * HalvedBelowZero(contrast)));
 }
 
-void BuildConversionTables(EngineContext* context) {
+void BuildConversionTables(const EngineContext* like, EngineContext* context) {
   switch (context->pathKind) {
     case PATH_YUV_TO_YUV:
-      if (context->needsLevelTable != 0) BuildLevelTable(context);
+      if (context->needsLevelTable != 0) BuildLevelTable(like, context);
       break;
     case PATH_YUV_TO_RGB:
-      BuildYuvToRgb(context);
+      BuildYuvToRgb(like, context);
       break;
     case PATH_RGB_TO_YUV:
-      BuildRgbToYuv(context);
+      BuildRgbToYuv(like, context);
       break;
     default:
       break;

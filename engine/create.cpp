@@ -303,7 +303,7 @@ void FillPassEngine(const GeometryOf& g, EngineContext* c, PassEngine* e) {
 // The decisions themselves. The order of the steps matters: several flags are taken before a later
 // step changes what they were derived from, and kernels rely on that.
 uint32_t Decide(const MPPFORMAT& dst, const MPPFORMAT& src, const MPPPARAM& params,
-                EngineContext* c, PassEngine* e) {
+                const EngineContext* like, EngineContext* c, PassEngine* e) {
   c->params = params;
   c->tableEnabled = 1;
   c->dither = params.dither;
@@ -348,7 +348,7 @@ uint32_t Decide(const MPPFORMAT& dst, const MPPFORMAT& src, const MPPPARAM& para
   c->dstOriginX = SaturateToInt32(geometry.x.dstOrigin);
   c->dstOriginY = SaturateToInt32(geometry.y.dstOrigin);
 
-  BuildConversionTables(c);
+  BuildConversionTables(like, c);
   SettleUnitScale(c);
   OrientDestination(c);
   c->dstRect.left = Covered(c->srcRect.left, c->srcOriginX, c->stepX, c->dstOriginX);
@@ -385,8 +385,9 @@ uint32_t BuiltAs(uint32_t format) {
   }
 }
 
+// `first` is null, or a pass whose parameters differ in the pass mode only.
 uint32_t BuildPass(const MPPFORMAT& dst, const MPPFORMAT& src, const MPPPARAM& params,
-                   const KestrelRowOps* rows, PassEngine** out) {
+                   const KestrelRowOps* rows, const PassEngine* first, PassEngine** out) {
   if (dst.width == 0 || dst.height == 0 || src.width == 0 || src.height == 0) {
     return KESTREL_BAD_ARGUMENT;
   }
@@ -398,7 +399,8 @@ uint32_t BuildPass(const MPPFORMAT& dst, const MPPFORMAT& src, const MPPPARAM& p
     return KESTREL_OUT_OF_MEMORY;
   }
   context->rows = rows;
-  const uint32_t result = Decide(dst, src, params, context, engine);
+  const EngineContext* const like = first != nullptr ? first->context : nullptr;
+  const uint32_t result = Decide(dst, src, params, like, context, engine);
   if (result != KESTREL_OK) {
     FreeContext(context);
     MMemFree(nullptr, engine);
@@ -412,13 +414,13 @@ uint32_t BuildPasses(const MPPFORMAT& dst, const MPPFORMAT& src, const MPPPARAM&
                      MPPHandle* handle) {
   const KestrelRowOps* const rows = SelectRowOps();
   if (params.passMode != MPP_PASS_TILED) {
-    return BuildPass(dst, src, params, rows, &handle->pass[0]);
+    return BuildPass(dst, src, params, rows, nullptr, &handle->pass[0]);
   }
   MPPPARAM pass = params;
   uint32_t result = KESTREL_OK;
   for (uint32_t i = 0; i < 3 && result == KESTREL_OK; ++i) {
     pass.passMode = i + 1;
-    result = BuildPass(dst, src, pass, rows, &handle->pass[i]);
+    result = BuildPass(dst, src, pass, rows, handle->pass[0], &handle->pass[i]);
   }
   return result;
 }
@@ -435,7 +437,7 @@ uint32_t MPPBuildEngine(const MPPFORMAT* dstFormat, const MPPFORMAT* srcFormat,
   if (dstFormat == nullptr || srcFormat == nullptr || params == nullptr || outEngine == nullptr) {
     return KESTREL_BAD_ARGUMENT;
   }
-  return BuildPass(*dstFormat, *srcFormat, *params, SelectRowOps(), outEngine);
+  return BuildPass(*dstFormat, *srcFormat, *params, SelectRowOps(), nullptr, outEngine);
 }
 
 uint32_t MPPCreate(MPPFORMAT* dstFormat, MPPFORMAT* srcFormat, MPPPARAM* params,

@@ -28,8 +28,9 @@ void MPMapDstRect(const PassEngine* engine, int32_t* dstPitches, MRECT* rect,
                   uint8_t** dstPlaneStarts);
 
 // Implemented by colour/: fills table, tableSize, tableOffsets and rgbSums. Leaves table null when
-// it cannot be allocated or none is needed.
-void BuildConversionTables(EngineContext* context);
+// it cannot be allocated or none is needed. `like` is null, or an engine of the same formats and
+// adjustments, whose table is copied.
+void BuildConversionTables(const EngineContext* like, EngineContext* context);
 
 }  // extern "C"
 
