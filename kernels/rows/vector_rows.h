@@ -633,8 +633,9 @@ void ConvertVectors(const void* colourStage, const PixelLines& lines, uint8_t al
   const bool isNarrow = lines.rows > share &&
                         2 * n * kPixel < (lines.dstPitch < 0 ? -lines.dstPitch : lines.dstPitch);
   for (int row = 0; row < lines.rows; row += share) {
-    if (isNarrow && row + 2 * share <= lines.rows)
+    if (isNarrow && row + 2 * share <= lines.rows) {
       PrefetchRows(lines.dst + (row + share) * lines.dstPitch, lines.dstPitch, share, n * kPixel);
+    }
     const ptrdiff_t chromaRow = row >> lines.rowShift;
     const bool two = share == 2 && row + 1 < lines.rows;
     uint8_t* dst = lines.dst + row * lines.dstPitch;
