@@ -95,6 +95,7 @@ struct Runs {
     for (int i = 0; i < kPixels; ++i) {
       scaled.push_back(i * 3 / 2);
       scaledPixels.push_back(i * 3 / 2 * 4);
+      nextPixels.push_back(scaledPixels.back() + 4);
       weights.push_back(uint16_t(next()));
     }
     // Each with its right neighbour.
@@ -124,7 +125,7 @@ struct Runs {
   static constexpr size_t kBytes = 2 * 4 * kPixels + 64;
   std::vector<uint8_t> a, b, c, pixels, palette;
   std::vector<uint8_t> out[3];
-  std::vector<int32_t> scaled, scaledPixels, neighbours;
+  std::vector<int32_t> scaled, scaledPixels, nextPixels, neighbours;
   std::vector<uint16_t> weights;
   std::vector<uint8_t> blends = std::vector<uint8_t>(4 * kPairs);
   kestrel::PairPlan plan = {};
@@ -178,6 +179,16 @@ const Case kCases[] = {
     {"blendRows", kPixels,
      [](const RowOps& ops, Runs* r) {
        ops.blendRows(r->out[0].data(), r->a.data(), r->b.data(), 21845, kPixels);
+     }},
+    {"blendPixels RGBA", kPixels,
+     [](const RowOps& ops, Runs* r) {
+       ops.blendPixels(r->out[0].data(), r->pixels.data(),
+                       {r->scaledPixels.data(), r->nextPixels.data(), r->weights.data()}, 3,
+                       kPixels);
+     }},
+    {"blendPixelRows RGBA", kPixels,
+     [](const RowOps& ops, Runs* r) {
+       ops.blendPixelRows(r->out[0].data(), r->a.data(), r->b.data(), 21845, 3, kPixels);
      }},
 
     {"unpackRgb RGBA", kPixels,

@@ -536,7 +536,7 @@ static Lanes8 HighPairs(Lanes8 a, Lanes8 b) {
 // lowest of its place within the row; after as many rounds as there are bits, the units of a column
 // lie side by side. Recursion instead of a loop keeps the rows in registers.
 template <int kRounds, typename Lanes, int kRows>
-inline __attribute__((always_inline)) void PairRows(Lanes (&rows)[kRows]) {
+KESTREL_INLINE void PairRows(Lanes (&rows)[kRows]) {
   if constexpr (kRounds > 0) {
     Lanes paired[kRows];
     for (int i = 0; i < kRows / 2; ++i) {
@@ -549,8 +549,7 @@ inline __attribute__((always_inline)) void PairRows(Lanes (&rows)[kRows]) {
 }
 
 template <typename Lanes, int kRows>
-inline __attribute__((always_inline)) void LoadPaired(Lanes (&rows)[kRows], const uint8_t* src,
-                                                      ptrdiff_t srcPitch) {
+KESTREL_INLINE void LoadPaired(Lanes (&rows)[kRows], const uint8_t* src, ptrdiff_t srcPitch) {
   for (int i = 0; i < kRows; ++i) rows[i] = LoadLanes<Lanes>(src + i * srcPitch);
   PairRows<(kRows == 8 ? 3 : 2)>(rows);
 }

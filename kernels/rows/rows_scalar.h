@@ -4,6 +4,10 @@
 
 #include "kernels/rows/rows.h"
 
+// For parts of loops that compilers find too large to inline: calls would keep whole vectors in
+// memory.
+#define KESTREL_INLINE inline __attribute__((always_inline))
+
 namespace kestrel {
 namespace scalar {
 

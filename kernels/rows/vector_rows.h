@@ -17,31 +17,41 @@ struct Units {
   int unit;
   const uint8_t* At(int i) const { return start + ptrdiff_t{i} * unit; }
 };
+// Units from i on for one vector: where they are, or copied, when vectors may not read that far.
 class Rest {
  public:
-  Rest(const Units& source, int i, int n) {
-    memcpy(bytes_, source.At(i), size_t(n - i) * size_t(source.unit));
+  Rest(const Units& source, int i, int n, bool isCopied) : start_(source.At(i)) {
+    if (!isCopied) return;
+    memset(bytes_, 0, sizeof(bytes_));
+    memcpy(bytes_, start_, size_t(n - i) * size_t(source.unit));
+    start_ = bytes_;
   }
-  const uint8_t* bytes() const { return bytes_; }
+  const uint8_t* start() const { return start_; }
 
  private:
-  uint8_t bytes_[8 * kBytes] = {};
+  const uint8_t* start_;
+  uint8_t bytes_[8 * kBytes];
 };
 
-// Calls block(destinations, sources...) for each kBytes units of a run; the last ones go through
-// copies, so that nothing beyond the run is touched.
+// Calls block(destinations, sources...) for each kBytes units of a run. The last vector reaches
+// back over units that are done already. Where there are not so many, or one source is written
+// over, the last units go through copies, so that nothing beyond the run is touched.
 template <int kDstUnit, int kDsts, typename Block, typename... Sources>
 inline void ForRun(uint8_t* const (&dst)[kDsts], int n, const Block& block, Sources... sources) {
-  uint8_t* at[kDsts];
   int i = 0;
   for (; i + kBytes <= n; i += kBytes) {
+    uint8_t* at[kDsts];
     for (int d = 0; d < kDsts; ++d) at[d] = dst[d] + i * kDstUnit;
     block(at, sources.At(i)...);
   }
   if (i == n) return;
+  const bool isCopied = n < kBytes || ((sources.start == dst[0]) || ...);
+  if (!isCopied) i = n - kBytes;
   uint8_t rest[kDsts][kDstUnit * kBytes];
-  for (int d = 0; d < kDsts; ++d) at[d] = rest[d];
-  block(at, Rest(sources, i, n).bytes()...);
+  uint8_t* at[kDsts];
+  for (int d = 0; d < kDsts; ++d) at[d] = isCopied ? rest[d] : dst[d] + i * kDstUnit;
+  block(at, Rest(sources, i, n, isCopied).start()...);
+  if (!isCopied) return;
   for (int d = 0; d < kDsts; ++d) {
     memcpy(dst[d] + i * kDstUnit, rest[d], size_t(n - i) * kDstUnit);
   }
@@ -281,7 +291,7 @@ inline Words PackFields565(Words low, Words green, Words high) {
 
 // Channels by their place in the pixel. kBytes pixels.
 template <int kPixel>
-inline void StorePixels(uint8_t* dst, Bytes low, Bytes middle, Bytes high, Bytes alpha) {
+KESTREL_INLINE void StorePixels(uint8_t* dst, Bytes low, Bytes middle, Bytes high, Bytes alpha) {
   if constexpr (kPixel == 4) {
     Store4(dst, low, middle, high, alpha);
   } else if constexpr (kPixel == 3) {
@@ -295,7 +305,7 @@ inline void StorePixels(uint8_t* dst, Bytes low, Bytes middle, Bytes high, Bytes
 }
 
 template <int kPixel>
-inline PixelBytes LoadPixels(const uint8_t* src) {
+KESTREL_INLINE PixelBytes LoadPixels(const uint8_t* src) {
   if constexpr (kPixel == 4) {
     return Load4(src);
   } else if constexpr (kPixel == 3) {
@@ -592,8 +602,8 @@ inline ChromaTerms<kForm> TermsOfPairs(const ColourStage<kForm>& stage, Words pa
 }
 
 template <YuvToRgbForm kForm, ChromaLayout kLayout, int kPixel>
-inline void LoadTerms(const ColourStage<kForm>& stage, const uint8_t* a, const uint8_t* b,
-                      ChromaTerms<kForm>* low, ChromaTerms<kForm>* high) {
+KESTREL_INLINE void LoadTerms(const ColourStage<kForm>& stage, const uint8_t* a, const uint8_t* b,
+                              ChromaTerms<kForm>* low, ChromaTerms<kForm>* high) {
   if constexpr (kLayout == ChromaLayout::kPlanes) {
     const WordsPair wideA = Widen(Ordered<kPixel>(LoadBytes(a)));
     const WordsPair wideB = Widen(Ordered<kPixel>(LoadBytes(b)));
@@ -631,9 +641,9 @@ inline void StoreOrdered(uint8_t* dst, Bytes low, Bytes middle, Bytes high, Byte
 }
 
 template <YuvToRgbForm kForm, int kPixel>
-inline void ConvertLine(const ColourStage<kForm>& stage, uint8_t* dst, const uint8_t* y,
-                        const ChromaTerms<kForm>& low, const ChromaTerms<kForm>& high,
-                        Bytes alpha) {
+KESTREL_INLINE void ConvertLine(const ColourStage<kForm>& stage, uint8_t* dst, const uint8_t* y,
+                                const ChromaTerms<kForm>& low, const ChromaTerms<kForm>& high,
+                                Bytes alpha) {
   const WordsPair luma = Widen(Ordered<kPixel>(LoadBytes(y)));
   const auto first = stage.Add(luma.low, low.term);
   const auto second = stage.Add(luma.high, high.term);
@@ -685,8 +695,9 @@ void ConvertVectors(const void* colourStage, const PixelLines& lines, uint8_t al
   const bool isNarrow = lines.rows > share &&
                         2 * n * kPixel < (lines.dstPitch < 0 ? -lines.dstPitch : lines.dstPitch);
   for (int row = 0; row < lines.rows; row += share) {
-    if (isNarrow && row + 2 * share <= lines.rows)
+    if (isNarrow && row + 2 * share <= lines.rows) {
       PrefetchRows(lines.dst + (row + share) * lines.dstPitch, lines.dstPitch, share, n * kPixel);
+    }
     const ptrdiff_t chromaRow = row >> lines.rowShift;
     const bool two = share == 2 && row + 1 < lines.rows;
     uint8_t* dst = lines.dst + row * lines.dstPitch;

@@ -75,7 +75,7 @@ class WeightedSum {
     middle_ = Pair(half, sign * weights[1] - half);
     offset_ = KESTREL_SIMD(set1_epi32)(offset);
   }
-  Bytes Of(Bytes low, Bytes middle, Bytes high) const {
+  KESTREL_INLINE Bytes Of(Bytes low, Bytes middle, Bytes high) const {
     return Narrow(Eight(KESTREL_SIMD(unpacklo_epi8)(low.v, high.v),
                         KESTREL_SIMD(unpacklo_epi8)(middle.v, middle.v)),
                   Eight(KESTREL_SIMD(unpackhi_epi8)(low.v, high.v),
@@ -83,7 +83,7 @@ class WeightedSum {
   }
   // The sums of kBytes pixels of four bytes, or of the second ones of as many pairs.
   template <bool kSeconds>
-  Bytes OfPixels(const uint8_t* p) const {
+  KESTREL_INLINE Bytes OfPixels(const uint8_t* p) const {
     const Register middleTwice =
         Broadcast(_mm_setr_epi8(1, -1, 1, -1, 5, -1, 5, -1, 9, -1, 9, -1, 13, -1, 13, -1));
     Register sums[4];
@@ -110,7 +110,7 @@ class WeightedSum {
         kNegated ? KESTREL_SIMD(sub_epi32)(offset_, sum) : KESTREL_SIMD(add_epi32)(offset_, sum),
         16);
   }
-  Words Eight(Register outer, Register middle) const {
+  KESTREL_INLINE Words Eight(Register outer, Register middle) const {
     const WordsPair o = Widen({outer});
     const WordsPair m = Widen({middle});
     return {KESTREL_SIMD(packs_epi32)(Sums(o.low.v, m.low.v), Sums(o.high.v, m.high.v))};

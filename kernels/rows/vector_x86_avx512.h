@@ -105,13 +105,13 @@ inline Register Select(uint64_t mask, Register a, Register b) {
 constexpr uint64_t kOddPlaces = 0xAAAAAAAAAAAAAAAA;
 
 // Bytes of kBytes pairs apart.
-inline void Load2(const uint8_t* p, Bytes* first, Bytes* second) {
+KESTREL_INLINE void Load2(const uint8_t* p, Bytes* first, Bytes* second) {
   const Register a = Load(p);
   const Register b = Turn<1>(Load(p + kBytes));
   first->v = Reorder(Select(kOddPlaces, a, b), kToPlanar<2, 0>);
   second->v = Reorder(Select(kOddPlaces, b, a), kToPlanar<2, 1>);
 }
-inline void Store2(uint8_t* p, Bytes first, Bytes second) {
+KESTREL_INLINE void Store2(uint8_t* p, Bytes first, Bytes second) {
   const Register a = Reorder(first.v, kToPacked<2, 0>);
   const Register b = Reorder(second.v, kToPacked<2, 1>);
   Store(p, Select(kOddPlaces, a, b));
@@ -122,7 +122,7 @@ inline void Store2(uint8_t* p, Bytes first, Bytes second) {
 inline Register InThrees(Register a, Register b, Register c) {
   return Select(0x4924924924924924, Select(0x2492492492492492, a, b), c);
 }
-inline PixelBytes Load3(const uint8_t* p) {
+KESTREL_INLINE PixelBytes Load3(const uint8_t* p) {
   const Register a = Load(p);
   const Register b = Load(p + kBytes);
   const Register c = Load(p + 2 * kBytes);
@@ -131,7 +131,7 @@ inline PixelBytes Load3(const uint8_t* p) {
           {Reorder(InThrees(c, b, a), kToPlanar<3, 2>)},
           SetBytes(0)};
 }
-inline void Store3(uint8_t* p, Bytes low, Bytes middle, Bytes high) {
+KESTREL_INLINE void Store3(uint8_t* p, Bytes low, Bytes middle, Bytes high) {
   const Register a = Reorder(low.v, kToPacked<3, 0>);
   const Register b = Reorder(middle.v, kToPacked<3, 1>);
   const Register c = Reorder(high.v, kToPacked<3, 2>);
@@ -142,7 +142,7 @@ inline void Store3(uint8_t* p, Bytes low, Bytes middle, Bytes high) {
 
 // Byte i of result k is from register (i - k) modulo 4, by which registers become channels and
 // channels registers.
-inline Quads SelectQuads(Register a, Register b, Register c, Register d) {
+KESTREL_INLINE Quads SelectQuads(Register a, Register b, Register c, Register d) {
   const Register ab = Select(kOddPlaces, a, b);
   const Register ba = Select(kOddPlaces, b, a);
   const Register cd = Select(kOddPlaces, c, d);
@@ -152,7 +152,7 @@ inline Quads SelectQuads(Register a, Register b, Register c, Register d) {
   return {{Select(kUpperTwo, ab, cd), Select(kMiddleTwo, dc, ba), Select(kUpperTwo, cd, ab),
            Select(kMiddleTwo, ba, dc)}};
 }
-inline PixelBytes Load4(const uint8_t* p) {
+KESTREL_INLINE PixelBytes Load4(const uint8_t* p) {
   const Quads channels = SelectQuads(Load(p), Turn<1>(Load(p + kBytes)),
                                      Turn<2>(Load(p + 2 * kBytes)), Turn<3>(Load(p + 3 * kBytes)));
   return {{Reorder(channels.v[0], kToPlanar<4, 0>)},
@@ -160,7 +160,7 @@ inline PixelBytes Load4(const uint8_t* p) {
           {Reorder(channels.v[2], kToPlanar<4, 2>)},
           {Reorder(channels.v[3], kToPlanar<4, 3>)}};
 }
-inline void Store4(uint8_t* p, Bytes a, Bytes b, Bytes c, Bytes d) {
+KESTREL_INLINE void Store4(uint8_t* p, Bytes a, Bytes b, Bytes c, Bytes d) {
   const Quads quads = SelectQuads(Reorder(a.v, kToPacked<4, 0>), Reorder(b.v, kToPacked<4, 1>),
                                   Reorder(c.v, kToPacked<4, 2>), Reorder(d.v, kToPacked<4, 3>));
   Store(p, quads.v[0]);
@@ -187,7 +187,7 @@ inline WordsPair LoadPixelWordsInTurn(const uint8_t* p) {
   return {{_mm512_permutexvar_epi64(order, Load(p))},
           {_mm512_permutexvar_epi64(order, Load(p + kBytes))}};
 }
-inline void Store4InTurn(uint8_t* p, Bytes a, Bytes b, Bytes c, Bytes d) {
+KESTREL_INLINE void Store4InTurn(uint8_t* p, Bytes a, Bytes b, Bytes c, Bytes d) {
   const Quads quads = Interleave4(a, b, c, d);
   for (int i = 0; i < 4; ++i) Store(p + kBytes * i, quads.v[i]);
 }
@@ -211,7 +211,7 @@ inline void StoreReversed(uint8_t* p, const uint8_t* src) {
 
 // A block of a plan.
 template <int kWindows>
-inline Pairs GatherPairs(const uint8_t* src, const uint8_t* block) {
+KESTREL_INLINE Pairs GatherPairs(const uint8_t* src, const uint8_t* block) {
   int32_t window[4 * kWindows];
   __builtin_memcpy(window, block, sizeof(window));
   const Register shuffle = Load(block + kPairs);
@@ -247,20 +247,20 @@ inline Register LoadSecondQuads(const uint8_t* p, int i) {
 inline Bytes NarrowedQuads(Bytes b) {
   return InTurn(b);
 }
-inline __m128i GatherFourQuads(const uint8_t* src, const int32_t* offsets) {
-  const auto quad = [src](int32_t offset) {
-    int32_t value;
-    __builtin_memcpy(&value, src + offset, 4);
-    return value;
-  };
-  __m128i v = _mm_cvtsi32_si128(quad(offsets[0]));
-  v = _mm_insert_epi32(v, quad(offsets[1]), 1);
-  v = _mm_insert_epi32(v, quad(offsets[2]), 2);
-  return _mm_insert_epi32(v, quad(offsets[3]), 3);
-}
-inline Bytes GatherQuads(const uint8_t* src, const int32_t* offsets) {
-  return {Join(GatherFourQuads(src, offsets), GatherFourQuads(src, offsets + 4),
-               GatherFourQuads(src, offsets + 8), GatherFourQuads(src, offsets + 12))};
+// By loads that select: the gather instruction is slow on many CPUs, inserting competes for the one
+// port that permutes.
+KESTREL_INLINE Bytes GatherQuads(const uint8_t* src, const int32_t* offsets) {
+  Register every4[4];
+  for (int i = 0; i < 4; ++i) {
+    const auto quad = [=](int lane) { return _mm_loadu_si32(src + offsets[4 * lane + i]); };
+    Register v = _mm512_broadcastd_epi32(quad(0));
+    v = _mm512_mask_broadcastd_epi32(v, 0x00F0, quad(1));
+    v = _mm512_mask_broadcastd_epi32(v, 0x0F00, quad(2));
+    every4[i] = _mm512_mask_broadcastd_epi32(v, 0xF000, quad(3));
+  }
+  const Register low = _mm512_mask_blend_epi32(0xAAAA, every4[0], every4[1]);
+  const Register high = _mm512_mask_blend_epi32(0xAAAA, every4[2], every4[3]);
+  return {_mm512_mask_blend_epi32(0xCCCC, low, high)};
 }
 // Byte i of a vector's pixels in words is of pixel i / 8 of each lane's half: its weight's place.
 template <int kHalf>

@@ -53,14 +53,14 @@ inline void StoreHalf(uint8_t* p, Words w) {
 
 // ---- Packed and planar
 // Bytes of kBytes pairs apart.
-inline void Load2(const uint8_t* p, Bytes* first, Bytes* second) {
+KESTREL_INLINE void Load2(const uint8_t* p, Bytes* first, Bytes* second) {
   const Words a = {LoadLanes(p, 0, 2)};
   const Words b = {LoadLanes(p, 1, 2)};
   const Words mask = SetWords(0xFF);
   *first = Narrow(a & mask, b & mask);
   *second = Narrow(ShiftRightUnsigned<8>(a), ShiftRightUnsigned<8>(b));
 }
-inline void Store2(uint8_t* p, Bytes first, Bytes second) {
+KESTREL_INLINE void Store2(uint8_t* p, Bytes first, Bytes second) {
   StoreLanes(p, 0, 2, KESTREL_SIMD(unpacklo_epi8)(first.v, second.v));
   StoreLanes(p, 1, 2, KESTREL_SIMD(unpackhi_epi8)(first.v, second.v));
 }
@@ -73,7 +73,7 @@ inline WordsPair LoadPixelWords(const uint8_t* p) {
   return {{LoadLanes(p, 0, 2)}, {LoadLanes(p, 1, 2)}};
 }
 
-inline PixelBytes Load4(const uint8_t* p) {
+KESTREL_INLINE PixelBytes Load4(const uint8_t* p) {
   // 0 4 8 12  1 5 9 13 ...: four bytes of each channel beside each other.
   const Register order =
       Broadcast(_mm_setr_epi8(0, 4, 8, 12, 1, 5, 9, 13, 2, 6, 10, 14, 3, 7, 11, 15));
@@ -116,18 +116,18 @@ inline WordsPair LoadPixelWordsInTurn(const uint8_t* p) {
   return LoadPixelWords(p);
 #endif
 }
-inline void Store4InTurn(uint8_t* p, Bytes a, Bytes b, Bytes c, Bytes d) {
+KESTREL_INLINE void Store4InTurn(uint8_t* p, Bytes a, Bytes b, Bytes c, Bytes d) {
   const Quads quads = Interleave4(a, b, c, d);
   for (int i = 0; i < 4; ++i) Store(p + kBytes * i, quads.v[i]);
 }
-inline void Store4(uint8_t* p, Bytes a, Bytes b, Bytes c, Bytes d) {
+KESTREL_INLINE void Store4(uint8_t* p, Bytes a, Bytes b, Bytes c, Bytes d) {
   const Quads quads = Interleave4(a, b, c, d);
   for (int i = 0; i < 4; ++i) StoreLanes(p, i, 4, quads.v[i]);
 }
 
 // Byte i of the channel is byte 3 * i + c of the 48 that three registers hold.
 template <int kChannel>
-inline Bytes PickOfThree(Register a, Register b, Register c) {
+KESTREL_INLINE Bytes PickOfThree(Register a, Register b, Register c) {
   alignas(16) int8_t order[3][16];
   for (int i = 0; i < 16; ++i) {
     for (int part = 0; part < 3; ++part) {
@@ -140,13 +140,13 @@ inline Bytes PickOfThree(Register a, Register b, Register c) {
   const Words z = {KESTREL_SIMD(shuffle_epi8)(c, Broadcast(Load16(order[2])))};
   return {(x | y | z).v};
 }
-inline PixelBytes Load3(const uint8_t* p) {
+KESTREL_INLINE PixelBytes Load3(const uint8_t* p) {
   const Register a = LoadLanes(p, 0, 3);
   const Register b = LoadLanes(p, 1, 3);
   const Register c = LoadLanes(p, 2, 3);
   return {PickOfThree<0>(a, b, c), PickOfThree<1>(a, b, c), PickOfThree<2>(a, b, c), SetBytes(0)};
 }
-inline void Store3(uint8_t* p, Bytes a, Bytes b, Bytes c) {
+KESTREL_INLINE void Store3(uint8_t* p, Bytes a, Bytes b, Bytes c) {
   const Quads quads = Interleave4(a, b, c, c);
   // Twelve bytes of each register, the fourth byte of each pixel left out.
   const Register order =
@@ -184,7 +184,7 @@ inline void StoreReversed(uint8_t* p, const uint8_t* src) {
 }
 // A block of a plan.
 template <int kWindows>
-inline Pairs GatherPairs(const uint8_t* src, const uint8_t* block) {
+KESTREL_INLINE Pairs GatherPairs(const uint8_t* src, const uint8_t* block) {
   int32_t window[kPairs / 8 * kWindows];
   __builtin_memcpy(window, block, sizeof(window));
   const Register shuffle = Load(block + kPairs);
@@ -230,7 +230,7 @@ inline __m128i GatherFourQuads(const uint8_t* src, const int32_t* offsets) {
   v = _mm_insert_epi32(v, quad(offsets[2]), 2);
   return _mm_insert_epi32(v, quad(offsets[3]), 3);
 }
-inline Bytes GatherQuads(const uint8_t* src, const int32_t* offsets) {
+KESTREL_INLINE Bytes GatherQuads(const uint8_t* src, const int32_t* offsets) {
 #ifdef __AVX2__
   return {Join(GatherFourQuads(src, offsets), GatherFourQuads(src, offsets + 4))};
 #else

@@ -254,7 +254,7 @@ inline WordsPair Double(Words w) {
 struct Quads {
   Register v[4];
 };
-inline Quads Interleave4(Bytes a, Bytes b, Bytes c, Bytes d) {
+KESTREL_INLINE Quads Interleave4(Bytes a, Bytes b, Bytes c, Bytes d) {
   const Register ab0 = KESTREL_SIMD(unpacklo_epi8)(a.v, b.v);
   const Register ab1 = KESTREL_SIMD(unpackhi_epi8)(a.v, b.v);
   const Register cd0 = KESTREL_SIMD(unpacklo_epi8)(c.v, d.v);
