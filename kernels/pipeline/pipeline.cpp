@@ -56,7 +56,7 @@ class Pipeline {
   using PixelOrder = Destination::Order;
 
   // Samples of short rows that are converted at once, and rows that are mirrored at once.
-  static constexpr int kCollected = 1024;
+  static constexpr int kCollected = 2048;
   static constexpr int kMirroredRows = ArrangedSamples::kPixels / kStrip;
 
   // Where a loop row of a plane is on both sides.
@@ -463,9 +463,9 @@ class Pipeline {
 
   SampleRows CollectRows(int32_t r, int most) {
     const int rows = kCollected / n_ < most ? kCollected / n_ : most;
-    SampleRows collected = {collectedLuma_, n_, rows, {}};
+    SampleRows collected = {memory_, n_, rows, {}};
     for (int i = 0; i < rows; ++i) {
-      uint8_t* const into = collectedLuma_ + ptrdiff_t{i} * n_;
+      uint8_t* const into = memory_ + ptrdiff_t{i} * n_;
       const uint8_t* const luma = source_.Luma(r + i, into);
       if (luma != into) memcpy(into, luma, size_t(n_));
       const PixelChroma row = CollectChroma(r + i, i);
@@ -535,7 +535,7 @@ class Pipeline {
 
   // Chroma of a row as row i of those collected.
   PixelChroma CollectChroma(int32_t r, int i) {
-    uint8_t* const into = collectedChroma_ + ptrdiff_t{i} * 2 * n_;
+    uint8_t* const into = memory_ + kCollected + ptrdiff_t{i} * 2 * n_;
     PixelChroma chroma = source_.ChromaOfPixels(r, into);
     ChromaRows& rows = chroma.rows;
     if (source_.ChromaIsGrey()) return chroma;
@@ -732,9 +732,12 @@ class Pipeline {
   int32_t uColumns_[kStrip], vColumns_[kStrip];  // loop columns, or columns of the strip
   int uStep_ = 0, vStep_ = 0;                    // from each of them to the next; 0 when it varies
   bool chromaOfSeconds_ = false;                 // every pixel, or the second of each two, decides
-  uint8_t channels_[3][kStrip];
-  uint8_t luma_[kStrip], u_[kStrip], v_[kStrip];
-  uint8_t collectedLuma_[kCollected], collectedChroma_[2 * kCollected];  // of short rows
+  // Runs of samples; or those of short rows, luma and then chroma.
+  uint8_t memory_[3 * kCollected];
+  uint8_t* const channels_[3] = {memory_, memory_ + kStrip, memory_ + 2 * kStrip};
+  uint8_t* const luma_ = memory_ + 3 * kStrip;
+  uint8_t* const u_ = memory_ + 4 * kStrip;
+  uint8_t* const v_ = memory_ + 5 * kStrip;
 };
 
 static_assert(sizeof(Pipeline) < size_t{56} * 1024, "camera threads have small stacks");

@@ -239,6 +239,13 @@ inline Bytes SwapNeighbours(Bytes b) {
   return {vrev16q_u8(b.v)};
 }
 
+// A sum that products are added to. Compilers would rather add it last, which takes copies of what
+// they begin with instead.
+inline Words Fixed(Words sum) {
+  __asm__("" : "+w"(sum.v));
+  return sum;
+}
+
 // ---- Bytes that are multiplied
 using Multiplicands = Bytes;
 struct MultiplicandsPair {

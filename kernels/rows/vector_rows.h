@@ -17,19 +17,16 @@ struct Units {
   int unit;
   const uint8_t* At(int i) const { return start + ptrdiff_t{i} * unit; }
 };
-// Units from i on for one vector: where they are, or copied, when vectors may not read that far.
+// A copy of n units with room for a vector.
 class Rest {
  public:
-  Rest(const Units& source, int i, int n, bool isCopied) : start_(source.At(i)) {
-    if (!isCopied) return;
+  Rest(const Units& source, int n) {
     memset(bytes_, 0, sizeof(bytes_));
-    memcpy(bytes_, start_, size_t(n - i) * size_t(source.unit));
-    start_ = bytes_;
+    memcpy(bytes_, source.start, size_t(n) * size_t(source.unit));
   }
-  const uint8_t* start() const { return start_; }
+  const uint8_t* bytes() const { return bytes_; }
 
  private:
-  const uint8_t* start_;
   uint8_t bytes_[8 * kBytes];
 };
 
@@ -38,23 +35,27 @@ class Rest {
 // over, the last units go through copies, so that nothing beyond the run is touched.
 template <int kDstUnit, int kDsts, typename Block, typename... Sources>
 inline void ForRun(uint8_t* const (&dst)[kDsts], int n, const Block& block, Sources... sources) {
-  int i = 0;
-  for (; i + kBytes <= n; i += kBytes) {
-    uint8_t* at[kDsts];
-    for (int d = 0; d < kDsts; ++d) at[d] = dst[d] + i * kDstUnit;
-    block(at, sources.At(i)...);
-  }
-  if (i == n) return;
   const bool isCopied = n < kBytes || ((sources.start == dst[0]) || ...);
-  if (!isCopied) i = n - kBytes;
-  uint8_t rest[kDsts][kDstUnit * kBytes];
   uint8_t* at[kDsts];
-  for (int d = 0; d < kDsts; ++d) at[d] = isCopied ? rest[d] : dst[d] + i * kDstUnit;
-  block(at, Rest(sources, i, n, isCopied).start()...);
-  if (!isCopied) return;
-  for (int d = 0; d < kDsts; ++d) {
-    memcpy(dst[d] + i * kDstUnit, rest[d], size_t(n - i) * kDstUnit);
+  for (int d = 0; d < kDsts; ++d) at[d] = dst[d];
+  // (Pointers that move on cost nothing where loads and stores can move them.)
+  for (; n >= kBytes; n -= kBytes) {
+    block(at, sources.start...);
+    for (int d = 0; d < kDsts; ++d) at[d] += kBytes * kDstUnit;
+    ((sources.start += kBytes * sources.unit), ...);
   }
+  if (n == 0) return;
+  if (!isCopied) {
+    const int back = kBytes - n;
+    for (int d = 0; d < kDsts; ++d) at[d] -= back * kDstUnit;
+    block(at, sources.At(-back)...);
+    return;
+  }
+  uint8_t rest[kDsts][kDstUnit * kBytes];
+  uint8_t* into[kDsts];
+  for (int d = 0; d < kDsts; ++d) into[d] = rest[d];
+  block(into, Rest(sources, n).bytes()...);
+  for (int d = 0; d < kDsts; ++d) memcpy(at[d], rest[d], size_t(n) * kDstUnit);
 }
 
 // ---- Resampling
@@ -547,7 +548,7 @@ class SixBitStage {
     const WordsPair wide = Widen(y);
     const WordsPair luma = {ShiftLeft<6>(wide.low), ShiftLeft<6>(wide.high)};
     const auto plus = [&](Words offset) {
-      return WordsPair{luma.low + offset, luma.high + offset};
+      return WordsPair{Fixed(luma.low + offset), Fixed(luma.high + offset)};
     };
     const auto narrow = [](WordsPair sum) { return NarrowShifted<6>(sum.low, sum.high); };
     return {narrow(MultiplyAdd(plus(offsetA_), a, a_)),
@@ -632,7 +633,7 @@ KESTREL_INLINE void LoadTerms(const ColourStage<kForm>& stage, const uint8_t* a,
 
 // Pixels from samples that were Ordered.
 template <int kPixel>
-inline void StoreOrdered(uint8_t* dst, Bytes low, Bytes middle, Bytes high, Bytes alpha) {
+KESTREL_INLINE void StoreOrdered(uint8_t* dst, Bytes low, Bytes middle, Bytes high, Bytes alpha) {
   if constexpr (kPixel == 4) {
     Store4InTurn(dst, low, middle, high, alpha);
   } else {
@@ -653,8 +654,8 @@ KESTREL_INLINE void ConvertLine(const ColourStage<kForm>& stage, uint8_t* dst, c
 }
 
 template <ChromaLayout kLayout, int kPixel>
-inline void ConvertLine(const SixBitStage& stage, uint8_t* dst, const uint8_t* y, const uint8_t* a,
-                        const uint8_t* b, Bytes alpha) {
+KESTREL_INLINE void ConvertLine(const SixBitStage& stage, uint8_t* dst, const uint8_t* y,
+                                const uint8_t* a, const uint8_t* b, Bytes alpha) {
   MultiplicandsPair chroma;
   if constexpr (!IsPairs(kLayout)) {
     chroma = {ToMultiplicands(Ordered<kPixel>(LoadBytes(a))),

@@ -20,6 +20,11 @@
 namespace kestrel {
 namespace {
 
+// A sum that products are added to.
+inline Words Fixed(Words sum) {
+  return sum;
+}
+
 // ---- Bytes that are multiplied
 using Multiplicands = WordsPair;
 struct MultiplicandsPair {
