@@ -102,7 +102,7 @@ struct PairPlan {
   const int32_t* second = nullptr;
   int stride = 1;
   const uint16_t* weights = nullptr;  // for blendPairs: a weight for each pair
-  uint8_t* blends = nullptr;          // and memory for four bytes for each pair
+  uint8_t* blends = nullptr;          // and memory: four bytes for each, in whole blocks of 64
 
   // Of each eight pairs: one or two windows of 16 bytes, for all or for half of them, or -1 where
   // there is none, and where in the windows their bytes are; by blocks as vectors take them.

@@ -58,10 +58,6 @@ inline void StoreWords(void* p, Words w) {
 inline Words LoadHalf(const uint8_t* p) {
   return {vmovl_u8(vld1_u8(p))};
 }
-// Words clamped to bytes, half a vector of them.
-inline void StoreHalf(uint8_t* p, Words w) {
-  vst1_u8(p, vqmovun_s16(Signed(w)));
-}
 
 // ---- Arithmetic of words, wrapping
 inline Words SetWords(int value) {
@@ -291,7 +287,7 @@ constexpr int kPairs = 16;
 struct Pairs {
   uint8x16_t first, second;
 };
-inline void StorePairs(uint8_t* p, Pairs pairs) {
+inline void StorePairs(uint8_t* p, const Pairs& pairs) {
   const uint8x16x2_t both = {{pairs.first, pairs.second}};
   vst2q_u8(p, both);
 }
@@ -313,7 +309,7 @@ inline void SetBlends(uint8_t* blends, const uint16_t* weights) {
   StoreWords(blends + 16, low);
   StoreWords(blends + 32, high);
 }
-inline void StoreBlended(uint8_t* p, Pairs pairs, const uint8_t* blends) {
+inline void StoreBlended(uint8_t* p, const Pairs& pairs, const uint8_t* blends) {
   const uint8x16_t base = vbslq_u8(vld1q_u8(blends), pairs.second, pairs.first);
   const uint8x8_t low =
       Share(vget_low_u8(pairs.first), vget_low_u8(pairs.second), LoadWords(blends + 16));

@@ -160,11 +160,20 @@ bool PlanWindow(const int32_t* offsets, int32_t lowest, int32_t end, int32_t* wi
 }
 
 // A plan's pairs in blocks of kPairs: first the windows of each eight of them (with room for two),
-// then two bytes for each pair.
+// then two bytes for each pair. The last block reaches back over pairs of the one before it; one
+// that is the only one and not full repeats its last pair.
 inline int32_t WindowAt(const uint8_t* block, int i) {
   int32_t window;
   memcpy(&window, block + 4 * i, 4);
   return window;
+}
+inline int BlocksOf(const PairPlan& plan) {
+  return (plan.n + kPairs - 1) / kPairs;
+}
+inline int FirstPairOf(const PairPlan& plan, int block) {
+  const int first = block * kPairs;
+  const int latest = plan.n < kPairs ? 0 : plan.n - kPairs;
+  return first < latest ? first : latest;
 }
 
 // Whether all pairs have windows. One for each eight pairs is given up with the first that has
@@ -173,14 +182,15 @@ template <int kWindows>
 bool PlanWindows(PairPlan* plan, int32_t lowest, int32_t end) {
   plan->windows = kWindows;
   plan->hasWindows = true;
-  for (int i = 0; i < plan->n; i += 8) {
+  for (int i = 0; i < BlocksOf(*plan) * kPairs; i += 8) {
     int32_t offsets[16];
+    const int eight = i % kPairs / 8;
+    const int first = FirstPairOf(*plan, i / kPairs) + 8 * eight;
     for (int k = 0; k < 8; ++k) {
-      const int pair = (i + k < plan->n ? i + k : plan->n - 1) * plan->stride;
+      const int pair = (first + k < plan->n ? first + k : plan->n - 1) * plan->stride;
       offsets[2 * k] = plan->first[pair];
       offsets[2 * k + 1] = plan->second[pair];
     }
-    const int eight = i % kPairs / 8;
     uint8_t* const block = plan->prepared + 3 * (i - i % kPairs);
     uint8_t at[16];
     constexpr int kShared = 8 / kWindows;
@@ -209,8 +219,12 @@ void PlanPairs(PairPlan* plan) {
   }
   if (!PlanWindows<1>(plan, lowest, end)) PlanWindows<2>(plan, lowest, end);
   if (plan->weights == nullptr) return;
-  for (int i = 0; i + kPairs <= plan->n; i += kPairs) {
-    SetBlends(plan->blends + 4 * i, plan->weights + i);
+  for (int block = 0; block < BlocksOf(*plan); ++block) {
+    const int first = FirstPairOf(*plan, block);
+    const int n = plan->n - first < kPairs ? plan->n - first : kPairs;
+    uint16_t weights[kPairs] = {};
+    memcpy(weights, plan->weights + first, size_t(n) * sizeof(uint16_t));
+    SetBlends(plan->blends + 4 * kPairs * block, weights);
   }
 }
 
@@ -221,43 +235,62 @@ bool HasWindows(const uint8_t* block) {
   return windows >= 0;
 }
 
-// Calls block(i, pairs) for each kPairs pairs that have windows, other(i, end) for all others and
-// for those that do not fill a block.
-template <typename Block, typename Other>
-inline void ForPairs(const uint8_t* src, const PairPlan& plan, const Block& block,
+// Calls store(dst, pairs, block) for each block of a plan whose pairs have windows, other(i, end)
+// for the pairs of any other.
+template <int kDstUnit, typename Store, typename Other>
+inline void ForPairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan, const Store& store,
                      const Other& other) {
-  const int whole = plan.n / kPairs * kPairs;
+  const int n = plan.n;
+  const int whole = n / kPairs;
   const uint8_t* prepared = plan.prepared;
-  if (plan.windows == 1) {
-    for (int i = 0; i < whole; i += kPairs, prepared += 3 * kPairs) {
-      block(i, GatherPairs<1>(src, prepared));
+  const auto storeOne = [&](uint8_t* out, int block) {
+    if (plan.windows == 1) {
+      store(out, GatherPairs<1>(src, prepared), block);
+    } else {
+      store(out, GatherPairs<2>(src, prepared), block);
     }
-  } else if (plan.hasWindows) {
-    for (int i = 0; i < whole; i += kPairs, prepared += 3 * kPairs) {
-      block(i, GatherPairs<2>(src, prepared));
-    }
-  } else {
-    for (int i = 0; i < whole; i += kPairs, prepared += 3 * kPairs) {
+  };
+  if (!plan.hasWindows) {
+    for (int block = 0; block < whole; ++block, prepared += 3 * kPairs) {
       if (HasWindows(prepared)) {
-        block(i, GatherPairs<2>(src, prepared));
+        storeOne(dst + block * kPairs * kDstUnit, block);
       } else {
-        other(i, i + kPairs);
+        other(block * kPairs, (block + 1) * kPairs);
       }
     }
+    other(whole * kPairs, n);
+    return;
   }
-  other(whole, plan.n);
+  uint8_t* out = dst;
+  if (plan.windows == 1) {
+    for (int block = 0; block < whole; ++block, prepared += 3 * kPairs, out += kPairs * kDstUnit) {
+      store(out, GatherPairs<1>(src, prepared), block);
+    }
+  } else {
+    for (int block = 0; block < whole; ++block, prepared += 3 * kPairs, out += kPairs * kDstUnit) {
+      store(out, GatherPairs<2>(src, prepared), block);
+    }
+  }
+  if (whole * kPairs == n) return;
+  if (whole > 0) return storeOne(dst + (n - kPairs) * kDstUnit, whole);
+  uint8_t rest[kPairs * kDstUnit];
+  storeOne(rest, 0);
+  memcpy(dst, rest, size_t(n) * kDstUnit);
 }
 
 void ReadPairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan) {
-  ForPairs(
-      src, plan, [=](int i, Pairs pairs) { StorePairs(dst + 2 * i, pairs); },
+  ForPairs<2>(
+      dst, src, plan, [](uint8_t* out, const Pairs& pairs, int) { StorePairs(out, pairs); },
       [=, &plan](int i, int end) { scalar::ReadSomePairs(dst, src, plan, i, end); });
 }
 
 void BlendPairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan) {
   const uint8_t* const blends = plan.blends;
-  ForPairs(
-      src, plan, [=](int i, Pairs pairs) { StoreBlended(dst + i, pairs, blends + 4 * i); },
+  ForPairs<1>(
+      dst, src, plan,
+      [=](uint8_t* out, const Pairs& pairs, int block) {
+        StoreBlended(out, pairs, blends + 4 * kPairs * block);
+      },
       [=, &plan](int i, int end) { scalar::BlendSomePairs(dst, src, plan, i, end); });
 }
 

@@ -59,8 +59,22 @@ inline Bytes AddShare(Bytes base, Bytes a, Bytes b, Words weight) {
 }
 
 // ---- Order of bytes
-inline void StoreBlended(uint8_t* p, Pairs pairs, const uint8_t* blends) {
-  StoreHalf(p, Blended(pairs, blends));
+// The odd bytes of two vectors.
+inline Bytes Seconds(Bytes a, Bytes b) {
+  return InOrder(Narrow(ShiftRightUnsigned<8>(Words{a.v}), ShiftRightUnsigned<8>(Words{b.v})));
+}
+// A block of a plan.
+template <int kWindows>
+inline Pairs GatherPairs(const uint8_t* src, const uint8_t* block) {
+  constexpr int kHalf = kPairs / 16 * kWindows;
+  int32_t window[2 * kHalf];
+  __builtin_memcpy(window, block, sizeof(window));
+  return {{GatherWords<kWindows>(src, window, block + kPairs),
+           GatherWords<kWindows>(src, window + kHalf, block + kPairs + kBytes)}};
+}
+inline void StoreBlended(uint8_t* p, const Pairs& pairs, const uint8_t* blends) {
+  StoreBytes(p, InOrder(Narrow(Blended(pairs.words[0], blends, blends + 2 * kBytes),
+                               Blended(pairs.words[1], blends + kBytes, blends + 3 * kBytes))));
 }
 inline Bytes SwapNeighbours(Bytes b) {
   const Words w = {b.v};

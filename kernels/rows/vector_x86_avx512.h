@@ -35,13 +35,6 @@ inline __m256i Load32(const void* p) {
 inline Words LoadHalf(const uint8_t* p) {
   return {_mm512_cvtepu8_epi16(Load32(p))};
 }
-// Words clamped to bytes, half a vector of them.
-inline void StoreHalf(uint8_t* p, Words w) {
-  const Register twice = Narrow(w, w).v;
-  _mm256_storeu_si256(
-      reinterpret_cast<__m256i*>(p),
-      LowHalf(_mm512_permutexvar_epi64(_mm512_setr_epi64(0, 2, 4, 6, 0, 2, 4, 6), twice)));
-}
 // Words of a vector's pixels, in order.
 inline void StorePixelWords(uint8_t* p, WordsPair w) {
   const Register first = _mm512_setr_epi64(0, 1, 8, 9, 2, 3, 10, 11);
@@ -209,27 +202,24 @@ inline void StoreReversed(uint8_t* p, const uint8_t* src) {
   Store(p, Reorder(Load(src), kReversed<kUnit>));
 }
 
-// A block of a plan.
+// Of two vectors narrowed lane by lane: the first one's bytes before the second one's.
+inline Bytes InOrder(Bytes narrowed) {
+  return {_mm512_permutexvar_epi64(_mm512_setr_epi64(0, 2, 4, 6, 1, 3, 5, 7), narrowed.v)};
+}
+
+// Half a block of a plan: its windows and its shuffle.
 template <int kWindows>
-KESTREL_INLINE Pairs GatherPairs(const uint8_t* src, const uint8_t* block) {
-  int32_t window[4 * kWindows];
-  __builtin_memcpy(window, block, sizeof(window));
-  const Register shuffle = Load(block + kPairs);
+inline Words GatherWords(const uint8_t* src, const int32_t* window, const uint8_t* shuffle) {
+  const Register order = Load(shuffle);
   const auto bytes = [&](int half) {
     return Join(Load16(src + window[half]), Load16(src + window[kWindows + half]),
                 Load16(src + window[2 * kWindows + half]),
                 Load16(src + window[3 * kWindows + half]));
   };
-  const Register first = _mm512_shuffle_epi8(bytes(0), shuffle);
+  const Register first = _mm512_shuffle_epi8(bytes(0), order);
   if constexpr (kWindows == 1) return {first};
   constexpr uint64_t kUpperHalves = 0xFF00FF00FF00FF00;
-  return {_mm512_mask_shuffle_epi8(first, kUpperHalves, bytes(1), shuffle)};
-}
-
-// The odd bytes of two vectors.
-inline Bytes Seconds(Bytes a, Bytes b) {
-  const Bytes narrow = Narrow(ShiftRightUnsigned<8>(Words{a.v}), ShiftRightUnsigned<8>(Words{b.v}));
-  return {_mm512_permutexvar_epi64(_mm512_setr_epi64(0, 2, 4, 6, 1, 3, 5, 7), narrow.v)};
+  return {_mm512_mask_shuffle_epi8(first, kUpperHalves, bytes(1), order)};
 }
 
 // ---- Pixels of four bytes

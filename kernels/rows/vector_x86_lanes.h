@@ -32,10 +32,6 @@ inline void StoreLanes(uint8_t* p, int i, int count, Register v) {
 inline Words LoadHalf(const uint8_t* p) {
   return {_mm256_cvtepu8_epi16(Load16(p))};
 }
-// Words clamped to bytes, half a vector of them.
-inline void StoreHalf(uint8_t* p, Words w) {
-  Store16(p, _mm_packus_epi16(LowLane(w.v), HighLane(w.v)));
-}
 #else
 inline Register LoadLanes(const uint8_t* p, int i, int) {
   return Load16(p + 16 * i);
@@ -45,9 +41,6 @@ inline void StoreLanes(uint8_t* p, int i, int, Register v) {
 }
 inline Words LoadHalf(const uint8_t* p) {
   return {_mm_cvtepu8_epi16(Load8(p))};
-}
-inline void StoreHalf(uint8_t* p, Words w) {
-  _mm_storel_epi64(reinterpret_cast<__m128i*>(p), _mm_packus_epi16(w.v, w.v));
 }
 #endif
 
@@ -182,19 +175,26 @@ inline void StoreReversed(uint8_t* p, const uint8_t* src) {
   Store(p, v);
 #endif
 }
-// A block of a plan.
+// Of two vectors narrowed lane by lane: the first one's bytes before the second one's.
+inline Bytes InOrder(Bytes narrowed) {
+#ifdef __AVX2__
+  return {_mm256_permute4x64_epi64(narrowed.v, 0xD8)};
+#else
+  return narrowed;
+#endif
+}
+
+// Half a block of a plan: its windows and its shuffle.
 template <int kWindows>
-KESTREL_INLINE Pairs GatherPairs(const uint8_t* src, const uint8_t* block) {
-  int32_t window[kPairs / 8 * kWindows];
-  __builtin_memcpy(window, block, sizeof(window));
-  const Register shuffle = Load(block + kPairs);
+inline Words GatherWords(const uint8_t* src, const int32_t* window, const uint8_t* shuffle) {
+  const Register order = Load(shuffle);
   const auto gather = [&](int half) {
 #ifdef __AVX2__
     const Register bytes = Join(Load16(src + window[half]), Load16(src + window[kWindows + half]));
 #else
     const Register bytes = Load16(src + window[half]);
 #endif
-    return KESTREL_SIMD(shuffle_epi8)(bytes, shuffle);
+    return KESTREL_SIMD(shuffle_epi8)(bytes, order);
   };
   if constexpr (kWindows == 1) return {gather(0)};
   return {KESTREL_SIMD(blend_epi16)(gather(0), gather(1), 0xF0)};
@@ -248,16 +248,6 @@ inline WordsPair SpreadToQuads(const uint16_t* weights) {
 #endif
   return {{KESTREL_SIMD(shuffle_epi8)(w, Broadcast(low))},
           {KESTREL_SIMD(shuffle_epi8)(w, Broadcast(high))}};
-}
-
-// The odd bytes of two vectors.
-inline Bytes Seconds(Bytes a, Bytes b) {
-  const Bytes narrow = Narrow(ShiftRightUnsigned<8>(Words{a.v}), ShiftRightUnsigned<8>(Words{b.v}));
-#ifdef __AVX2__
-  return {_mm256_permute4x64_epi64(narrow.v, 0xD8)};
-#else
-  return narrow;
-#endif
 }
 
 }  // namespace

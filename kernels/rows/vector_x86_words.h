@@ -209,10 +209,13 @@ class ChromaWord {
 
 // ---- Pairs of bytes
 // kPairs of them as words: first byte low, second byte high.
-constexpr int kPairs = kWords;
-using Pairs = Words;
-inline void StorePairs(uint8_t* p, Pairs pairs) {
-  StoreWords(p, pairs);
+constexpr int kPairs = kBytes;
+struct Pairs {
+  Words words[2];
+};
+inline void StorePairs(uint8_t* p, const Pairs& pairs) {
+  StoreWords(p, pairs.words[0]);
+  StoreWords(p + kBytes, pairs.words[1]);
 }
 template <int kShared>
 inline void SetShuffle(uint8_t* shuffle, const uint8_t (&at)[16]) {
@@ -220,15 +223,18 @@ inline void SetShuffle(uint8_t* shuffle, const uint8_t (&at)[16]) {
 }
 // What each byte of a pair counts in the byte that its blend begins with, and the weights.
 inline void SetBlends(uint8_t* blends, const uint16_t* weights) {
-  const Words isSecond = ShiftRightUnsigned<15>(LoadWords(weights));
-  StoreWords(blends, ShiftLeft<8>(isSecond) | (isSecond ^ SetWords(1)));
-  StoreWords(blends + kBytes, LoadWords(weights));
+  for (int half = 0; half < 2; ++half) {
+    const Words w = LoadWords(weights + half * kWords);
+    const Words isSecond = ShiftRightUnsigned<15>(w);
+    StoreWords(blends + half * kBytes, ShiftLeft<8>(isSecond) | (isSecond ^ SetWords(1)));
+    StoreWords(blends + (2 + half) * kBytes, w);
+  }
 }
-inline Words Blended(Pairs pairs, const uint8_t* blends) {
+inline Words Blended(Words pairs, const uint8_t* base, const uint8_t* weights) {
   const Register minusFirst = KESTREL_SIMD(set1_epi16)(0x01FF);
   const Words difference = {KESTREL_SIMD(maddubs_epi16)(pairs.v, minusFirst)};
-  const Words base = {KESTREL_SIMD(maddubs_epi16)(pairs.v, Load(blends))};
-  return AddHighProduct(base, difference, LoadWords(blends + kBytes));
+  const Words start = {KESTREL_SIMD(maddubs_epi16)(pairs.v, Load(base))};
+  return AddHighProduct(start, difference, LoadWords(weights));
 }
 
 // ---- Between bytes and words
