@@ -60,6 +60,11 @@ class Images {
   reference::Job JobOnProduct() const { return Bind(product_); }
   reference::Job JobOnModel() const { return Bind(model_); }
 
+  // Where the blocks of the job lie.
+  const differential::PlacedBlock* source() const { return source_; }
+  const differential::PlacedBlock* product() const { return product_; }
+  const differential::PlacedBlock* model() const { return model_; }
+
   // Puts the bytes of Prepare back.
   void RestoreProduct();
 

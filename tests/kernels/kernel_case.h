@@ -58,6 +58,11 @@ class KernelBench {
   // Converts the other set with the model.
   void CallModel(const reference::Quirks& quirks);
 
+  // Where the blocks of the case lie: the source, what kernels draw on, what the model draws on.
+  const differential::PlacedBlock* sourceBlocks() const { return sourceBlocks_; }
+  const differential::PlacedBlock* gotBlocks() const { return gotBlocks_; }
+  const differential::PlacedBlock* expectedBlocks() const { return expectedBlocks_; }
+
   // What differs between the two sets; empty when nothing does.
   std::string Difference() const;
 
