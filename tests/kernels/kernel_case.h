@@ -75,7 +75,7 @@ class KernelBench {
   bool Bind(const differential::PlacedBlock* dst, reference::KernelCall* call) const;
 
   Buffer source_[3], got_[3], expected_[3];
-  differential::PlacedBlock sourceBlocks_[3], gotBlocks_[3], expectedBlocks_[3];
+  differential::PlacedBlock sourceBlocks_[3] = {}, gotBlocks_[3] = {}, expectedBlocks_[3] = {};
   differential::Case case_{};
   const reference::Engine* engine_ = nullptr;
   bool collapsed_ = false;

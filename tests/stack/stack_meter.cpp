@@ -52,10 +52,10 @@ size_t UseOf(const std::function<void()>& body) {
   }
   pthread_attr_t attributes;
   pthread_attr_init(&attributes);
-  pthread_attr_setstack(&attributes, stack, kStackSize);
   Call call = {&body, 0};
   pthread_t thread;
-  const bool runs = pthread_create(&thread, &attributes, Enter, &call) == 0;
+  const bool runs = pthread_attr_setstack(&attributes, stack, kStackSize) == 0 &&
+                    pthread_create(&thread, &attributes, Enter, &call) == 0;
   pthread_attr_destroy(&attributes);
   if (!runs) {
     ADD_FAILURE() << "no thread";
