@@ -468,7 +468,7 @@ void RequireThatTheWatcherSees() {
 
 bool ParseNumber(const char* text, int* number) {
   char* end = nullptr;
-  const long value = std::strtol(text, &end, 10);
+  const auto value = std::strtol(text, &end, 10);
   *number = int(value);
   return end != text && *end == '\0' && value >= 0 && value <= 1000000;
 }

@@ -15,7 +15,7 @@ constexpr size_t kLimit = 64 << 10;
 
 // Bytes of stack that a call uses, on a thread of its own. SIZE_MAX, and the test fails, when there
 // is no such thread.
-size_t UseOf(const std::function<void()>& call);
+size_t UseOf(const std::function<void()>& body);
 
 // The deepest of each kind of calls; says them when it goes.
 class Deepest {

@@ -34,6 +34,7 @@ std::vector<std::string> OnThreads(const std::function<std::string(int)>& body) 
   std::atomic<int> waiting{kThreads};
   std::vector<std::string> complaints(kThreads);
   std::vector<std::thread> threads;
+  threads.reserve(kThreads);
   for (int thread = 0; thread < kThreads; ++thread) {
     threads.emplace_back([&waiting, &complaints, &body, thread] {
       --waiting;
@@ -141,7 +142,7 @@ TEST(Threads, EnginesOfTheirOwnShareSources) {
     for (size_t i = 0; i < kJobs * kRounds; ++i) {
       // Neighbours meet in the same jobs with different sets, and in different ones.
       const Job& job = jobs[(i + size_t(thread / 4) * 37) % kJobs];
-      const std::string complaint = job.Run(sets[(i + size_t(thread)) % sets.size()]);
+      std::string complaint = job.Run(sets[(i + size_t(thread)) % sets.size()]);
       if (!complaint.empty()) return complaint;
     }
     return std::string();
