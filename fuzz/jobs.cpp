@@ -206,7 +206,7 @@ int32_t DrawLength(Input* input) {
 }
 
 MRECT DrawRect(Input* input) {
-  MRECT rect;
+  MRECT rect = {};
   for (int32_t* edge : {&rect.left, &rect.top, &rect.right, &rect.bottom}) {
     *edge = input->OneIn(16) ? int32_t(input->Word()) : input->Between(-70, 90);
   }

@@ -60,6 +60,11 @@ class Images {
   reference::Job JobOnProduct() const { return Bind(product_); }
   reference::Job JobOnModel() const { return Bind(model_); }
 
+  // Where the blocks of the job lie.
+  const differential::PlacedBlock* source() const { return source_; }
+  const differential::PlacedBlock* product() const { return product_; }
+  const differential::PlacedBlock* model() const { return model_; }
+
   // Puts the bytes of Prepare back.
   void RestoreProduct();
 
@@ -77,7 +82,7 @@ class Images {
 
   Buffer sourceMemory_[3], productMemory_[3], modelMemory_[3];
   testing_support::GuardedBuffer paletteMemory_;
-  differential::PlacedBlock source_[3], product_[3], model_[3];
+  differential::PlacedBlock source_[3] = {}, product_[3] = {}, model_[3] = {};
   std::vector<uint8_t> before_[3], sourceBefore_[3];
   const uint8_t* palette_ = nullptr;
   Job job_;

@@ -236,7 +236,7 @@ DumpLayout DescribeDump(uint32_t format) {
 void WriteRows(FILE* file, const uint8_t* plane, int64_t pitch, int64_t bytes, int64_t rows) {
   if (plane == nullptr || bytes <= 0) return;
   for (int64_t row = 0; row < rows; ++row) {
-    fwrite(plane + ptrdiff_t(row * pitch), 1, size_t(bytes), file);
+    (void)fwrite(plane + ptrdiff_t(row * pitch), 1, size_t(bytes), file);
   }
 }
 
@@ -322,17 +322,18 @@ uint32_t MBitmapFree(MBITMAP* bitmap) {
   return KESTREL_OK;
 }
 
+// Results of writing are dropped on purpose: a dump reports nothing.
 void dumpBitmap2(const char* path, const MBITMAP* bitmap) {
   if (path == nullptr || bitmap == nullptr) return;
   FILE* file = fopen(path, "wb");
-  if (file != nullptr) fclose(file);
+  if (file != nullptr) (void)fclose(file);
   file = fopen(path, "ab");
   if (file == nullptr) return;
   const DumpLayout layout = DescribeDump(bitmap->format);
   WriteRows(file, bitmap->plane[0], bitmap->pitch[0], layout.bytesPerPixel * bitmap->width,
             bitmap->height);
   WriteChroma(file, *bitmap, layout);
-  fclose(file);
+  (void)fclose(file);
 }
 
 }  // extern "C"

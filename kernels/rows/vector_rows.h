@@ -1025,7 +1025,7 @@ void WriteStrided(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int n) {
   }
 }
 
-constexpr RowOps VectorRows(const char* name) {
+constexpr RowOps VectorRows(const char* name) noexcept {
   return {name,
           ReadStrided,
           scalar::Gather,

@@ -58,7 +58,7 @@ class Bench {
   // one that ran is currentRows.
   std::string Run(const Case& drawn, const std::vector<InstructionSet>& sets) {
     Random random(drawn.seed ^ 0x5bd1e995, drawn.number);
-    PlacedBlock source[3], product[3], model[3];
+    PlacedBlock source[3] = {}, product[3] = {}, model[3] = {};
     for (int i = 0; i < drawn.src.blocks.count; ++i) {
       source[i] = Place(source_[i].get(), drawn.src, i);
       FillContent(&random, drawn.content, source[i].watched, source[i].watchedSize);

@@ -143,10 +143,10 @@ TEST(Align, FollowsTheFirstEngineOfATiledHandle) {
 
 TEST(Align, NeedsOneRectangleThatIsAllZero) {
   const Engine engine({kGrey, 60, 40}, {kGrey, 90, 80});
-  for (int word = 0; word < 4; ++word) {
+  for (int32_t MRECT::*const edge : {&MRECT::left, &MRECT::top, &MRECT::right, &MRECT::bottom}) {
     MRECT dst = {1, 2, 3, 4};
     MRECT src = {};
-    (&src.left)[word] = 5;
+    src.*edge = 5;
     const MRECT srcBefore = src;
     EXPECT_EQ(MPPAlign(engine.handle(), &dst, &src), KESTREL_BAD_ARGUMENT);
     EXPECT_EQ(dst, (MRECT{1, 2, 3, 4}));

@@ -58,7 +58,8 @@ void ExpectCarriedFours(const Bytes& pixels) {
 TEST(CarriedRemainders, RunAcrossTheEndsOfRows) {
   Bytes src(45, 4), dst(30);
   const Engine engine({FORMAT_RGB565, 5, 3}, {FORMAT_RGB888, 5, 3}, Param().Dither());
-  for (KernelFn* const entry : {RGB888Fast_NORESAMPLE_R5G6B5_Dither, ANY_ANY_C_FAST_R5G6B5}) {
+  KernelFn* const entries[] = {RGB888Fast_NORESAMPLE_R5G6B5_Dither, ANY_ANY_C_FAST_R5G6B5};
+  for (auto* const entry : entries) {
     std::fill(dst.begin(), dst.end(), uint8_t{0});
     ASSERT_EQ(Call(entry, engine, OnePlane(dst, 10), OnePlane(src, 15)), KESTREL_OK);
     ExpectCarriedFours(dst);

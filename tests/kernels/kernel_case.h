@@ -58,6 +58,11 @@ class KernelBench {
   // Converts the other set with the model.
   void CallModel(const reference::Quirks& quirks);
 
+  // Where the blocks of the case lie: the source, what kernels draw on, what the model draws on.
+  const differential::PlacedBlock* sourceBlocks() const { return sourceBlocks_; }
+  const differential::PlacedBlock* gotBlocks() const { return gotBlocks_; }
+  const differential::PlacedBlock* expectedBlocks() const { return expectedBlocks_; }
+
   // What differs between the two sets; empty when nothing does.
   std::string Difference() const;
 
@@ -70,7 +75,7 @@ class KernelBench {
   bool Bind(const differential::PlacedBlock* dst, reference::KernelCall* call) const;
 
   Buffer source_[3], got_[3], expected_[3];
-  differential::PlacedBlock sourceBlocks_[3], gotBlocks_[3], expectedBlocks_[3];
+  differential::PlacedBlock sourceBlocks_[3] = {}, gotBlocks_[3] = {}, expectedBlocks_[3] = {};
   differential::Case case_{};
   const reference::Engine* engine_ = nullptr;
   bool collapsed_ = false;

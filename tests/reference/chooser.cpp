@@ -2,11 +2,11 @@
 #include "tests/reference/chooser.h"
 
 #include <algorithm>
+#include <cstdio>
 #include <cstring>
+#include <forward_list>
 #include <initializer_list>
 #include <iterator>
-#include <set>
-#include <string>
 #include <utility>
 
 namespace reference {
@@ -285,38 +285,51 @@ const char* YuyvSuffix(const Engine& e) {
 }
 
 // Names are put together; this keeps each one for good.
-const char* Kept(const std::string& name) {
-  static std::set<std::string> names;
-  return names.insert(name).first->c_str();
+const char* Kept(const char* start, const char* middle, const char* end = "") {
+  struct Name {
+    char text[80];
+  };
+  static std::forward_list<Name> names;
+  Name name;
+  std::snprintf(name.text, sizeof(name.text), "%s%s%s", start, middle, end);
+  for (const Name& known : names) {
+    if (std::strcmp(known.text, name.text) == 0) {
+      return known.text;
+    }
+  }
+  names.push_front(name);
+  return names.front().text;
 }
 
 const char* ToYuyv(const Engine& e, const Kind& kind) {
   const bool isBlocked = e.blockMode == 2 || e.blockMode == 3;
-  const std::string longName = kind.longPrefix;
-  const std::string shortName = kind.shortPrefix;
+  const char* const longName = kind.longPrefix;
+  const char* const shortName = kind.shortPrefix;
   const char* const suffix = YuyvSuffix(e);
   if (IsUnitScale(e)) {
     if (!isBlocked) {
-      return Kept(longName + "_NOREAMPLE_ROTATE_Fast");
+      return Kept(longName, "_NOREAMPLE_ROTATE_Fast");
     }
     if (suffix) {
       if (e.src.code == CODE_I420 && e.blockMode == 3 && e.swapXY && e.mirrorX) {
         return "I420toYUYVFast_NORESAMPLE_90";
       }
-      return Kept(longName + "_Fast_NORESAMPLE_2x2_" + suffix);
+      return Kept(longName, "_Fast_NORESAMPLE_2x2_", suffix);
     }
-    return Kept(e.blockMode == 3 ? shortName + "_NORESAMPLE" : longName + "_Fast_NORESAMPLE_2x2");
+    return e.blockMode == 3 ? Kept(shortName, "_NORESAMPLE")
+                            : Kept(longName, "_Fast_NORESAMPLE_2x2");
   }
   if (e.bilinear) {
     return nullptr;
   }
   if (!isBlocked) {
-    return Kept(longName + "_Fast");
+    return Kept(longName, "_Fast");
   }
   if (suffix) {
-    return Kept(longName + "_Fast_2x2_" + suffix);
+    return Kept(longName, "_Fast_2x2_", suffix);
   }
-  return Kept(e.blockMode == 3 && !e.mirrorY ? shortName + "_RESAMPLE" : longName + "_Fast_2x2");
+  return e.blockMode == 3 && !e.mirrorY ? Kept(shortName, "_RESAMPLE")
+                                        : Kept(longName, "_Fast_2x2");
 }
 
 const char* YuyvToYuyv(const Engine& e) {

@@ -2,7 +2,7 @@
 #include <algorithm>
 #include <cstdint>
 #include <initializer_list>
-#include <map>
+#include <unordered_map>
 
 #include "tests/reference/reference.h"
 
@@ -331,8 +331,9 @@ class Destination {
   const int32_t* pitches_;
   uint8_t* const* starts_;
   const Quirks quirks_;
-  std::map<const uint8_t*, int64_t> chromaColumns_;  // image column that each sample came from
-  int64_t firstX_;                                   // image coordinates of the first pixel
+  // Image column that each sample came from.
+  std::unordered_map<const uint8_t*, int64_t> chromaColumns_;
+  int64_t firstX_;  // image coordinates of the first pixel
   int64_t firstY_;
   int64_t imageRight_;
   int64_t loopRow_ = 0;

@@ -1,18 +1,17 @@
 // What a kernel gives instead of the generic converter's bytes, told by its name.
-#include <cstring>
-#include <string>
+#include <string_view>
 
 #include "tests/reference/chooser.h"
 
 namespace reference {
 namespace {
 
-bool StartsWith(const std::string& name, const char* start) {
-  return name.compare(0, std::strlen(start), start) == 0;
+bool StartsWith(std::string_view name, std::string_view start) {
+  return name.substr(0, start.size()) == start;
 }
 
-bool Contains(const std::string& name, const char* part) {
-  return name.find(part) != std::string::npos;
+bool Contains(std::string_view name, std::string_view part) {
+  return name.find(part) != std::string_view::npos;
 }
 
 }  // namespace
@@ -22,7 +21,7 @@ Quirks QuirksOf(const char* kernel) {
   if (!kernel) {
     return quirks;
   }
-  const std::string name = kernel;
+  const std::string_view name = kernel;
   // I420_To_I422_Fast never looks at levels.
   for (const char* copier :
        {"I420_To_I422_Fast_NORESAMPLE_90", "I420_To_I422_Fast_90",
@@ -61,9 +60,9 @@ Quirks QuirksOf(const char* kernel) {
     quirks.carriesAlways |= name == ditherer;
   }
   quirks.clampedCarry |= name == "NV21_To_RGB565_NoResample_2x2_Dither";
-  for (const char* kind : {"RGB24", "Gray", "I420"}) {
-    if (StartsWith(name, (std::string(kind) + "_To_YUYV").c_str()) ||
-        StartsWith(name, (std::string(kind) + "toYUYV").c_str())) {
+  for (const char* start : {"RGB24_To_YUYV", "RGB24toYUYV", "Gray_To_YUYV", "GraytoYUYV",
+                            "I420_To_YUYV", "I420toYUYV"}) {
+    if (StartsWith(name, start)) {
       quirks.chromaOfPairs = true;
       quirks.storedLevels = true;
       quirks.edgesOfPairs = !Contains(name, "NORESAMPLE") && !Contains(name, "NOREAMPLE");

@@ -93,7 +93,7 @@ struct Sources {
       channel = trial->Source(size_t(n));
     }
   }
-  const uint8_t* in[3];
+  const uint8_t* in[3] = {};
 };
 
 struct Destinations {
