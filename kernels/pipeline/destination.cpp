@@ -259,8 +259,8 @@ void Destination::SelectColumns(int32_t x, int n) {
     if (i + 1 < n && ChromaColumn(x + i + 1) == chroma) continue;
     if (planes_[1].columns.Contains(chroma)) {
       if (chromaCount_ == 0) firstChroma_ = chroma;
-      uColumns_[chromaCount_] = x + (uOfLastColumn_ ? i : first);
-      vColumns_[chromaCount_] = x + (vOfLastColumn_ ? i : first);
+      uColumns_[chromaCount_] = uOfLastColumn_ ? i : first;
+      vColumns_[chromaCount_] = vOfLastColumn_ ? i : first;
       ++chromaCount_;
     }
     first = i + 1;

@@ -117,13 +117,16 @@ class Destination {
   void SelectColumns(int32_t x, int n);
 
   // YUV. Chroma is overwritten by every pixel of its block: only the last one in loop order counts,
-  // so chroma is taken at uColumns() and vColumns() and in the rows that WritesU and WritesV name.
+  // so chroma is taken at uColumns() and vColumns() of the strip and in the rows that WritesU and
+  // WritesV name.
   // (With pair chroma the two differ.)
   bool hasChroma() const { return hasChroma_; }
   bool WritesU(int32_t r) const { return WritesChroma(r, uOfLastRow_); }
   bool WritesV(int32_t r) const { return WritesChroma(r, vOfLastRow_); }
   const int32_t* uColumns() const { return uColumns_; }
-  const int32_t* vColumns() const { return vColumns_; }
+  const int32_t* vColumns() const {
+    return uOfLastColumn_ == vOfLastColumn_ ? uColumns_ : vColumns_;
+  }
   int chromaCount() const { return chromaCount_; }
   // (Where packed 4:2:2 is written whole, luma is kept until the row's chroma comes.)
   void PutLuma(int32_t r, const uint8_t* luma);
@@ -222,7 +225,7 @@ class Destination {
   const uint8_t* heldLuma_ = nullptr;
   int chromaCount_ = 0;
   int64_t firstChroma_ = 0;                      // plane column of the first chroma sample
-  int32_t uColumns_[kStrip], vColumns_[kStrip];  // loop columns
+  int32_t uColumns_[kStrip], vColumns_[kStrip];  // columns of the strip
   int firstPixel_ = 0, pixelEnd_ = 0;            // columns of the strip that are inside plane 0
   // Of all writers (planes of YUV share it), or of samples that are arranged.
   uint8_t buffer_[ArrangedSamples::kSize];

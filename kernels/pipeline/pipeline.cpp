@@ -113,22 +113,18 @@ class Pipeline {
     source_.SelectColumns(x, n_);
     destination_.SelectColumns(x, n_);
     if (engine_.pathKind == PATH_YUV_TO_RGB && dithers_) {
-      for (int i = 0; i < n_; ++i) uColumns_[i] = x + i;
-      source_.SelectChroma(uColumns_, uColumns_, n_);
+      source_.SelectChroma(x, nullptr, nullptr, n_);
     } else if (engine_.pathKind == PATH_YUV_TO_RGB) {
       source_.SelectPixelChroma(x, n_);
     } else if (engine_.pathKind == PATH_YUV_TO_YUV) {
-      source_.SelectChroma(destination_.uColumns(), destination_.vColumns(),
+      source_.SelectChroma(x, destination_.uColumns(), destination_.vColumns(),
                            destination_.chromaCount());
     } else {
-      for (int k = 0; k < destination_.chromaCount(); ++k) {
-        uColumns_[k] = destination_.uColumns()[k] - x;
-        vColumns_[k] = destination_.vColumns()[k] - x;
-      }
-      uStep_ = CommonStep(uColumns_, destination_.chromaCount());
-      vStep_ = CommonStep(vColumns_, destination_.chromaCount());
+      const int n = destination_.chromaCount();
+      uStep_ = CommonStep(destination_.uColumns(), n);
+      vStep_ = CommonStep(destination_.vColumns(), n);
       chromaOfSeconds_ = !job_.has(kPairChroma) && uStep_ >= 1 && uStep_ <= 2 &&
-                         (destination_.chromaCount() == 0 || uColumns_[0] + 1 >= uStep_);
+                         (n == 0 || destination_.uColumns()[0] + 1 >= uStep_);
     }
   }
 
@@ -611,8 +607,8 @@ class Pipeline {
     // Only the pixels that decide a block's chroma are converted.
     const bool writesU = destination_.WritesU(r);
     const bool writesV = destination_.WritesV(r);
-    if (writesU) Chroma(u_, run, uColumns_, uStep_, tables + 3, n);
-    if (writesV) Chroma(v_, run, vColumns_, vStep_, tables + 5, n);
+    if (writesU) Chroma(u_, run, destination_.uColumns(), uStep_, tables + 3, n);
+    if (writesV) Chroma(v_, run, destination_.vColumns(), vStep_, tables + 5, n);
     destination_.PutChroma(r, writesU ? u_ : nullptr, writesV ? v_ : nullptr);
   }
 
@@ -632,7 +628,7 @@ class Pipeline {
     }
     const int n = destination_.chromaCount();
     if (n == 0 || !destination_.WritesU(r)) return;
-    const uint8_t* const first = pixels + ptrdiff_t{uColumns_[0]} * format.bytes;
+    const uint8_t* const first = pixels + ptrdiff_t{destination_.uColumns()[0]} * format.bytes;
     PixelsToChroma(u_, first, 1, uStep_, n);
     PixelsToChroma(v_, first, 2, uStep_, n);
     destination_.PutChroma(r, u_, v_);
@@ -728,10 +724,10 @@ class Pipeline {
   int32_t stripWidth_ = 0;
   int32_t mostRows_ = INT32_MAX;  // to convert at once
   int n_ = 0;
-  bool lumaDone_ = false, chromaDone_ = false;   // by CopyPlanes
-  int32_t uColumns_[kStrip], vColumns_[kStrip];  // loop columns, or columns of the strip
-  int uStep_ = 0, vStep_ = 0;                    // from each of them to the next; 0 when it varies
-  bool chromaOfSeconds_ = false;                 // every pixel, or the second of each two, decides
+  bool lumaDone_ = false, chromaDone_ = false;  // by CopyPlanes
+  // From each column of the strip that decides chroma to the next; 0 when it varies.
+  int uStep_ = 0, vStep_ = 0;
+  bool chromaOfSeconds_ = false;  // every pixel, or the second of each two, decides
   // Runs of samples; or those of short rows, luma and then chroma.
   uint8_t memory_[3 * kCollected];
   uint8_t* const channels_[3] = {memory_, memory_ + kStrip, memory_ + 2 * kStrip};
@@ -740,7 +736,7 @@ class Pipeline {
   uint8_t* const v_ = memory_ + 5 * kStrip;
 };
 
-static_assert(sizeof(Pipeline) < size_t{56} * 1024, "camera threads have small stacks");
+static_assert(sizeof(Pipeline) < size_t{50} * 1024, "camera threads have small stacks");
 
 }  // namespace
 

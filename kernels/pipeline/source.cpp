@@ -18,22 +18,22 @@ void SampleColumns::Finish(int count) {
 }
 
 void SampleColumns::Plan(const RowOps& rows) {
-  if (contiguous) return;
-  plan.n = n / 2;
-  plan.first = offset;
-  plan.second = offset + 1;
-  plan.stride = 2;
-  plan.weights = nullptr;
-  rows.planPairs(&plan);
+  if (contiguous || plan == nullptr) return;
+  plan->n = n / 2;
+  plan->first = offset;
+  plan->second = offset + 1;
+  plan->stride = 2;
+  plan->weights = nullptr;
+  rows.planPairs(plan);
 }
 
 void SampleColumns::PlanWith(const int32_t* second, const uint16_t* weights, const RowOps& rows) {
-  plan.n = n;
-  plan.first = offset;
-  plan.second = second;
-  plan.stride = 1;
-  plan.weights = weights;
-  rows.planPairs(&plan);
+  plan->n = n;
+  plan->first = offset;
+  plan->second = second;
+  plan->stride = 1;
+  plan->weights = weights;
+  rows.planPairs(plan);
 }
 
 Source::Source(const Job& job)
@@ -51,6 +51,8 @@ Source::Source(const Job& job)
   const bool isRgb = layout.code == CODE_RGB;
   first_.step = second_.step = palette_ != nullptr ? 1 : isRgb ? pixels_.bytes : layout.step[0];
   chromaU_.step = chromaV_.step = layout.step[1];
+  first_.plan = &firstPlan_;
+  chromaU_.plan = &chromaPlan_;
   if (layout.code == CODE_GRAY8) {
     memset(u_, 128, sizeof(u_));
     memset(v_, 128, sizeof(v_));
@@ -88,22 +90,22 @@ void Source::SelectColumns(int32_t x, int n) {
   if (!interpolates_) {
     first_.Plan(rows_);
   } else {
-    first_.plan.blends = blends_;
+    firstPlan_.blends = blends_;
     first_.PlanWith(second_.offset, weights_, rows_);
   }
 }
 
-void Source::SelectChroma(const int32_t* uColumns, const int32_t* vColumns, int n) {
-  const int32_t factor = int32_t(job_.engine.srcSubsample[1]);
-  for (int i = 0; i < n; ++i) {
-    chromaU_.Set(i, columnPositions_.At(uColumns[i]).first / factor);
-    chromaV_.Set(i, columnPositions_.At(vColumns[i]).first / factor);
-  }
-  SampleColumns* const both[] = {&chromaU_, &chromaV_};
-  for (SampleColumns* columns : both) {
-    columns->Finish(n);
-    columns->Plan(rows_);
-  }
+void Source::SelectChroma(int32_t x, const int32_t* uColumns, const int32_t* vColumns, int n) {
+  sharesColumns_ = uColumns == vColumns;
+  const auto select = [=](SampleColumns* chroma, const int32_t* columns) {
+    for (int i = 0; i < n; ++i) {
+      chroma->Set(i, ChromaColumn(x + (columns != nullptr ? columns[i] : i)));
+    }
+    chroma->Finish(n);
+    chroma->Plan(rows_);
+  };
+  select(&chromaU_, uColumns);
+  if (!sharesColumns_) select(&chromaV_, vColumns);
 }
 
 void Source::SelectPixelChroma(int32_t x, int n) {
@@ -163,7 +165,7 @@ PixelChroma Source::ChromaOfPixels(int32_t r, uint8_t* into) {
       rows_.readStrided(second, v + start, chromaU_.step, chromaCount_);
       return {{into, second, shift_, 1, 0, 0, 0}, phase_};
     case PixelChromaRead::kPairs:
-      rows_.readPairs(into, u, chromaU_.plan);
+      rows_.readPairs(into, u, chromaPlan_);
       return {{into, into + 1, 0, 2, 0, 0, 0}};
     default:
       return {{ReadSamples(into, u, chromaU_), ReadSamples(second, v, chromaU_), 0, 1, 0, 0, 0}};
@@ -237,8 +239,12 @@ const uint8_t* Source::LumaInPlace(int32_t r) const {
 
 const uint8_t* Source::ReadSamples(uint8_t* buffer, const uint8_t* row,
                                    const SampleColumns& columns) const {
+  if (!columns.contiguous && columns.plan == nullptr) {
+    rows_.gather(buffer, row, columns.offset, columns.n);
+    return buffer;
+  }
   if (!columns.contiguous) {
-    rows_.readPairs(buffer, row, columns.plan);
+    rows_.readPairs(buffer, row, *columns.plan);
     if (columns.n % 2 != 0) buffer[columns.n - 1] = row[columns.offset[columns.n - 1]];
     return buffer;
   }
@@ -263,7 +269,7 @@ void Source::ReadPixels(uint8_t* const rgb[3], const uint8_t* row, const SampleC
 void Source::FillLumaLine(Line* line, int32_t row) {
   const uint8_t* start = RowStart(0, row);
   if (interpolates_) {
-    rows_.blendPairs(line->samples[0], start, first_.plan);
+    rows_.blendPairs(line->samples[0], start, firstPlan_);
     line->channel[0] = line->samples[0];
   } else {
     line->channel[0] = ReadSamples(line->samples[0], start, first_);
@@ -339,7 +345,7 @@ const uint8_t* Source::U(int32_t r) {
 }
 
 const uint8_t* Source::V(int32_t r) {
-  return Chroma(2, r, chromaV_, v_);
+  return Chroma(2, r, sharesColumns_ ? chromaU_ : chromaV_, v_);
 }
 
 void Source::FillPixelLine(Line* line, int32_t row) {
@@ -372,7 +378,7 @@ const uint8_t* Source::Pixels(int32_t r) {
   const uint8_t* const row = RowStart(0, taps.first);
   if (first_.contiguous) return row + first_.offset[0];
   if (pixels_.bytes == 2) {
-    rows_.readPairs(packed_, row, first_.plan);
+    rows_.readPairs(packed_, row, firstPlan_);
   } else {
     rows_.gatherPixels(packed_, row, first_.offset, pixels_.bytes, first_.n);
   }

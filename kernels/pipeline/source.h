@@ -11,10 +11,10 @@ namespace kestrel {
 // all its rows.
 struct SampleColumns {
   int n = 0;
-  ptrdiff_t step = 1;       // bytes between neighbouring samples of the row
-  bool contiguous = false;  // offsets rise by exactly `step`
-  int32_t offset[kStrip];   // bytes from the start of the row
-  PairPlan plan;            // of neighbouring columns for ReadSamples, or of each with another
+  ptrdiff_t step = 1;        // bytes between neighbouring samples of the row
+  bool contiguous = false;   // offsets rise by exactly `step`
+  int32_t offset[kStrip];    // bytes from the start of the row
+  PairPlan* plan = nullptr;  // unless contiguous: how they are read, if there is room for that
 
   void Set(int i, int64_t sample) { offset[i] = int32_t(sample * step); }
   void Finish(int count);
@@ -51,8 +51,8 @@ class Source {
 
   // Selects loop columns [x, x + n), n <= kStrip, for Luma and Rgb.
   void SelectColumns(int32_t x, int n);
-  // Selects the loop columns whose U and V are wanted.
-  void SelectChroma(const int32_t* uColumns, const int32_t* vColumns, int n);
+  // Selects the loop columns whose U and V are wanted, relative to x; null for the first n.
+  void SelectChroma(int32_t x, const int32_t* uColumns, const int32_t* vColumns, int n);
 
   // Selects the chroma of loop columns [x, x + n), for ChromaOfPixels.
   void SelectPixelChroma(int32_t x, int n);
@@ -139,8 +139,10 @@ class Source {
   enum class PixelChromaRead { kGrey, kInPlace, kStrided, kPairs, kGathered };
 
   SampleColumns first_, second_, chromaU_, chromaV_;
+  PairPlan firstPlan_, chromaPlan_;
+  bool sharesColumns_ = false;  // U and V
   uint16_t weights_[kStrip];
-  uint8_t blends_[4 * kStrip];  // of first_.plan, where the strip interpolates
+  uint8_t blends_[4 * kStrip];  // of firstPlan_, where the strip interpolates
   PixelChromaRead pixelChroma_ = PixelChromaRead::kGrey;
   int chromaCount_ = 0, phase_ = 0, shift_ = 0;
   Line lines_[2];
