@@ -22,23 +22,26 @@ int PlaneWriter::Room(int64_t column, int64_t row, int n, int most) const {
   return room < most ? room : most;
 }
 
-uint8_t* PlaneWriter::Start(int64_t column, int64_t row, int n, int runs) {
+uint8_t* PlaneWriter::Start(int64_t column, int64_t row, int n, int runs, int copies) {
   started_ = runs;
+  copies_ = copies;
   if (tiles_ && count_ > 0) return buffer_ + ptrdiff_t{count_} * n_ * unit_;
   column_ = column;
   row_ = row;
   n_ = n;
-  return inPlace() ? plane_.At(column, row) : buffer_;
+  return inPlace() && copies == 1 ? plane_.At(column, row) : buffer_;
 }
 
 void PlaneWriter::Finish() {
   if (tiles_) {
     count_ += started_;
-  } else if (!inPlace()) {
-    for (int i = 0; i < started_; ++i) {
-      rows_->writePixels(plane_.At(column_, row_ + i), plane_.columnStep,
-                         buffer_ + ptrdiff_t{i} * n_ * unit_, unit_, n_);
-    }
+    return;
+  }
+  if (inPlace() && copies_ == 1) return;
+  const ptrdiff_t pitch = copies_ == 1 ? ptrdiff_t{n_} * unit_ : 0;
+  for (int i = 0; i < started_ * copies_; ++i) {
+    rows_->writePixels(plane_.At(column_, row_ + i), plane_.columnStep, buffer_ + i * pitch, unit_,
+                       n_);
   }
 }
 
@@ -379,13 +382,13 @@ Destination::PixelRun Destination::PlacePixels(int32_t r, int rows) const {
   return {plane.At(column, leftmost), plane.columnStep, firstPixel_, n};
 }
 
-Destination::PixelRun Destination::StartPixels(int32_t r, int rows) {
+Destination::PixelRun Destination::StartPixels(int32_t r, int rows, int copies) {
   const int64_t row = int64_t(r) - job_.rect.top;
   const int n = pixelEnd_ - firstPixel_;
-  if (!IsInside(row, rows)) return {nullptr, 0, 0, 0};
+  if (!IsInside(row, rows * copies)) return {nullptr, 0, 0, 0};
   const int64_t column = int64_t(x_) + firstPixel_ - job_.rect.left;
   MakeRoom(0, column, row, n, rows);
-  uint8_t* const pixels = writers_[0].Start(column, row, n, rows);
+  uint8_t* const pixels = writers_[0].Start(column, row, n, rows, copies);
   return {pixels, writers_[0].startedPitch(), firstPixel_, n};
 }
 

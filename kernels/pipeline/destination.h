@@ -72,8 +72,9 @@ class PlaneWriter {
 
   // How many of `most` runs of n units one Start can be for.
   int Room(int64_t column, int64_t row, int n, int most) const;
-  // Memory for some runs of n units; they are written by the Finish that follows.
-  uint8_t* Start(int64_t column, int64_t row, int n, int runs = 1);
+  // Memory for some runs of n units; they are written by the Finish that follows. For `copies` of
+  // one run, which go to as many rows, not in tiles.
+  uint8_t* Start(int64_t column, int64_t row, int n, int runs = 1, int copies = 1);
   ptrdiff_t startedPitch() const { return inPlace() ? plane_.rowStep : ptrdiff_t{n_} * unit_; }
   void Finish();
   // The same for bytes that exist already.
@@ -96,7 +97,8 @@ class PlaneWriter {
   int64_t column_ = 0, row_ = 0;  // of the tile's first run, or of the run that was started
   int n_ = 0;
   int started_ = 0;  // runs
-  int count_ = 0;    // runs in the tile
+  int copies_ = 1;
+  int count_ = 0;  // runs in the tile
   uint8_t* buffer_ = nullptr;
 };
 
@@ -161,8 +163,9 @@ class Destination {
   // Whether the strip's rows of packed 4:2:2 are written as groups of two pixels.
   bool writesGroups() const { return writesGroups_; }
 
-  // RGB. Memory for the pixels of some rows; null when they are outside the image.
-  PixelRun StartPixels(int32_t r, int rows);
+  // RGB. Memory for the pixels of some rows; null when they are outside the image. With `copies`
+  // those of one row are for as many, if the pixels' order is that of the walk.
+  PixelRun StartPixels(int32_t r, int rows, int copies = 1);
   // Where the pixels of YUV have another order than the walk they are written as they lie, from
   // samples in that order.
   enum class Order { kWalk, kMirrored, kTurned, kTurnedBackwards };

@@ -372,8 +372,7 @@ class Pipeline {
         YuvToRgbDithered(r);
         return 1;
       case PATH_RGB_TO_RGB:
-        RgbToRgb(r);
-        return 1;
+        return RgbToRgb(r);
       default:
         RgbToYuv(r);
         return 1;
@@ -435,6 +434,15 @@ class Pipeline {
         return rows.rows;
       }
       default: {
+        if (const int copies = Copies(r, most); copies > 1) {
+          const SampleRows row = ReadRows(r, 1);
+          const Destination::PixelRun run = destination_.StartPixels(r, 1, copies);
+          if (run.pixels != nullptr) {
+            ConvertPixels(run, FromColumn(row, run.first), run.n);
+            destination_.FinishPixels();
+          }
+          return copies;
+        }
         const SampleRows rows = ReadRows(r, most);
         const Destination::PixelRun run = destination_.StartPixels(r, rows.rows);
         if (run.pixels != nullptr) {
@@ -444,6 +452,14 @@ class Pipeline {
         return rows.rows;
       }
     }
+  }
+
+  // How many of `most` rows from r on are the same pixels, where it pays to make them once. Copies
+  // are made of what is in the cache, never of the destination, whose memory may be slow to read.
+  int Copies(int32_t r, int most) const {
+    constexpr int kWide = 128;  // narrower rows are rather collected
+    const bool enlarges = engine_.stepY < 0x10000 && n_ >= kWide && engine_.swapXY == 0;
+    return enlarges ? source_.RowsAlike(r, most) : 1;
   }
 
   // Up to `most` rows from r on.
@@ -571,19 +587,22 @@ class Pipeline {
     }
   }
 
-  void RgbToRgb(int32_t r) {
-    if (const uint8_t* pixels = clampedCarry_ ? nullptr : source_.Pixels(r)) {
-      const Destination::PixelRun to = destination_.StartPixels(r, 1);
-      if (to.pixels == nullptr) return;
+  // The number of rows done.
+  int RgbToRgb(int32_t r) {
+    if (!clampedCarry_ && source_.HasPixels(r)) {
+      const int copies = Copies(r, job_.rect.bottom - r);
+      const Destination::PixelRun to = destination_.StartPixels(r, 1, copies);
+      if (to.pixels == nullptr) return 1;
       const PixelFormat& from = source_.pixelFormat();
-      const uint8_t* const first = pixels + ptrdiff_t{to.first} * from.bytes;
-      if (keepsPixels_) {
-        memcpy(to.pixels, first, size_t(to.n) * size_t(from.bytes));
-      } else {
+      uint8_t* const into = keepsPixels_ && to.n == n_ ? to.pixels : nullptr;
+      const uint8_t* const first = source_.Pixels(r, into) + ptrdiff_t{to.first} * from.bytes;
+      if (!keepsPixels_) {
         rows_.repackPixels(to.pixels, first, from, destination_.pixelFormat(), to.n);
+      } else if (first != into) {
+        memcpy(to.pixels, first, size_t(to.n) * size_t(from.bytes));
       }
       destination_.FinishPixels();
-      return;
+      return copies;
     }
     RgbRun run = source_.Rgb(r);
     if (clampedCarry_) {
@@ -592,6 +611,7 @@ class Pipeline {
       for (int c = 0; c < 3; ++c) run.channel[c] = rgb[c];
     }
     destination_.PutRgb(r, run.channel, run.alpha, clampedCarry_);
+    return 1;
   }
 
   void RgbToYuv(int32_t r) {

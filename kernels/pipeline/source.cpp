@@ -362,27 +362,51 @@ void Source::FillPixelLine(Line* line, int32_t row) {
   }
 }
 
-const uint8_t* Source::Pixels(int32_t r) {
-  if (palette_ != nullptr) return nullptr;
-  if (pixels_.bytes == 4 && pixels_.wholeBytes) {
+bool Source::HasPixels(int32_t r) const {
+  return palette_ == nullptr &&
+         ((pixels_.bytes == 4 && pixels_.wholeBytes) || !(interpolates_ || BlendsRows(r)));
+}
+
+bool Source::BlendsRows(int32_t r) const {
+  const Taps taps = rowPositions_.At(r, 1);
+  return taps.weight != 0 && taps.first != taps.second;
+}
+
+const uint8_t* Source::Pixels(int32_t r, uint8_t* into) {
+  if (!HasPixels(r)) return nullptr;
+  if (interpolates_ || BlendsRows(r)) {
     Line *first, *second;
     uint16_t weight;
     FetchLines(r, &Source::FillPixelLine, &first, &second, &weight);
     if (weight == 0) return first->channel[0];
-    rows_.blendPixelRows(blended_[0], first->channel[0], second->channel[0], weight,
-                         pixels_.alphaByte, first_.n);
-    return blended_[0];
+    uint8_t* const blended = into != nullptr ? into : blended_[0];
+    rows_.blendPixelRows(blended, first->channel[0], second->channel[0], weight, pixels_.alphaByte,
+                         first_.n);
+    return blended;
   }
-  const Taps taps = rowPositions_.At(r, 1);
-  if (interpolates_ || (taps.weight != 0 && taps.first != taps.second)) return nullptr;
-  const uint8_t* const row = RowStart(0, taps.first);
+  const uint8_t* const row = RowStart(0, SourceRow(r, 1));
   if (first_.contiguous) return row + first_.offset[0];
+  uint8_t* const gathered = into != nullptr ? into : packed_;
   if (pixels_.bytes == 2) {
-    rows_.readPairs(packed_, row, firstPlan_);
+    rows_.readPairs(gathered, row, firstPlan_);
   } else {
-    rows_.gatherPixels(packed_, row, first_.offset, pixels_.bytes, first_.n);
+    rows_.gatherPixels(gathered, row, first_.offset, pixels_.bytes, first_.n);
   }
-  return packed_;
+  return gathered;
+}
+
+int Source::RowsAlike(int32_t r, int most) const {
+  const uint32_t factor = job_.engine.srcSubsample[4];
+  if (BlendsRows(r)) return 1;
+  const int32_t row = SourceRow(r, 1);
+  const int32_t chroma = SourceRow(r, factor);
+  int n = 1;
+  for (; n < most; ++n) {
+    const bool alike =
+        !BlendsRows(r + n) && SourceRow(r + n, 1) == row && SourceRow(r + n, factor) == chroma;
+    if (!alike) break;
+  }
+  return n;
 }
 
 RgbRun Source::Rgb(int32_t r) {

@@ -80,9 +80,13 @@ class Source {
   const uint8_t* U(int32_t r);
   const uint8_t* V(int32_t r);
   RgbRun Rgb(int32_t r);
-  // The strip's packed pixels. Null where they come from a palette, or are blended and not of four
-  // whole bytes. Not to be mixed with Rgb in a strip.
-  const uint8_t* Pixels(int32_t r);
+  // The strip's packed pixels. Null unless HasPixels: where they come from a palette, or are
+  // blended and not of four whole bytes. Not to be mixed with Rgb in a strip. What is not in place
+  // is made in `into` where that is given.
+  const uint8_t* Pixels(int32_t r, uint8_t* into = nullptr);
+  bool HasPixels(int32_t r) const;
+  // How many of `most` rows from r on read what this one reads, if it blends nothing.
+  int RowsAlike(int32_t r, int most) const;
   const PixelFormat& pixelFormat() const { return pixels_; }
   PixelChroma ChromaOfPixels(int32_t r) { return ChromaOfPixels(r, packed_); }
   // What is not in place is made in `into`, two bytes for each of chromaCount().
@@ -116,6 +120,8 @@ class Source {
   void ReadPixels(uint8_t* const rgb[3], const uint8_t* row, const SampleColumns& columns);
   int32_t ChromaColumn(int32_t x) const;
   const uint8_t* Chroma(int plane, int32_t r, const SampleColumns& columns, uint8_t* buffer);
+  // Whether a loop row is between two source rows.
+  bool BlendsRows(int32_t r) const;
   void FillLumaLine(Line* line, int32_t row);
   void FillRgbLine(Line* line, int32_t row);
   void FillPixelLine(Line* line, int32_t row);

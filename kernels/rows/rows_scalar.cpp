@@ -454,6 +454,10 @@ void WriteUnits(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int n) {
 }
 
 void WritePixels(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int bytes, int n) {
+  if (step == bytes) {
+    memcpy(dst, src, size_t(n) * size_t(bytes));
+    return;
+  }
   switch (bytes) {
     case 1:
       return WriteUnits<1>(dst, step, src, n);

@@ -359,7 +359,7 @@ inline uint32_t LoadQuad(const uint8_t* p) {
   __builtin_memcpy(&quad, p, 4);
   return quad;
 }
-inline Bytes GatherQuads(const uint8_t* src, const int32_t* offsets) {
+inline Bytes GatherQuads(const uint8_t* src, const int32_t* offsets, int32_t) {
   uint32x4_t v = vdupq_n_u32(LoadQuad(src + offsets[0]));
   v = vsetq_lane_u32(LoadQuad(src + offsets[1]), v, 1);
   v = vsetq_lane_u32(LoadQuad(src + offsets[2]), v, 2);

@@ -108,17 +108,21 @@ constexpr int kQuads = kBytes / 4;  // pixels of four bytes in a vector
 void GatherPixels(uint8_t* dst, const uint8_t* src, const int32_t* offsets, int bytes, int n) {
   int i = 0;
   if (bytes == 4) {
-    for (; i + kQuads <= n; i += kQuads) StoreBytes(dst + 4 * i, GatherQuads(src, offsets + i));
+    const int32_t end = n > 0 ? offsets[n - 1] + 4 : 0;
+    for (; i + kQuads <= n; i += kQuads) {
+      StoreBytes(dst + 4 * i, GatherQuads(src, offsets + i, end));
+    }
   }
   scalar::GatherPixels(dst + ptrdiff_t{i} * bytes, src, offsets + i, bytes, n - i);
 }
 
 void BlendPixels(uint8_t* dst, const uint8_t* src, const PixelTaps& taps, int alphaByte, int n) {
   const Words keep = QuadWords(alphaByte, 0, 0xFFFF);
+  const int32_t end = n > 0 ? taps.second[n - 1] + 4 : 0;
   int i = 0;
   for (; i + kQuads <= n; i += kQuads) {
-    const WordsPair first = Widen(GatherQuads(src, taps.first + i));
-    const WordsPair second = Widen(GatherQuads(src, taps.second + i));
+    const WordsPair first = Widen(GatherQuads(src, taps.first + i, end));
+    const WordsPair second = Widen(GatherQuads(src, taps.second + i, end));
     const WordsPair weights = SpreadToQuads(taps.weights + i);
     StoreBytes(dst + 4 * i, Narrow(Blend(first.low, second.low, weights.low & keep),
                                    Blend(first.high, second.high, weights.high & keep)));
@@ -1007,6 +1011,10 @@ int WriteReversed(uint8_t* dst, const uint8_t* src, int n) {
 }
 
 void WritePixels(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int bytes, int n) {
+  if (step == bytes) {
+    memcpy(dst, src, size_t(n) * size_t(bytes));
+    return;
+  }
   int i = 0;
   if (step == -bytes) {
     i = bytes == 1   ? WriteReversed<1>(dst, src, n)
@@ -1018,11 +1026,7 @@ void WritePixels(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int bytes, in
 }
 
 void WriteStrided(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int n) {
-  if (step == 1) {
-    memcpy(dst, src, size_t(n));
-  } else {
-    WritePixels(dst, step, src, 1, n);
-  }
+  WritePixels(dst, step, src, 1, n);
 }
 
 constexpr RowOps VectorRows(const char* name) noexcept {

@@ -239,7 +239,16 @@ inline Bytes NarrowedQuads(Bytes b) {
 }
 // By loads that select: the gather instruction is slow on many CPUs, inserting competes for the one
 // port that permutes.
-KESTREL_INLINE Bytes GatherQuads(const uint8_t* src, const int32_t* offsets) {
+// Vectors may be loaded up to `end`.
+KESTREL_INLINE Bytes GatherQuads(const uint8_t* src, const int32_t* offsets, int32_t end) {
+  // Most often the pixels are among 32 neighbours.
+  const Register distance = _mm512_sub_epi32(Load(offsets), _mm512_set1_epi32(offsets[0]));
+  const bool near = _mm512_test_epi32_mask(distance, _mm512_set1_epi32(~124)) == 0;
+  if (near && offsets[0] + 2 * kBytes <= end) {
+    const uint8_t* const window = src + offsets[0];
+    return {_mm512_permutex2var_epi32(Load(window), _mm512_srli_epi32(distance, 2),
+                                      Load(window + kBytes))};
+  }
   Register every4[4];
   for (int i = 0; i < 4; ++i) {
     const auto quad = [=](int lane) { return _mm_loadu_si32(src + offsets[4 * lane + i]); };

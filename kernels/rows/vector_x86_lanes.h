@@ -230,10 +230,22 @@ inline __m128i GatherFourQuads(const uint8_t* src, const int32_t* offsets) {
   v = _mm_insert_epi32(v, quad(offsets[2]), 2);
   return _mm_insert_epi32(v, quad(offsets[3]), 3);
 }
-KESTREL_INLINE Bytes GatherQuads(const uint8_t* src, const int32_t* offsets) {
+// Vectors may be loaded up to `end`.
+KESTREL_INLINE Bytes GatherQuads(const uint8_t* src, const int32_t* offsets, int32_t end) {
 #ifdef __AVX2__
+  // Most often four pixels are among eight neighbours.
+  const __m256i at = _mm256_loadu_si256(reinterpret_cast<const __m256i*>(offsets));
+  const __m256i first = _mm256_shuffle_epi32(at, 0);
+  const __m256i distance = _mm256_sub_epi32(at, first);
+  const bool near = _mm256_testz_si256(distance, _mm256_set1_epi32(~28)) != 0;
+  if (near && offsets[0] + kBytes <= end && offsets[4] + kBytes <= end) {
+    const __m256i index = _mm256_srli_epi32(distance, 2);
+    return {_mm256_blend_epi32(_mm256_permutevar8x32_epi32(Load(src + offsets[0]), index),
+                               _mm256_permutevar8x32_epi32(Load(src + offsets[4]), index), 0xF0)};
+  }
   return {Join(GatherFourQuads(src, offsets), GatherFourQuads(src, offsets + 4))};
 #else
+  static_cast<void>(end);
   return {GatherFourQuads(src, offsets)};
 #endif
 }
