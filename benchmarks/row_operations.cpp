@@ -277,10 +277,10 @@ const Case kCases[] = {
        ops.pixelsToYuv(r->out[0].data(), r->pixels.data(), kRgb565, r->rgbToVideo.RgbToYuv(),
                        kPixels);
      }},
-    {"pixelPairsToYuv RGBA", kPixels,
+    {"pixelPairsToChroma RGBA", kPixels,
      [](const RowOps& ops, Runs* r) {
-       ops.pixelPairsToYuv(r->out[0].data(), r->pixels.data(), kRgba, r->rgbToVideo.RgbToYuv() + 3,
-                           kPixels / 2);
+       ops.pixelPairsToChroma(r->out[0].data(), r->out[0].data() + 1, 2, r->pixels.data(), kRgba,
+                              r->rgbToVideo.RgbToYuv(), kPixels / 2);
      }},
     {"mapLevels", kPixels,
      [](const RowOps& ops, Runs* r) {

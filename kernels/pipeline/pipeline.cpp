@@ -649,19 +649,22 @@ class Pipeline {
     const int n = destination_.chromaCount();
     if (n == 0 || !destination_.WritesU(r)) return;
     const uint8_t* const first = pixels + ptrdiff_t{destination_.uColumns()[0]} * format.bytes;
-    PixelsToChroma(u_, first, 1, uStep_, n);
-    PixelsToChroma(v_, first, 2, uStep_, n);
+    PixelsToChroma(u_, v_, 1, first, uStep_, n);
     destination_.PutChroma(r, u_, v_);
   }
 
   RgbToYuvTables yuvTables() const { return static_cast<RgbToYuvTables>(engine_.table); }
 
-  // Chroma of every pixel from `first` on, or of every other one.
-  void PixelsToChroma(uint8_t* samples, const uint8_t* first, int plane, int step, int n) {
+  // Chroma of every pixel from `first` on, or of every other one (`step` 2).
+  void PixelsToChroma(uint8_t* u, uint8_t* v, int sampleStep, const uint8_t* first, int step,
+                      int n) {
     const PixelFormat& format = source_.pixelFormat();
-    const auto convert = step == 1 ? rows_.pixelsToYuv : rows_.pixelPairsToYuv;
-    convert(samples, first - ptrdiff_t{step - 1} * format.bytes, format,
-            yuvTables() + (plane == 1 ? 3 : 5), n);
+    if (step == 2) {
+      rows_.pixelPairsToChroma(u, v, sampleStep, first - format.bytes, format, yuvTables(), n);
+    } else {
+      rows_.pixelsToYuv(u, first, format, yuvTables() + 3, n);
+      rows_.pixelsToYuv(v, first, format, yuvTables() + 5, n);
+    }
   }
 
   // Pixels of RGB that are in place on both sides become YUV in rows as wide as the job: strips
@@ -703,16 +706,18 @@ class Pipeline {
     const int64_t row = destination_.ChromaRow(r);
     uint8_t* const samples = destination_.writer(1).Start(run.column, row, run.n);
     if (!pairsWriter()) {
-      PixelsToChroma(samples, first, 1, step, run.n);
-      PixelsToChroma(destination_.writer(2).Start(run.column, row, run.n), first, 2, step, run.n);
+      PixelsToChroma(samples, destination_.writer(2).Start(run.column, row, run.n), 1, first, step,
+                     run.n);
       return;
     }
     const bool uFirst = destination_.chromaPairs() == 1;
+    if (step == 2) {
+      PixelsToChroma(samples + (uFirst ? 0 : 1), samples + (uFirst ? 1 : 0), 2, first, step, run.n);
+      return;
+    }
     for (int i = 0; i < run.n; i += kStrip) {
       const int n = run.n - i < kStrip ? run.n - i : kStrip;
-      const uint8_t* const pixel = first + ptrdiff_t{i} * step * source_.pixelFormat().bytes;
-      PixelsToChroma(u_, pixel, 1, step, n);
-      PixelsToChroma(v_, pixel, 2, step, n);
+      PixelsToChroma(u_, v_, 1, first + ptrdiff_t{i} * source_.pixelFormat().bytes, step, n);
       rows_.interleave(samples + ptrdiff_t{2} * i, uFirst ? u_ : v_, uFirst ? v_ : u_, n);
     }
   }

@@ -179,11 +179,14 @@ struct KestrelRowOps {
   // Y with tables 0..2, U with 3..5, V with 5..7: `tables` is the first of the three.
   void (*rgbToYuv)(uint8_t* dst, const uint8_t* const rgb[3], kestrel::RgbToYuvTables tables,
                    int n);
-  // The same of pixel i, and of pixel 2 * i + 1.
+  // The same of pixel i.
   void (*pixelsToYuv)(uint8_t* dst, const uint8_t* src, const kestrel::PixelFormat& format,
                       kestrel::RgbToYuvTables tables, int n);
-  void (*pixelPairsToYuv)(uint8_t* dst, const uint8_t* src, const kestrel::PixelFormat& format,
-                          kestrel::RgbToYuvTables tables, int n);
+  // U and V of pixel 2 * i + 1, to u[i * step] and v[i * step]: step 1, or 2 where they take turns.
+  // (The tables are all eight.)
+  void (*pixelPairsToChroma)(uint8_t* u, uint8_t* v, int step, const uint8_t* src,
+                             const kestrel::PixelFormat& format, kestrel::RgbToYuvTables tables,
+                             int n);
   void (*mapLevels)(uint8_t* dst, const uint8_t* src, const kestrel::LevelMap& levels, int n);
 
   // Channels of 8 bits to fields, carrying what narrowing drops into the next pixel:

@@ -284,30 +284,38 @@ void MapLevels(uint8_t* dst, const uint8_t* src, const LevelMap& levels, int n) 
   for (int i = 0; i < n; ++i) dst[i] = levels.map[src[i]];
 }
 
-template <int kStep>
-void SomePixelsToYuv(uint8_t* dst, const uint8_t* src, const PixelFormat& format,
-                     RgbToYuvTables tables, int n) {
-  constexpr int kPiece = 64;
-  uint8_t channels[3][kPiece * kStep];
+// Calls call(x, rgb, count) for pieces of the channels of n pixels.
+template <typename Call>
+void ForChannels(const uint8_t* src, const PixelFormat& format, int n, const Call& call) {
+  constexpr int kPiece = 128;
+  uint8_t channels[3][kPiece];
   uint8_t* const rgb[3] = {channels[0], channels[1], channels[2]};
   for (int x = 0; x < n; x += kPiece) {
     const int count = n - x < kPiece ? n - x : kPiece;
-    UnpackRgb(rgb, src + ptrdiff_t{x} * kStep * format.bytes, format, count * kStep);
-    for (int i = 0; i < count && kStep > 1; ++i) {
-      for (uint8_t* channel : rgb) channel[i] = channel[kStep * i + kStep - 1];
-    }
-    RgbToYuv(dst + x, rgb, tables, count);
+    UnpackRgb(rgb, src + ptrdiff_t{x} * format.bytes, format, count);
+    call(x, rgb, count);
   }
 }
 
 void PixelsToYuv(uint8_t* dst, const uint8_t* src, const PixelFormat& format, RgbToYuvTables tables,
                  int n) {
-  SomePixelsToYuv<1>(dst, src, format, tables, n);
+  ForChannels(src, format, n, [=](int x, uint8_t* const rgb[3], int count) {
+    RgbToYuv(dst + x, rgb, tables, count);
+  });
 }
 
-void PixelPairsToYuv(uint8_t* dst, const uint8_t* src, const PixelFormat& format,
-                     RgbToYuvTables tables, int n) {
-  SomePixelsToYuv<2>(dst, src, format, tables, n);
+void PixelPairsToChroma(uint8_t* u, uint8_t* v, int step, const uint8_t* src,
+                        const PixelFormat& format, RgbToYuvTables tables, int n) {
+  ForChannels(src, format, 2 * n, [=](int x, uint8_t* const rgb[3], int count) {
+    for (int i = 0; i < count / 2; ++i) {
+      for (int c = 0; c < 3; ++c) rgb[c][i] = rgb[c][2 * i + 1];
+    }
+    uint8_t samples[64];
+    RgbToYuv(samples, rgb, tables + 3, count / 2);
+    WriteStrided(u + ptrdiff_t{x} / 2 * step, step, samples, count / 2);
+    RgbToYuv(samples, rgb, tables + 5, count / 2);
+    WriteStrided(v + ptrdiff_t{x} / 2 * step, step, samples, count / 2);
+  });
 }
 
 template <int kBytes>
@@ -627,7 +635,7 @@ const RowOps kScalarRows = {"scalar",
                             scalar::YuvToPixels,
                             scalar::RgbToYuv,
                             scalar::PixelsToYuv,
-                            scalar::PixelPairsToYuv,
+                            scalar::PixelPairsToChroma,
                             scalar::MapLevels,
                             scalar::NarrowWithCarry,
                             scalar::PackRgb,

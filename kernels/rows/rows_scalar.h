@@ -42,8 +42,8 @@ void YuvToPixels(const PixelRows& rows, const ChromaRows& chroma, const YuvToRgb
 void RgbToYuv(uint8_t* dst, const uint8_t* const rgb[3], RgbToYuvTables tables, int n);
 void PixelsToYuv(uint8_t* dst, const uint8_t* src, const PixelFormat& format, RgbToYuvTables tables,
                  int n);
-void PixelPairsToYuv(uint8_t* dst, const uint8_t* src, const PixelFormat& format,
-                     RgbToYuvTables tables, int n);
+void PixelPairsToChroma(uint8_t* u, uint8_t* v, int step, const uint8_t* src,
+                        const PixelFormat& format, RgbToYuvTables tables, int n);
 void MapLevels(uint8_t* dst, const uint8_t* src, const LevelMap& levels, int n);
 void NarrowWithCarry(uint8_t* const dst[3], const uint8_t* const src[3], const FieldShifts& shifts,
                      Carry* carry, int n);

@@ -403,9 +403,18 @@ struct WeightParts {
   }
 };
 
+template <bool kSeconds>
+inline PixelBytes LoadQuadOperands(const uint8_t* p) {
+  const PixelBytes a = Load4(p);
+  if constexpr (!kSeconds) return a;
+  const PixelBytes b = Load4(p + 4 * kBytes);
+  return {Seconds(a.low, b.low), Seconds(a.middle, b.middle), Seconds(a.high, b.high), SetBytes(0)};
+}
+
 // (offset + low * w0 + middle * w1 + high * w2) >> 16 of the bytes of a pixel. Bytes with a
 // negative weight are complemented, which makes all products positive.
-template <Signs kSigns, bool kMinus>
+enum class LowParts { kPlus, kMinus, kPlusWithoutOffset };
+template <Signs kSigns, LowParts kParts>
 class WeightedSum {
  public:
   WeightedSum(const Weights& weights, const WeightParts& parts) {
@@ -416,40 +425,31 @@ class WeightedSum {
       low_[c] = vdup_n_u8(uint8_t(parts.low[c]));
     }
     // Sums of the low parts that count down start so high that they stay positive.
-    constexpr int32_t kFloor = kMinus ? 255 : 0;
+    constexpr int32_t kFloor = kParts == LowParts::kMinus ? 255 : 0;
     highOffset_ = vdupq_n_u16(uint16_t((offset >> 8) - kFloor));
     lowOffset_ = vdupq_n_u16(uint16_t((offset & 255) + 256 * kFloor));
   }
-  Bytes Of(Bytes low, Bytes middle, Bytes high) const {
-    const uint8x16_t l = kSigns == Signs::kLastPositive ? vmvnq_u8(low.v) : low.v;
-    const uint8x16_t m = kSigns != Signs::kAllPositive ? vmvnq_u8(middle.v) : middle.v;
-    const uint8x16_t h = kSigns == Signs::kFirstPositive ? vmvnq_u8(high.v) : high.v;
+  Bytes Of(const PixelBytes& p) const {
+    const uint8x16_t l = kSigns == Signs::kLastPositive ? vmvnq_u8(p.low.v) : p.low.v;
+    const uint8x16_t m = kSigns != Signs::kAllPositive ? vmvnq_u8(p.middle.v) : p.middle.v;
+    const uint8x16_t h = kSigns == Signs::kFirstPositive ? vmvnq_u8(p.high.v) : p.high.v;
     return {vcombine_u8(Eight(vget_low_u8(l), vget_low_u8(m), vget_low_u8(h)),
                         Eight(vget_high_u8(l), vget_high_u8(m), vget_high_u8(h)))};
-  }
-  // The sums of kBytes pixels of four bytes, or of the second ones of as many pairs.
-  template <bool kSeconds>
-  Bytes OfPixels(const uint8_t* p) const {
-    const PixelBytes pixels = Load4(p);
-    if constexpr (kSeconds) {
-      const PixelBytes more = Load4(p + 4 * kBytes);
-      return Of(Seconds(pixels.low, more.low), Seconds(pixels.middle, more.middle),
-                Seconds(pixels.high, more.high));
-    } else {
-      return Of(pixels.low, pixels.middle, pixels.high);
-    }
   }
 
  private:
   uint8x8_t Eight(uint8x8_t l, uint8x8_t m, uint8x8_t h) const {
-    uint16x8_t low = lowOffset_;
-    if constexpr (kMinus) {
-      low = vmlsl_u8(vmlsl_u8(vmlsl_u8(low, l, low_[0]), m, low_[1]), h, low_[2]);
+    constexpr bool kAnyOffset = kParts != LowParts::kPlusWithoutOffset;
+    uint16x8_t low;
+    if constexpr (kParts == LowParts::kMinus) {
+      low = vmlsl_u8(vmlsl_u8(vmlsl_u8(lowOffset_, l, low_[0]), m, low_[1]), h, low_[2]);
     } else {
-      low = vmlal_u8(vmlal_u8(vmlal_u8(low, l, low_[0]), m, low_[1]), h, low_[2]);
+      const uint16x8_t first = kAnyOffset ? vmlal_u8(lowOffset_, l, low_[0]) : vmull_u8(l, low_[0]);
+      low = vmlal_u8(vmlal_u8(first, m, low_[1]), h, low_[2]);
     }
-    const uint16x8_t high =
-        vmlal_u8(vmlal_u8(vmlal_u8(highOffset_, l, high_[0]), m, high_[1]), h, high_[2]);
+    const uint16x8_t first =
+        kAnyOffset ? vmlal_u8(highOffset_, l, high_[0]) : vmull_u8(l, high_[0]);
+    const uint16x8_t high = vmlal_u8(vmlal_u8(first, m, high_[1]), h, high_[2]);
     return vshrn_n_u16(vsraq_n_u16(high, low, 8), 8);
   }
 
@@ -458,25 +458,27 @@ class WeightedSum {
 };
 
 template <Signs kSigns, typename Call>
-void WithSumOf(const Weights& weights, const WeightParts& parts, const Call& call) {
-  if (parts.minus) {
-    call(WeightedSum<kSigns, true>(weights, parts));
-  } else {
-    call(WeightedSum<kSigns, false>(weights, parts));
+void WithSumOf(const Weights& weights, const Call& call) {
+  const WeightParts parts(weights.of);
+  if (parts.minus) return call(WeightedSum<kSigns, LowParts::kMinus>(weights, parts));
+  if constexpr (kSigns == Signs::kAllPositive) {
+    if (weights.offset == 0) {
+      return call(WeightedSum<kSigns, LowParts::kPlusWithoutOffset>(weights, parts));
+    }
   }
+  call(WeightedSum<kSigns, LowParts::kPlus>(weights, parts));
 }
 
 // (Weights of every standard can be parted: a test of the rows looks at all of them.)
 template <typename Call>
 void WithSum(const Weights& weights, const Call& call) {
-  const WeightParts parts(weights.of);
   switch (weights.signs()) {
     case Signs::kAllPositive:
-      return WithSumOf<Signs::kAllPositive>(weights, parts, call);
+      return WithSumOf<Signs::kAllPositive>(weights, call);
     case Signs::kFirstPositive:
-      return WithSumOf<Signs::kFirstPositive>(weights, parts, call);
+      return WithSumOf<Signs::kFirstPositive>(weights, call);
     default:
-      return WithSumOf<Signs::kLastPositive>(weights, parts, call);
+      return WithSumOf<Signs::kLastPositive>(weights, call);
   }
 }
 

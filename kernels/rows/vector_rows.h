@@ -39,11 +39,12 @@ inline void ForRun(uint8_t* const (&dst)[kDsts], int n, const Block& block, Sour
   uint8_t* at[kDsts];
   for (int d = 0; d < kDsts; ++d) at[d] = dst[d];
   // (Pointers that move on cost nothing where loads and stores can move them.)
-  for (; n >= kBytes; n -= kBytes) {
+  for (n -= kBytes; n >= 0; n -= kBytes) {
     block(at, sources.start...);
     for (int d = 0; d < kDsts; ++d) at[d] += kBytes * kDstUnit;
     ((sources.start += kBytes * sources.unit), ...);
   }
+  n += kBytes;
   if (n == 0) return;
   if (!isCopied) {
     const int back = kBytes - n;
@@ -877,22 +878,38 @@ void YuvToPixels(const PixelRows& rows, const ChromaRows& chroma, const YuvToRgb
 }
 
 // ---- RGB to YUV, levels
+// The operands of sums for kBytes pixels, or for the second ones of as many pairs.
+template <int kPixel, bool kSeconds>
+KESTREL_INLINE auto LoadOperands(const uint8_t* p) {
+  if constexpr (kPixel == 4) {
+    return LoadQuadOperands<kSeconds>(p);
+  } else if constexpr (!kSeconds) {
+    return LoadPixels<kPixel>(p);
+  } else {
+    const PixelBytes a = LoadPixels<kPixel>(p);
+    const PixelBytes b = LoadPixels<kPixel>(p + kBytes * kPixel);
+    return PixelBytes{Seconds(a.low, b.low), Seconds(a.middle, b.middle), Seconds(a.high, b.high),
+                      SetBytes(0)};
+  }
+}
+
 void RgbToYuv(uint8_t* dst, const uint8_t* const rgb[3], RgbToYuvTables tables, int n) {
   uint8_t* const dsts[] = {dst};
   WithSum(Weights(tables, false), [&](const auto& sum) {
     ForRun<1>(
         dsts, n,
         [&](uint8_t* const* out, const uint8_t* r, const uint8_t* g, const uint8_t* b) {
-          StoreBytes(out[0], sum.Of(LoadBytes(r), LoadBytes(g), LoadBytes(b)));
+          StoreBytes(out[0],
+                     sum.Of(PixelBytes{LoadBytes(r), LoadBytes(g), LoadBytes(b), SetBytes(0)}));
         },
         Units{rgb[0], 1}, Units{rgb[1], 1}, Units{rgb[2], 1});
   });
 }
 
-template <bool kSeconds>
-void SomePixelsToYuv(uint8_t* dst, const uint8_t* src, const PixelFormat& format,
-                     RgbToYuvTables tables, int n) {
+void PixelsToYuv(uint8_t* dst, const uint8_t* src, const PixelFormat& format, RgbToYuvTables tables,
+                 int n) {
   const PixelShape shape(format);
+  if (shape.bytes == 0) return scalar::PixelsToYuv(dst, src, format, tables, n);
   uint8_t* const dsts[] = {dst};
   WithSum(Weights(tables, shape.blueFirst), [&](const auto& sum) {
     WithPixelSize(shape, [&](auto size) {
@@ -900,34 +917,74 @@ void SomePixelsToYuv(uint8_t* dst, const uint8_t* src, const PixelFormat& format
       ForRun<1>(
           dsts, n,
           [&](uint8_t* const* out, const uint8_t* in) {
-            if constexpr (kPixel == 4) {
-              StoreBytes(out[0], sum.template OfPixels<kSeconds>(in));
-            } else {
-              const PixelBytes p = LoadPixels<kPixel>(in);
-              if constexpr (kSeconds) {
-                const PixelBytes more = LoadPixels<kPixel>(in + kBytes * kPixel);
-                StoreBytes(out[0], sum.Of(Seconds(p.low, more.low), Seconds(p.middle, more.middle),
-                                          Seconds(p.high, more.high)));
-              } else {
-                StoreBytes(out[0], sum.Of(p.low, p.middle, p.high));
-              }
-            }
+            StoreBytes(out[0], sum.Of(LoadOperands<kPixel, false>(in)));
           },
-          Units{src, kSeconds ? 2 * kPixel : kPixel});
+          Units{src, kPixel});
     });
   });
 }
 
-void PixelsToYuv(uint8_t* dst, const uint8_t* src, const PixelFormat& format, RgbToYuvTables tables,
-                 int n) {
-  if (PixelShape(format).bytes == 0) return scalar::PixelsToYuv(dst, src, format, tables, n);
-  SomePixelsToYuv<false>(dst, src, format, tables, n);
-}
+// Pairs of pixels, whose second ones become two components of chroma.
+template <int kPixel>
+struct ChromaRun {
+  const uint8_t* src;
+  int n;
 
-void PixelPairsToYuv(uint8_t* dst, const uint8_t* src, const PixelFormat& format,
-                     RgbToYuvTables tables, int n) {
-  if (PixelShape(format).bytes == 0) return scalar::PixelPairsToYuv(dst, src, format, tables, n);
-  SomePixelsToYuv<true>(dst, src, format, tables, n);
+  template <typename A, typename B>
+  void WritePlanes(uint8_t* a, uint8_t* b, A sumOfA, B sumOfB) const {
+    uint8_t* const dsts[] = {a, b};
+    ForRun<1>(
+        dsts, n,
+        [=](uint8_t* const* out, const uint8_t* in) {
+          const auto operands = LoadOperands<kPixel, true>(in);
+          StoreBytes(out[0], sumOfA.Of(operands));
+          StoreBytes(out[1], sumOfB.Of(operands));
+        },
+        Units{src, 2 * kPixel});
+  }
+  template <typename A, typename B>
+  void WritePairs(uint8_t* dst, A sumOfA, B sumOfB) const {
+    uint8_t* const dsts[] = {dst};
+    ForRun<2>(
+        dsts, n,
+        [=](uint8_t* const* out, const uint8_t* in) {
+          const auto operands = LoadOperands<kPixel, true>(in);
+          const Bytes a = sumOfA.Of(operands);
+          Store2(out[0], a, sumOfB.Of(operands));
+        },
+        Units{src, 2 * kPixel});
+  }
+};
+
+void PixelPairsToChroma(uint8_t* u, uint8_t* v, int step, const uint8_t* src,
+                        const PixelFormat& format, RgbToYuvTables tables, int n) {
+  const PixelShape shape(format);
+  const Weights weightsOfU(tables + 3, shape.blueFirst);
+  const Weights weightsOfV(tables + 5, shape.blueFirst);
+  const bool known = shape.bytes != 0 && AreOpposite(weightsOfU.signs(), weightsOfV.signs());
+  if (!known) return scalar::PixelPairsToChroma(u, v, step, src, format, tables, n);
+  // The component whose weights are like those of the pixel's low byte comes first.
+  const bool uIsFirst = weightsOfU.signs() == Signs::kFirstPositive;
+  const Weights& first = uIsFirst ? weightsOfU : weightsOfV;
+  const Weights& last = uIsFirst ? weightsOfV : weightsOfU;
+  uint8_t* const ofFirst = uIsFirst ? u : v;
+  uint8_t* const ofLast = uIsFirst ? v : u;
+  const bool inOrder = ofFirst < ofLast;
+  WithSumOf<Signs::kFirstPositive>(first, [&](const auto& sumOfFirst) {
+    WithSumOf<Signs::kLastPositive>(last, [&](const auto& sumOfLast) {
+      WithPixelSize(shape, [&](auto size) {
+        constexpr int kPixel = decltype(size)::value;
+        const ChromaRun<kPixel> run = {src, n};
+        if (step == 1) {
+          run.WritePlanes(ofFirst, ofLast, sumOfFirst, sumOfLast);
+        } else if (inOrder) {
+          run.WritePairs(ofFirst, sumOfFirst, sumOfLast);
+        } else {
+          run.WritePairs(ofLast, sumOfLast, sumOfFirst);
+        }
+      });
+    });
+  });
 }
 
 void MapLevels(uint8_t* dst, const uint8_t* src, const LevelMap& levels, int n) {
@@ -1049,7 +1106,7 @@ constexpr RowOps VectorRows(const char* name) noexcept {
           YuvToPixels,
           RgbToYuv,
           PixelsToYuv,
-          PixelPairsToYuv,
+          PixelPairsToChroma,
           MapLevels,
           scalar::NarrowWithCarry,
           PackRgb,

@@ -82,6 +82,23 @@ inline Bytes SwapNeighbours(Bytes b) {
 }
 
 // ---- RGB to YUV
+// Pixels of four bytes in words: their outer bytes in turn, and their middle one twice.
+struct QuadOperands {
+  Register outer[4], middle[4];
+};
+template <bool kSeconds>
+KESTREL_INLINE QuadOperands LoadQuadOperands(const uint8_t* p) {
+  const Register middleTwice =
+      Broadcast(_mm_setr_epi8(1, -1, 1, -1, 5, -1, 5, -1, 9, -1, 9, -1, 13, -1, 13, -1));
+  QuadOperands quads;
+  for (int i = 0; i < 4; ++i) {
+    const Register pixels = kSeconds ? LoadSecondQuads(p, i) : LoadQuads(p, i);
+    quads.outer[i] = (Words{pixels} & SetWords(0xFF)).v;
+    quads.middle[i] = KESTREL_SIMD(shuffle_epi8)(pixels, middleTwice);
+  }
+  return quads;
+}
+
 // (offset + low * w0 + middle * w1 + high * w2) >> 16 of the bytes of a pixel. 32768 fits as a
 // negative number only, and a weight of more only in two parts.
 template <Signs kSigns>
@@ -94,23 +111,15 @@ class WeightedSum {
     middle_ = Pair(half, sign * weights[1] - half);
     offset_ = KESTREL_SIMD(set1_epi32)(offset);
   }
-  KESTREL_INLINE Bytes Of(Bytes low, Bytes middle, Bytes high) const {
-    return Narrow(Eight(KESTREL_SIMD(unpacklo_epi8)(low.v, high.v),
-                        KESTREL_SIMD(unpacklo_epi8)(middle.v, middle.v)),
-                  Eight(KESTREL_SIMD(unpackhi_epi8)(low.v, high.v),
-                        KESTREL_SIMD(unpackhi_epi8)(middle.v, middle.v)));
+  KESTREL_INLINE Bytes Of(const PixelBytes& p) const {
+    return Narrow(Eight(KESTREL_SIMD(unpacklo_epi8)(p.low.v, p.high.v),
+                        KESTREL_SIMD(unpacklo_epi8)(p.middle.v, p.middle.v)),
+                  Eight(KESTREL_SIMD(unpackhi_epi8)(p.low.v, p.high.v),
+                        KESTREL_SIMD(unpackhi_epi8)(p.middle.v, p.middle.v)));
   }
-  // The sums of kBytes pixels of four bytes, or of the second ones of as many pairs.
-  template <bool kSeconds>
-  KESTREL_INLINE Bytes OfPixels(const uint8_t* p) const {
-    const Register middleTwice =
-        Broadcast(_mm_setr_epi8(1, -1, 1, -1, 5, -1, 5, -1, 9, -1, 9, -1, 13, -1, 13, -1));
+  KESTREL_INLINE Bytes Of(const QuadOperands& quads) const {
     Register sums[4];
-    for (int i = 0; i < 4; ++i) {
-      const Register pixels = kSeconds ? LoadSecondQuads(p, i) : LoadQuads(p, i);
-      sums[i] =
-          Sums((Words{pixels} & SetWords(0xFF)).v, KESTREL_SIMD(shuffle_epi8)(pixels, middleTwice));
-    }
+    for (int i = 0; i < 4; ++i) sums[i] = Sums(quads.outer[i], quads.middle[i]);
     return NarrowedQuads(Narrow({KESTREL_SIMD(packs_epi32)(sums[0], sums[1])},
                                 {KESTREL_SIMD(packs_epi32)(sums[2], sums[3])}));
   }
@@ -138,15 +147,20 @@ class WeightedSum {
   Register outer_, middle_, offset_;
 };
 
+template <Signs kSigns, typename Call>
+void WithSumOf(const Weights& weights, const Call& call) {
+  call(WeightedSum<kSigns>(weights.of, weights.offset));
+}
+
 template <typename Call>
 void WithSum(const Weights& weights, const Call& call) {
   switch (weights.signs()) {
     case Signs::kAllPositive:
-      return call(WeightedSum<Signs::kAllPositive>(weights.of, weights.offset));
+      return WithSumOf<Signs::kAllPositive>(weights, call);
     case Signs::kFirstPositive:
-      return call(WeightedSum<Signs::kFirstPositive>(weights.of, weights.offset));
+      return WithSumOf<Signs::kFirstPositive>(weights, call);
     default:
-      return call(WeightedSum<Signs::kLastPositive>(weights.of, weights.offset));
+      return WithSumOf<Signs::kLastPositive>(weights, call);
   }
 }
 

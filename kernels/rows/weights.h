@@ -9,6 +9,11 @@ namespace kestrel {
 // Which weights are negative: those of luma none, those of chroma all but the first or the last.
 enum class Signs { kAllPositive, kFirstPositive, kLastPositive };
 
+// Of the two components of chroma.
+constexpr bool AreOpposite(Signs a, Signs b) {
+  return a != Signs::kAllPositive && b != Signs::kAllPositive && a != b;
+}
+
 // channel = (offset + sum of weight * channel) >> 16.
 struct Weights {
   int32_t of[3];

@@ -581,22 +581,41 @@ void RgbToYuv(Trial* trial, const RowOps& ops, int n, int variant) {
   ops.rgbToYuv(dst.got, rgb.in, RgbToYuvTablesOf(engine.context()) + kFirstTables[variant % 3], n);
 }
 
-// Of each format each channel; every pixel, or the second of each pair.
-template <int kPixels>
-void SomePixelsToYuv(Trial* trial, const RowOps& ops, int n, int variant) {
+// Of each format each channel.
+void PixelsToYuv(Trial* trial, const RowOps& ops, int n, int variant) {
   constexpr int kFirstTables[] = {0, 3, 5};
   const PixelFormat& format = kPixelFormats[variant / 3];
   const ColourEngine& engine = ToYuv(trial->random().Between(0, 3));
-  const ptrdiff_t step = ptrdiff_t{kPixels} * format.bytes;
-  const uint8_t* const src = trial->Source(size_t(n) * size_t(step));
+  const uint8_t* const src = trial->Source(size_t(n) * size_t(format.bytes));
   const auto dst = trial->Written(size_t(n));
   for (ptrdiff_t i = 0; i < n; ++i) {
-    const uint8_t* const pixel = src + (i + 1) * step - format.bytes;
-    const reference::Triple yuv = reference::RgbToYuv(Levels(pixel, format), engine.standard);
+    const reference::Triple yuv =
+        reference::RgbToYuv(Levels(src + i * format.bytes, format), engine.standard);
     dst.expected[i] = uint8_t(yuv[size_t(variant % 3)]);
   }
-  const auto convert = kPixels == 1 ? ops.pixelsToYuv : ops.pixelPairsToYuv;
-  convert(dst.got, src, format, RgbToYuvTablesOf(engine.context()) + kFirstTables[variant % 3], n);
+  ops.pixelsToYuv(dst.got, src, format,
+                  RgbToYuvTablesOf(engine.context()) + kFirstTables[variant % 3], n);
+}
+
+// Of each format: to two planes, to U and V in turn, to V and U in turn.
+void PixelPairsToChroma(Trial* trial, const RowOps& ops, int n, int variant) {
+  const PixelFormat& format = kPixelFormats[variant / 3];
+  const ColourEngine& engine = ToYuv(trial->random().Between(0, 3));
+  const uint8_t* const src = trial->Source(size_t(n) * 2 * size_t(format.bytes));
+  const bool planes = variant % 3 == 0;
+  const auto first = trial->Written(planes ? size_t(n) : 2 * size_t(n));
+  const auto second = planes ? trial->Written(size_t(n)) : first;
+  const ptrdiff_t step = planes ? 1 : 2;
+  const ptrdiff_t u = variant % 3 == 2 ? 1 : 0;
+  const ptrdiff_t v = variant % 3 == 1 ? 1 : 0;
+  for (ptrdiff_t i = 0; i < n; ++i) {
+    const uint8_t* const pixel = src + (2 * i + 1) * format.bytes;
+    const reference::Triple yuv = reference::RgbToYuv(Levels(pixel, format), engine.standard);
+    first.expected[u + i * step] = uint8_t(yuv[1]);
+    second.expected[v + i * step] = uint8_t(yuv[2]);
+  }
+  ops.pixelPairsToChroma(first.got + u, second.got + v, int(step), src, format,
+                         RgbToYuvTablesOf(engine.context()), n);
 }
 
 // Lines of the gains and offsets that adjustments can give. Variant 1 writes over its source.
@@ -802,8 +821,8 @@ constexpr Operation kOperations[] = {
     {"YuvToRgbCarry", kToRgbCount, YuvToRgbCarry},
     {"YuvToPixels", kYuvToPixelsCount, YuvToPixels},
     {"RgbToYuv", 12, RgbToYuv},
-    {"PixelsToYuv", 3 * kPixelFormatCount, SomePixelsToYuv<1>},
-    {"PixelPairsToYuv", 3 * kPixelFormatCount, SomePixelsToYuv<2>},
+    {"PixelsToYuv", 3 * kPixelFormatCount, PixelsToYuv},
+    {"PixelPairsToChroma", 3 * kPixelFormatCount, PixelPairsToChroma},
     {"MapLevels", 2, MapLevels},
     {"NarrowWithCarry", 4, NarrowWithCarry},
     {"PackRgb", 2 * kPixelFormatCount, PackRgb},
