@@ -80,9 +80,30 @@ int32_t DrawLength(Random* random) {
   return random->Between(1, kind <= 45 ? 14 : kind <= 84 ? 34 : 70);
 }
 
-void DrawSizes(Random* random, bool swapXY, MPPFORMAT* dst, MPPFORMAT* src) {
-  src->width = DrawLength(random);
-  src->height = DrawLength(random);
+// About the lengths at which rows are cut, and between them.
+int32_t DrawLongLength(Random* random) {
+  constexpr int32_t kCuts[] = {512, 1024};
+  return random->Percent(40) ? random->Pick(kCuts) + random->Between(-2, 3)
+                             : random->Between(500, 2200);
+}
+
+// A length along one axis of the walk.
+using DrawAxis = int32_t (*)(Random* random);
+
+int32_t DrawShortLength(Random* random) {
+  return random->Between(1, 6);
+}
+
+void DrawSizes(Random* random, Lengths lengths, bool swapXY, MPPFORMAT* dst, MPPFORMAT* src) {
+  DrawAxis across = DrawLength;
+  DrawAxis down = DrawLength;
+  if (lengths == Lengths::kLong) {
+    const bool isWide = random->Percent(75);
+    across = isWide ? DrawLongLength : DrawShortLength;
+    down = isWide ? DrawShortLength : DrawLongLength;
+  }
+  src->width = across(random);
+  src->height = down(random);
   int32_t width = src->width;
   int32_t height = src->height;
   const int32_t kind = random->Between(1, 100);
@@ -95,12 +116,12 @@ void DrawSizes(Random* random, bool swapXY, MPPFORMAT* dst, MPPFORMAT* src) {
     width = (width + 1) / 2;
     height = (height + 1) / 2;
   } else if (kind <= 62) {
-    width = DrawLength(random);
+    width = across(random);
   } else if (kind <= 70) {
-    height = DrawLength(random);
+    height = down(random);
   } else {
-    width = DrawLength(random);
-    height = DrawLength(random);
+    width = across(random);
+    height = down(random);
   }
   dst->width = swapXY ? height : width;
   dst->height = swapXY ? width : height;
@@ -279,7 +300,7 @@ void DrawSide(Random* random, int32_t imageWidth, int32_t imageHeight, Side* sid
   }
 }
 
-Case DrawCase(uint64_t seed, uint64_t number) {
+Case DrawCase(uint64_t seed, uint64_t number, Lengths lengths) {
   static const uint8_t kSomePalette[4] = {0, 0, 0, 0};
   Random random(seed, number);
   Case drawn{};
@@ -294,7 +315,11 @@ Case DrawCase(uint64_t seed, uint64_t number) {
   if (random.Percent(1)) {
     MakePlanarEnlargement(&random, &drawn);
   }
-  DrawSizes(&random, (drawn.params.transformCode & 1) != 0, &drawn.dst.record, &drawn.src.record);
+  if (lengths == Lengths::kLong && random.Percent(50)) {
+    drawn.params.transformCode = 0;  // more ways of converting take no transformed picture
+  }
+  DrawSizes(&random, lengths, (drawn.params.transformCode & 1) != 0, &drawn.dst.record,
+            &drawn.src.record);
   DrawSourceRect(&random, drawn.src.record, &drawn.params);
   DrawDestinationRect(&random, &drawn);
   constexpr Content kContents[] = {Content::kNoise, Content::kNoise, Content::kExtremes,

@@ -45,9 +45,13 @@ struct Case {
 // Formats, pitches and places of a side whose record is set and whose image is that large.
 void DrawSide(Random* random, int32_t imageWidth, int32_t imageHeight, Side* side);
 
+// Pictures of a few dozen pixels on each side; or long ones, whose rows do not fit the buffers that
+// rows are converted in, and which are narrow so that many can be made.
+enum class Lengths { kUsual, kLong };
+
 // Case `number` of `seed`, the same on every machine. A palette is only a non-null address here:
 // whoever runs the case supplies the entries.
-Case DrawCase(uint64_t seed, uint64_t number);
+Case DrawCase(uint64_t seed, uint64_t number, Lengths lengths = Lengths::kUsual);
 
 // Everything about a case, for people.
 std::string Describe(const Case& drawn);

@@ -24,22 +24,24 @@ namespace {
 using testing_support::GuardedBuffer;
 using testing_support::InstructionSet;
 
-constexpr size_t kCapacity = size_t{1} << 20;
+constexpr size_t kCapacity = size_t{1} << 22;
 
 // What a crash handler can still say.
 volatile std::sig_atomic_t crashInModel = 0;
 uint64_t currentSeed = 0;
 uint64_t currentNumber = 0;
 const char* currentRows = "";
+const char* currentLengths = "";  // as an option
 
 extern "C" void ReportCrash(int signalNumber) {
   char line[200];
-  const int length = std::snprintf(line, sizeof(line),
-                                   "signal %d in the %s; reproduce with: differential --seed %llu "
-                                   "--first %llu --cases 1 --verbose --rows '%s'\n",
-                                   signalNumber, crashInModel ? "model" : "library",
-                                   static_cast<unsigned long long>(currentSeed),
-                                   static_cast<unsigned long long>(currentNumber), currentRows);
+  const int length =
+      std::snprintf(line, sizeof(line),
+                    "signal %d in the %s; reproduce with: differential --seed %llu "
+                    "--first %llu --cases 1 --verbose%s --rows '%s'\n",
+                    signalNumber, crashInModel ? "model" : "library",
+                    static_cast<unsigned long long>(currentSeed),
+                    static_cast<unsigned long long>(currentNumber), currentLengths, currentRows);
   std::fwrite(line, 1, size_t(length), stderr);
   std::signal(signalNumber, SIG_DFL);  // the faulting instruction runs again and ends the program
 }
@@ -157,14 +159,16 @@ struct Options {
   uint64_t first = 0;
   uint64_t failures = 1;
   bool verbose = false;
+  Lengths lengths = Lengths::kUsual;
   std::string rows;  // none: all of them
 };
 
 int Usage() {
   std::fprintf(stderr,
                "usage: differential [--cases N] [--seed S] [--first K] [--failures F] [--verbose] "
-               "[--rows NAME]\n"
+               "[--long] [--rows NAME]\n"
                "Runs the cases K..K+N-1 of seed S and stops after F failures.\n"
+               "--long: of wide and of tall pictures.\n"
                "--rows: with one instruction set only, of: %s\n",
                NamesOf(testing_support::InstructionSets()).c_str());
   return 2;
@@ -175,6 +179,10 @@ bool ParseOptions(int argc, char** argv, Options* options) {
     const std::string name = argv[i];
     if (name == "--verbose") {
       options->verbose = true;
+      continue;
+    }
+    if (name == "--long") {
+      options->lengths = Lengths::kLong;
       continue;
     }
     if (name == "--rows" && i + 1 < argc) {
@@ -209,9 +217,12 @@ int RunCases(const Options& options) {
   Bench bench;
   uint64_t failures = 0;
   currentSeed = options.seed;
+  if (options.lengths == Lengths::kLong) {
+    currentLengths = " --long";
+  }
   for (uint64_t i = 0; i < options.cases && failures < options.failures; ++i) {
     currentNumber = options.first + i;
-    const Case drawn = DrawCase(options.seed, currentNumber);
+    const Case drawn = DrawCase(options.seed, currentNumber, options.lengths);
     if (options.verbose) {
       std::fprintf(stderr, "%s", Describe(drawn).c_str());
     }
@@ -219,11 +230,11 @@ int RunCases(const Options& options) {
     if (!difference.empty()) {
       ++failures;
       std::printf(
-          "MISMATCH in %s  %s\n  reproduce with: differential --seed %llu --first %llu --cases 1 "
-          "--rows '%s'\n",
+          "MISMATCH in %s  %s\n  reproduce with: differential --seed %llu --first %llu --cases "
+          "1%s --rows '%s'\n",
           Describe(drawn).c_str(), difference.c_str(),
           static_cast<unsigned long long>(options.seed),
-          static_cast<unsigned long long>(currentNumber), currentRows);
+          static_cast<unsigned long long>(currentNumber), currentLengths, currentRows);
       std::fflush(stdout);  // the next case may crash
     }
   }

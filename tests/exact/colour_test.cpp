@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <array>
 #include <cstring>
+#include <iterator>
 
 #include "colour/vector_clamps.h"
 #include "exact_support.h"
@@ -315,6 +316,62 @@ TEST(TableBlock, HoldsHandComputedWords) {
   // V 128: low (8924535 + 32768 + 33554432 - 6849280) >> 12 = 8706;
   // high (-14671780 + 32768 + 33554432 + 13446144) >> 12 = 7900.
   EXPECT_EQ(table[832 + 128], 7900u << 16 | 8706u);
+}
+
+// Tables may be read only where no colour leaves them, at either end; where all stay well inside
+// they must be.
+TEST(TableBlock, IsReadWhereEveryColourStaysInside) {
+  int read = 0, leftBelow = 0, leftAbove = 0;
+  for (uint32_t code : {FORMAT_XBGR8888, FORMAT_RGB565}) {
+    for (int adjustments = 0; adjustments < 9 * 9 * 9; ++adjustments) {
+      const auto step = [&](int divisor) { return adjustments / divisor % 9 * 32 - 128; };
+      const Engine engine({code, 8, 8}, {FORMAT_NV21 | FORMAT_BT601_FULL, 8, 8},
+                          Param().Adjust(step(1), step(9), step(81)));
+      ASSERT_EQ(engine.result(), KESTREL_OK);
+      const YuvToRgbSums& s = engine.context().rgbSums;
+      const int32_t gains[3][2] = {{0, s.vToR}, {s.uToG, s.vToG}, {s.uToB, 0}};
+      // How far the nearest colour is from the ends of its channel's table, in levels.
+      int64_t below = INT64_MAX;
+      int64_t above = INT64_MAX;
+      for (int channel = 0; channel < 3; ++channel) {
+        const bool six = s.narrowing[channel] == 2;
+        const int64_t first = six ? 160 * 4 : 0;
+        const int64_t end = six ? 480 * 4 : 1280;
+        for (int corner = 0; corner < 8; ++corner) {
+          const auto component = [&](int bit) { return int64_t(corner >> bit & 1) * 255; };
+          const int64_t sum = s.offset[channel] + component(0) * s.yGain +
+                              component(1) * gains[channel][0] + component(2) * gains[channel][1];
+          below = std::min(below, (sum >> 16) - first);
+          above = std::min(above, end - 1 - (sum >> 16));
+        }
+      }
+      const bool isRead = s.insideClampTable != 0;
+      EXPECT_FALSE(isRead && (below < 0 || above < 0)) << code << ", adjusted " << adjustments;
+      EXPECT_TRUE(isRead || below < 12 || above < 12) << code << ", adjusted " << adjustments;
+      read += isRead;
+      leftBelow += below < 0 && above >= 12;
+      leftAbove += above < 0 && below >= 12;
+    }
+  }
+  EXPECT_GT(read, 0);
+  EXPECT_GT(leftBelow, 0);
+  EXPECT_GT(leftAbove, 0);
+}
+
+// Words of chroma are truncated: sums of them can be up to an eighth of a level lower.
+TEST(TableBlock, IsNotReadWhereATruncatedSumWouldBeBeforeIt) {
+  const std::array<int32_t, 2> brightnessAndContrast[] = {{-118, 80}, {-87, 101}, {-62, 123}};
+  for (const auto& [brightness, contrast] : brightnessAndContrast) {
+    const Engine engine({FORMAT_XBGR8888, 8, 8}, {FORMAT_NV21, 8, 8},
+                        Param().Adjust(brightness, contrast, -128));
+    const YuvToRgbSums& s = engine.context().rgbSums;
+    ASSERT_EQ(s.uToB, 0);
+    ASSERT_EQ(s.vToR, 0);
+    const int32_t lowest = *std::min_element(std::begin(s.offset), std::end(s.offset));
+    EXPECT_GE(lowest, 0);
+    EXPECT_LT(lowest, 65536 / 8);
+    EXPECT_EQ(s.insideClampTable, 0u);
+  }
 }
 
 TEST(TableBlock, OfAGreySourceIgnoresContrastAndSaturationButNotBrightness) {

@@ -49,6 +49,33 @@ TEST(InstructionSets, TheListEndsWithTheScalarOne) {
   EXPECT_EQ(names.size(), size_t(count));
 }
 
+// By the compiler's own question. A set left out of the list would go untested everywhere.
+TEST(InstructionSets, TheListHasEverySetOfTheCpu) {
+  std::vector<const RowOps*> expected;
+#if defined(__x86_64__)
+  if (__builtin_cpu_supports("avx512f") && __builtin_cpu_supports("avx512dq") &&
+      __builtin_cpu_supports("avx512bw") && __builtin_cpu_supports("avx512vl") &&
+      __builtin_cpu_supports("avx512vbmi")) {
+    expected.push_back(&kAvx512Rows);
+  }
+  if (__builtin_cpu_supports("avx2")) {
+    expected.push_back(&kAvx2Rows);
+  }
+  if (__builtin_cpu_supports("sse4.1")) {
+    expected.push_back(&kSse41Rows);
+  }
+#elif defined(__ARM_NEON)
+  expected.push_back(&kNeonRows);
+#endif
+  expected.push_back(&kScalarRows);
+  std::vector<const RowOps*> listed;
+  const RowOpsList list = AvailableRowOps();
+  for (int i = 0; list.ops[i] != nullptr; ++i) {
+    listed.push_back(list.ops[i]);
+  }
+  EXPECT_EQ(listed, expected);
+}
+
 TEST(InstructionSets, NoOperationIsMissing) {
   for (const testing_support::InstructionSet& set : testing_support::InstructionSets()) {
     constexpr size_t kOperations = sizeof(RowOps) / sizeof(void (*)());

@@ -157,6 +157,9 @@ TEST_F(Registration, RefusesWithoutTheClass) {
     EXPECT_EQ(machine.ExceptionPending(), how == Failure::kException);
     ExpectBalanced(machine, nullptr);
   }
+  Machine machine;
+  machine.FailNth(1, Failure::kQuiet);
+  EXPECT_EQ(register_kestrel_android_JniPP(machine.env()), -1);
 }
 
 TEST_F(Registration, RefusesWhenRegistrationFails) {
