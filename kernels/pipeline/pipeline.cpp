@@ -590,7 +590,7 @@ class Pipeline {
   // The number of rows done.
   int RgbToRgb(int32_t r) {
     if (!clampedCarry_ && source_.HasPixels(r)) {
-      const int copies = Copies(r, job_.rect.bottom - r);
+      const int copies = Copies(r, destination_.RoomForRows(r, job_.rect.bottom - r));
       const Destination::PixelRun to = destination_.StartPixels(r, 1, copies);
       if (to.pixels == nullptr) return 1;
       const PixelFormat& from = source_.pixelFormat();
