@@ -77,6 +77,10 @@ void PlaneWriter::WriteBlock(int64_t column, int64_t row, const uint8_t* units, 
     return;
   }
   const size_t bytes = size_t(n) * size_t(unit_);
+  if (plane_.columnStep == unit_ && pitch == plane_.rowStep && pitch == ptrdiff_t(bytes)) {
+    memcpy(plane_.At(column, row), units, bytes * size_t(runs));
+    return;
+  }
   for (int i = 0; i < runs; ++i) {
     uint8_t* const start = plane_.At(column, row + i);
     if (plane_.columnStep == unit_) {

@@ -176,6 +176,9 @@ class Pipeline {
     if (luma.n > 0) {
       if (source_.LumaLiesInPlace(luma.firstX, luma.n)) {
         CopyPlane(0, luma);
+      } else if (TakeGroupsApart(luma)) {
+        lumaDone_ = chromaDone_ = true;
+        return;
       } else if (!ReadPackedLuma(luma)) {
         return;
       }
@@ -242,16 +245,71 @@ class Pipeline {
       return true;
     }
     if (job_.mapsLevels() || !destination_.AllInPlace()) return false;
+    if (!packed) {
+      ForBlocks(
+          1, [&](const PlaneRow& first, int rows) { RearrangeChroma(run, first, rows, from, to); });
+      return true;
+    }
     for (int32_t r = job_.rect.top; r < job_.rect.bottom; ++r) {
       PlaneRow row;
-      if (!LocateRow(1, r, &row)) continue;
-      if (packed) {
-        ReadPackedChroma(run, row, to);
-      } else {
-        RearrangeChroma(run, row, from, to);
+      if (LocateRow(1, r, &row)) ReadPackedChroma(run, row, to);
+    }
+    return true;
+  }
+
+  // Packed 4:2:2 becomes planes of half as many columns of chroma, luma and chroma of a row at
+  // once.
+  bool TakeGroupsApart(const PlaneRun& luma) {
+    const PlaneLayout& from = engine_.srcLayout;
+    // (In one packed layout samples of chroma stand where luma of other pixels is.)
+    const bool areGroups = from.step[0] == 2 && from.step[1] == 4 &&
+                           (from.uOffset ^ from.vOffset) == 2 &&
+                           ((from.uOffset ^ from.yOffset) & 1) == 1;
+    if (!areGroups || job_.mapsLevels() || job_.rect.left < 0 || engine_.dstSubsample[1] != 2 ||
+        !destination_.hasChroma() || !destination_.AllInPlace()) {
+      return false;
+    }
+    const PlaneRun chroma = destination_.ChromaRun();
+    const bool inPhase =
+        chroma.n > 0 && luma.n == 2 * chroma.n && chroma.firstX == luma.firstX + 1 &&
+        source_.LumaAdvances(luma.firstX, luma.n) && source_.ColumnOf(luma.firstX) % 2 == 0;
+    if (!inPhase) return false;
+    const bool lumaFirst = from.yOffset == 0;
+    const int pairs = from.uOffset < from.vOffset ? 1 : 2;
+    for (int32_t r = job_.rect.top; r < job_.rect.bottom; ++r) {
+      PlaneRow row, chromaRow;
+      const bool hasLuma = LocateRow(0, r, &row);
+      const bool hasChroma = LocateRow(1, r, &chromaRow);
+      const uint8_t* const groups = source_.LumaAt(luma.firstX, row.source) - from.yOffset;
+      uint8_t* const y =
+          hasLuma ? destination_.writer(0).Start(luma.column, row.destination, luma.n) : nullptr;
+      if (!hasChroma) {
+        if (hasLuma) rows_.readStrided(y, groups + from.yOffset, 2, luma.n);
+        continue;
+      }
+      for (int i = 0; i < luma.n; i += kStrip) {
+        const int n = luma.n - i < kStrip ? luma.n - i : kStrip;
+        uint8_t* const samples = hasLuma ? y + i : luma_;
+        rows_.deinterleave(lumaFirst ? samples : u_, lumaFirst ? u_ : samples,
+                           groups + ptrdiff_t{2} * i, n);
+        PutPairs(chroma.column + i / 2, chromaRow.destination, u_, pairs, n / 2);
       }
     }
     return true;
+  }
+
+  // Pairs of chroma (1: U first, 2: V first) as the destination has them.
+  void PutPairs(int64_t column, int64_t row, const uint8_t* samples, int pairs, int n) {
+    uint8_t* const first = destination_.writer(1).Start(column, row, n);
+    const int to = destination_.chromaPairs();
+    if (to == pairs) {
+      memcpy(first, samples, size_t{2} * size_t(n));
+    } else if (to != 0) {
+      rows_.swapPairs(first, samples, n);
+    } else {
+      uint8_t* const second = destination_.writer(2).Start(column, row, n);
+      rows_.deinterleave(pairs == 1 ? first : second, pairs == 1 ? second : first, samples, n);
+    }
   }
 
   // Samples of a packed image become rows of a plane.
@@ -288,17 +346,26 @@ class Pipeline {
     }
   }
 
-  void RearrangeChroma(const PlaneRun& run, const PlaneRow& row, int from, int to) {
-    uint8_t* first = destination_.writer(1).Start(run.column, row.destination, run.n);
-    const uint8_t* pairs = source_.ChromaAt(from, run.firstX, row.source);
-    if (from != 0 && to != 0) {
-      rows_.swapPairs(first, pairs, run.n);
-    } else if (to == 0) {
-      uint8_t* second = destination_.writer(2).Start(run.column, row.destination, run.n);
-      rows_.deinterleave(from == 1 ? first : second, from == 1 ? second : first, pairs, run.n);
-    } else {
-      rows_.interleave(first, source_.ChromaAt(to, run.firstX, row.source),
-                       source_.ChromaAt(3 - to, run.firstX, row.source), run.n);
+  // Rows without gaps between them, on both sides, are one long row.
+  void RearrangeChroma(const PlaneRun& run, const PlaneRow& first, int rows, int from, int to) {
+    const bool unbroken =
+        source_.pitch(1) == run.n * (from != 0 ? 2 : 1) && source_.pitch(2) == source_.pitch(1) &&
+        destination_.writer(1).rowStep() == run.n * (to != 0 ? 2 : 1) &&
+        (to != 0 || destination_.writer(2).rowStep() == run.n) && run.n <= INT32_MAX / 4 / rows;
+    const int n = unbroken ? run.n * rows : run.n;
+    for (int i = 0; i < (unbroken ? 1 : rows); ++i) {
+      const PlaneRow row = {first.source + i, first.destination + i};
+      uint8_t* const a = destination_.writer(1).Start(run.column, row.destination, run.n);
+      const uint8_t* const pairs = source_.ChromaAt(from, run.firstX, row.source);
+      if (from != 0 && to != 0) {
+        rows_.swapPairs(a, pairs, n);
+      } else if (to == 0) {
+        uint8_t* const b = destination_.writer(2).Start(run.column, row.destination, run.n);
+        rows_.deinterleave(from == 1 ? a : b, from == 1 ? b : a, pairs, n);
+      } else {
+        rows_.interleave(a, source_.ChromaAt(to, run.firstX, row.source),
+                         source_.ChromaAt(3 - to, run.firstX, row.source), n);
+      }
     }
   }
 
@@ -312,8 +379,13 @@ class Pipeline {
     return destination_.WritesU(r);
   }
 
-  // Collects rows that follow each other on both sides and writes them as one block.
   void CopyPlane(int plane, const PlaneRun& run) {
+    ForBlocks(plane, [&](const PlaneRow& first, int rows) { WriteBlock(plane, run, first, rows); });
+  }
+
+  // Calls call(first, rows) for rows of a plane that follow each other on both sides.
+  template <typename Call>
+  void ForBlocks(int plane, const Call& call) const {
     PlaneRow first = {0, 0}, last = {0, 0};
     int32_t top = job_.rect.top;
     const int32_t bottom = job_.rect.bottom;
@@ -325,7 +397,7 @@ class Pipeline {
     const bool sameRows = plane == 0 || engine_.srcSubsample[4] == engine_.dstSubsample[4];
     if (sameRows && LocateRow(plane, bottom - 1, &last) &&
         last.source - first.source == last.destination - first.destination) {
-      WriteBlock(plane, run, first, int(last.source - first.source) + 1);
+      call(first, int(last.source - first.source) + 1);
       return;
     }
     int count = 0;
@@ -335,13 +407,13 @@ class Pipeline {
       const bool follows =
           row.source == first.source + count && row.destination == first.destination + count;
       if (count > 0 && !follows) {
-        WriteBlock(plane, run, first, count);
+        call(first, count);
         count = 0;
       }
       if (count == 0) first = row;
       ++count;
     }
-    if (count > 0) WriteBlock(plane, run, first, count);
+    if (count > 0) call(first, count);
   }
 
   void WriteBlock(int plane, const PlaneRun& run, const PlaneRow& first, int rows) {
