@@ -13,7 +13,7 @@ class ArrangedSamples {
   // Pixels of a block, when each may have its own samples of chroma. Twice as many can be turned
   // where four share them.
   static constexpr int kPixels = 64 * 64;
-  static constexpr int kTurnedColumns = 64;
+  static constexpr int kTurnedColumns = 128;
   // Bytes. (A run may begin and end in the middle of a sample of chroma.)
   static constexpr int kSize = 3 * kPixels + 2 * kTurnedColumns;
 

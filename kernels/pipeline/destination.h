@@ -115,7 +115,10 @@ class Destination {
   explicit Destination(const Job& job);
 
   // Loop columns to select at once.
-  int stripWidth() const { return engine_.swapXY != 0 ? PlaneWriter::kTileColumns : kStrip; }
+  int stripWidth() const {
+    if (engine_.swapXY == 0) return kStrip;
+    return order_ == Order::kWalk ? PlaneWriter::kTileColumns : ArrangedSamples::kTurnedColumns;
+  }
   // Selects loop columns [x, x + n), n <= stripWidth().
   void SelectColumns(int32_t x, int n);
 
