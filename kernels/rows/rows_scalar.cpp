@@ -287,6 +287,18 @@ void MapLevels(uint8_t* dst, const uint8_t* src, const LevelMap& levels, int n) 
 template <int kStep>
 void SomePixelsToYuv(uint8_t* dst, const uint8_t* src, const PixelFormat& format,
                      RgbToYuvTables tables, int n) {
+  if (format.wholeBytes) {
+    const uint8_t* const last = src + (kStep - 1) * format.bytes;
+    const uint8_t* const red = last + format.position[0] / 8;
+    const uint8_t* const green = last + format.position[1] / 8;
+    const uint8_t* const blue = last + format.position[2] / 8;
+    const ptrdiff_t step = ptrdiff_t{kStep} * format.bytes;
+    for (int i = 0; i < n; ++i) {
+      const ptrdiff_t at = i * step;
+      dst[i] = uint8_t((tables[0][red[at]] + tables[1][green[at]] + tables[2][blue[at]]) >> 16);
+    }
+    return;
+  }
   constexpr int kPiece = 64;
   uint8_t channels[3][kPiece * kStep];
   uint8_t* const rgb[3] = {channels[0], channels[1], channels[2]};
