@@ -299,9 +299,18 @@ void ForChannels(const uint8_t* src, const PixelFormat& format, int n, const Cal
 
 void PixelsToYuv(uint8_t* dst, const uint8_t* src, const PixelFormat& format, RgbToYuvTables tables,
                  int n) {
-  ForChannels(src, format, n, [=](int x, uint8_t* const rgb[3], int count) {
-    RgbToYuv(dst + x, rgb, tables, count);
-  });
+  if (!format.wholeBytes) {
+    return ForChannels(src, format, n, [=](int x, uint8_t* const rgb[3], int count) {
+      RgbToYuv(dst + x, rgb, tables, count);
+    });
+  }
+  const uint8_t* const red = src + format.position[0] / 8;
+  const uint8_t* const green = src + format.position[1] / 8;
+  const uint8_t* const blue = src + format.position[2] / 8;
+  for (int i = 0; i < n; ++i) {
+    const ptrdiff_t at = ptrdiff_t{i} * format.bytes;
+    dst[i] = uint8_t((tables[0][red[at]] + tables[1][green[at]] + tables[2][blue[at]]) >> 16);
+  }
 }
 
 void PixelPairsToChroma(uint8_t* u, uint8_t* v, int step, const uint8_t* src,

@@ -33,6 +33,7 @@ struct Product {
 
 constexpr int kBytes = 16;
 constexpr int kWords = 8;
+constexpr const RowOps& kNarrower = kScalarRows;  // the set for runs of fewer bytes
 
 inline int16x8_t Signed(Words w) {
   return vreinterpretq_s16_u16(w.v);

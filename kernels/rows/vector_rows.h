@@ -11,52 +11,62 @@ namespace kestrel {
 namespace {
 
 // ---- Runs of any length
-// Part of a run with room for a whole vector of units.
+constexpr bool kIsNarrowest = &kNarrower == &kScalarRows;
+
+// A run's length is the last argument of an operation on it.
+inline int LengthOf(int n) {
+  return n;
+}
+template <typename First, typename... Others>
+inline int LengthOf(const First&, const Others&... others) {
+  return LengthOf(others...);
+}
+
+// An operation as the table has it: runs of fewer than kLeast units are left to the next narrower
+// set, whose vectors they may fill.
+template <auto kMember, auto kOperation, int kLeast = kBytes>
+struct ForLong;
+template <typename... Arguments, void (*RowOps::*kMember)(Arguments...),
+          void (*kOperation)(Arguments...), int kLeast>
+struct ForLong<kMember, kOperation, kLeast> {
+  static void Run(Arguments... arguments) {
+    if (LengthOf(arguments...) < kLeast) return (kNarrower.*kMember)(arguments...);
+    kOperation(arguments...);
+  }
+};
+
+// Part of a run.
 struct Units {
   const uint8_t* start;
   int unit;
   const uint8_t* At(int i) const { return start + ptrdiff_t{i} * unit; }
 };
-// A copy of n units with room for a vector.
-class Rest {
- public:
-  Rest(const Units& source, int n) {
-    memset(bytes_, 0, sizeof(bytes_));
-    memcpy(bytes_, source.start, size_t(n) * size_t(source.unit));
-  }
-  const uint8_t* bytes() const { return bytes_; }
 
- private:
-  uint8_t bytes_[8 * kBytes];
-};
-
-// Calls block(destinations, sources...) for each kBytes units of a run. The last vector reaches
-// back over units that are done already. Where there are not so many, or one source is written
-// over, the last units go through copies, so that nothing beyond the run is touched.
+// Calls block(destinations, sources...) for each kBytes of n >= kBytes units. The last vector
+// reaches back over units that others do as well. Where one source is written over it is made
+// before them, in a copy.
 template <int kDstUnit, int kDsts, typename Block, typename... Sources>
 inline void ForRun(uint8_t* const (&dst)[kDsts], int n, const Block& block, Sources... sources) {
-  const bool isCopied = n < kBytes || ((sources.start == dst[0]) || ...);
   uint8_t* at[kDsts];
   for (int d = 0; d < kDsts; ++d) at[d] = dst[d];
+  const int back = -n & (kBytes - 1);
+  const bool isCopied = back != 0 && ((sources.start == dst[0]) || ...);
+  uint8_t last[kDsts][kDstUnit * kBytes];
+  if (isCopied) {
+    uint8_t* into[kDsts];
+    for (int d = 0; d < kDsts; ++d) into[d] = last[d];
+    block(into, sources.At(n - kBytes)...);
+  }
   // (Pointers that move on cost nothing where loads and stores can move them.)
   for (n -= kBytes; n >= 0; n -= kBytes) {
     block(at, sources.start...);
     for (int d = 0; d < kDsts; ++d) at[d] += kBytes * kDstUnit;
     ((sources.start += kBytes * sources.unit), ...);
   }
-  n += kBytes;
-  if (n == 0) return;
-  if (!isCopied) {
-    const int back = kBytes - n;
-    for (int d = 0; d < kDsts; ++d) at[d] -= back * kDstUnit;
-    block(at, sources.At(-back)...);
-    return;
-  }
-  uint8_t rest[kDsts][kDstUnit * kBytes];
-  uint8_t* into[kDsts];
-  for (int d = 0; d < kDsts; ++d) into[d] = rest[d];
-  block(into, Rest(sources, n).bytes()...);
-  for (int d = 0; d < kDsts; ++d) memcpy(at[d], rest[d], size_t(n) * kDstUnit);
+  if (back == 0) return;
+  for (int d = 0; d < kDsts; ++d) at[d] -= back * kDstUnit;
+  if (!isCopied) return block(at, sources.At(-back)...);
+  for (int d = 0; d < kDsts; ++d) memcpy(at[d], last[d], sizeof(last[d]));
 }
 
 // ---- Resampling
@@ -128,8 +138,9 @@ void BlendPixels(uint8_t* dst, const uint8_t* src, const PixelTaps& taps, int al
     StoreBytes(dst + 4 * i, Narrow(Blend(first.low, second.low, weights.low & keep),
                                    Blend(first.high, second.high, weights.high & keep)));
   }
-  scalar::BlendPixels(dst + 4 * i, src, {taps.first + i, taps.second + i, taps.weights + i},
-                      alphaByte, n - i);
+  if (i == n) return;
+  kNarrower.blendPixels(dst + 4 * i, src, {taps.first + i, taps.second + i, taps.weights + i},
+                        alphaByte, n - i);
 }
 
 void BlendPixelRows(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t weight,
@@ -181,6 +192,12 @@ inline int FirstPairOf(const PairPlan& plan, int block) {
   return first < latest ? first : latest;
 }
 
+// Plans of fewer pairs than a block has: the set that makes a plan is the one that uses it, because
+// nothing but its length decides. Even a block that is not full costs less than single pairs.
+inline bool IsForNarrower(const PairPlan& plan) {
+  return !kIsNarrowest && plan.n < kPairs;
+}
+
 // Whether all pairs have windows. One for each eight pairs is given up with the first that has
 // none.
 template <int kWindows>
@@ -213,6 +230,7 @@ bool PlanWindows(PairPlan* plan, int32_t lowest, int32_t end) {
 }
 
 void PlanPairs(PairPlan* plan) {
+  if (IsForNarrower(*plan)) return kNarrower.planPairs(plan);
   int32_t lowest = INT32_MAX;
   int32_t end = 0;
   for (int i = 0; i < plan->n; ++i) {
@@ -284,12 +302,14 @@ inline void ForPairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan, con
 }
 
 void ReadPairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan) {
+  if (IsForNarrower(plan)) return kNarrower.readPairs(dst, src, plan);
   ForPairs<2>(
       dst, src, plan, [](uint8_t* out, const Pairs& pairs, int) { StorePairs(out, pairs); },
       [=, &plan](int i, int end) { scalar::ReadSomePairs(dst, src, plan, i, end); });
 }
 
 void BlendPairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan) {
+  if (IsForNarrower(plan)) return kNarrower.blendPairs(dst, src, plan);
   const uint8_t* const blends = plan.blends;
   ForPairs<1>(
       dst, src, plan,
@@ -774,49 +794,53 @@ struct PixelConversion {
   int pixel;  // bytes
   uint8_t alpha;
 
+  // The last vector reaches back over pixels that are done already: n is even where two pixels
+  // share chroma.
   void Convert(const PixelLines& lines, int n) const {
+    if (kIsNarrowest && n < kBytes) return ConvertCopies(lines, n);
     const int whole = n / kBytes * kBytes;
     vectors(stage, lines, alpha, whole);
-    if (whole == n) return;
-    // The last vector reaches back over pixels that are done already, unless it would tear a pair.
-    const int last = n - kBytes;
-    if (last >= 0 && (!IsHalf(layout) || last % 2 == 0)) {
-      vectors(stage, At(lines, last, 0), alpha, kBytes);
-      return;
-    }
-    for (int row = 0; row < lines.rows; row += 1 << lines.rowShift) {
-      ConvertRest(At(lines, whole, row), n - whole);
-    }
+    if (whole < n) vectors(stage, At(lines, n - kBytes), alpha, kBytes);
   }
 
  private:
-  PixelLines At(const PixelLines& lines, int i, int row) const {
+  PixelLines At(const PixelLines& lines, int i) const {
     const int sample = ChromaBytes(layout, i);
     PixelLines at = lines;
-    at.dst += row * lines.dstPitch + ptrdiff_t{i} * pixel;
-    at.y += row * lines.yPitch + i;
-    at.a += (row >> lines.rowShift) * lines.aPitch + sample;
-    at.b += (row >> lines.rowShift) * lines.bPitch + sample;
-    at.rows -= row;
+    at.dst += ptrdiff_t{i} * pixel;
+    at.y += i;
+    at.a += sample;
+    at.b += sample;
     return at;
   }
 
-  // The first rows of `lines`, as many as share chroma.
-  void ConvertRest(const PixelLines& lines, int n) const {
-    uint8_t y[2][kBytes] = {};
-    uint8_t a[2 * kBytes] = {};
-    uint8_t b[kBytes] = {};
-    uint8_t pixels[2][4 * kBytes];
-    const int share = 1 << lines.rowShift;
-    const int rows = share < lines.rows ? share : lines.rows;
-    for (int row = 0; row < rows; ++row) memcpy(y[row], lines.y + row * lines.yPitch, size_t(n));
-    const int bytes = ChromaBytes(layout, IsHalf(layout) ? n + 1 : n);
-    memcpy(a, lines.a, size_t(bytes));
-    if (!IsPairs(layout)) memcpy(b, lines.b, size_t(bytes));
-    vectors(stage, {pixels[0], 4 * kBytes, y[0], kBytes, a, b, 0, 0, rows, lines.rowShift}, alpha,
-            kBytes);
-    for (int row = 0; row < rows; ++row) {
-      memcpy(lines.dst + row * lines.dstPitch, pixels[row], size_t(n) * size_t(pixel));
+  // Fewer pixels of each row than a vector has, some rows at once.
+  void ConvertCopies(const PixelLines& lines, int n) const {
+    constexpr int kRows = 16;
+    uint8_t y[kRows][kBytes], a[kRows][2 * kBytes], b[kRows][kBytes];
+    uint8_t pixels[kRows][4 * kBytes];
+    const size_t chroma = size_t(ChromaBytes(layout, IsHalf(layout) ? n + 1 : n));
+    for (int top = 0; top < lines.rows; top += kRows) {
+      const int rows = lines.rows - top < kRows ? lines.rows - top : kRows;
+      for (int row = 0; row < rows; ++row) {
+        memset(y[row], 0, sizeof(y[row]));
+        memcpy(y[row], lines.y + (top + row) * lines.yPitch, size_t(n));
+      }
+      const int first = top >> lines.rowShift;
+      for (int row = 0; row << lines.rowShift < rows; ++row) {
+        memset(a[row], 0, sizeof(a[row]));
+        memcpy(a[row], lines.a + (first + row) * lines.aPitch, chroma);
+        if (IsPairs(layout)) continue;
+        memset(b[row], 0, sizeof(b[row]));
+        memcpy(b[row], lines.b + (first + row) * lines.bPitch, chroma);
+      }
+      vectors(stage,
+              {pixels[0], 4 * kBytes, y[0], kBytes, a[0], b[0], 2 * kBytes, kBytes, rows,
+               lines.rowShift},
+              alpha, kBytes);
+      for (int row = 0; row < rows; ++row) {
+        memcpy(lines.dst + (top + row) * lines.dstPitch, pixels[row], size_t(n) * size_t(pixel));
+      }
     }
   }
 };
@@ -861,19 +885,36 @@ void ConvertYuv(const PixelRows& rows, const ChromaRows& chroma, const YuvToRgbW
 }
 
 void YuvToPixels(const PixelRows& rows, const ChromaRows& chroma, const YuvToRgb& colour,
+                 const PixelFormat& format, AlphaFill alpha, int n);
+// Copies cost less than single pixels.
+constexpr int kLeastPixels = kIsNarrowest ? 0 : kBytes;
+constexpr auto TableYuvToPixels = ForLong<&RowOps::yuvToPixels, YuvToPixels, kLeastPixels>::Run;
+
+void YuvToPixels(const PixelRows& rows, const ChromaRows& chroma, const YuvToRgb& colour,
                  const PixelFormat& format, AlphaFill alpha, int n) {
   const PixelShape shape(format);
   const uint8_t fill = AlphaOf(alpha);
-  if (shape.bytes == 0) return scalar::YuvToPixels(rows, chroma, colour, format, alpha, n);
+  if (shape.bytes == 0 || colour.form == YuvToRgbForm::kWide) {
+    return scalar::YuvToPixels(rows, chroma, colour, format, alpha, n);
+  }
+  if (n > kBytes && chroma.shift != 0 && n % 2 != 0) {
+    // A vector that reached back to a pixel in the middle would tear those that share chroma.
+    --n;
+    const ptrdiff_t sample = ptrdiff_t{n / 2} * chroma.step;
+    ChromaRows ofLast = chroma;
+    ofLast.u += sample;
+    ofLast.v += sample;
+    TableYuvToPixels(
+        {rows.dst + ptrdiff_t{n} * shape.bytes, rows.dstPitch, rows.y + n, rows.yPitch, rows.rows},
+        ofLast, colour, format, alpha, 1);
+  }
   switch (colour.form) {
     case YuvToRgbForm::kTable:
       return ConvertYuv<YuvToRgbForm::kTable>(rows, chroma, colour.wide, shape, fill, n);
     case YuvToRgbForm::kWholeLuma:
       return ConvertYuv<YuvToRgbForm::kWholeLuma>(rows, chroma, colour.wide, shape, fill, n);
-    case YuvToRgbForm::kSixBits:
-      return ConvertYuv<YuvToRgbForm::kSixBits>(rows, chroma, colour.wide, shape, fill, n);
     default:
-      return scalar::YuvToPixels(rows, chroma, colour, format, alpha, n);
+      return ConvertYuv<YuvToRgbForm::kSixBits>(rows, chroma, colour.wide, shape, fill, n);
   }
 }
 
@@ -1094,27 +1135,27 @@ constexpr RowOps VectorRows(const char* name) noexcept {
           PlanPairs,
           ReadPairs,
           BlendPairs,
-          BlendColumns,
-          BlendRows,
+          ForLong<&RowOps::blendColumns, BlendColumns>::Run,
+          ForLong<&RowOps::blendRows, BlendRows>::Run,
           BlendPixels,
-          BlendPixelRows,
-          UnpackRgb,
-          UnpackAlpha,
+          ForLong<&RowOps::blendPixelRows, BlendPixelRows, kQuads>::Run,
+          ForLong<&RowOps::unpackRgb, UnpackRgb>::Run,
+          ForLong<&RowOps::unpackAlpha, UnpackAlpha>::Run,
           scalar::UnpackIndexed,
           scalar::YuvToRgbByWideSums,
           scalar::YuvToRgbCarry,
-          YuvToPixels,
-          RgbToYuv,
-          PixelsToYuv,
-          PixelPairsToChroma,
-          MapLevels,
+          TableYuvToPixels,
+          ForLong<&RowOps::rgbToYuv, RgbToYuv>::Run,
+          ForLong<&RowOps::pixelsToYuv, PixelsToYuv>::Run,
+          ForLong<&RowOps::pixelPairsToChroma, PixelPairsToChroma>::Run,
+          ForLong<&RowOps::mapLevels, MapLevels>::Run,
           scalar::NarrowWithCarry,
-          PackRgb,
-          RepackPixels,
+          ForLong<&RowOps::packRgb, PackRgb>::Run,
+          ForLong<&RowOps::repackPixels, RepackPixels>::Run,
           scalar::PutAlpha,
-          Interleave,
-          Deinterleave,
-          SwapPairs,
+          ForLong<&RowOps::interleave, Interleave>::Run,
+          ForLong<&RowOps::deinterleave, Deinterleave>::Run,
+          ForLong<&RowOps::swapPairs, SwapPairs, kBytes / 2>::Run,
           Transpose,
           WriteStrided,
           WritePixels};

@@ -16,22 +16,28 @@
 #endif
 #include <stdint.h>
 
+#include "kernels/rows/rows.h"
+
 namespace kestrel {
 namespace {
 
-// Operations on parts of registers, and on registers as a whole.
+// Operations on parts of registers, and on registers as a whole; and the set whose registers are
+// the next narrower ones.
 #if defined(__AVX512VBMI__)
 #define KESTREL_SIMD(operation) _mm512_##operation
 #define KESTREL_SIMD_WHOLE(operation) _mm512_##operation##_si512
 using Register = __m512i;
+constexpr const RowOps& kNarrower = kAvx2Rows;
 #elif defined(__AVX2__)
 #define KESTREL_SIMD(operation) _mm256_##operation
 #define KESTREL_SIMD_WHOLE(operation) _mm256_##operation##_si256
 using Register = __m256i;
+constexpr const RowOps& kNarrower = kSse41Rows;
 #else
 #define KESTREL_SIMD(operation) _mm_##operation
 #define KESTREL_SIMD_WHOLE(operation) _mm_##operation##_si128
 using Register = __m128i;
+constexpr const RowOps& kNarrower = kScalarRows;
 #endif
 
 struct Bytes {
