@@ -335,6 +335,12 @@ void Destination::PutChromaPlane(int plane, int32_t r, const uint8_t* samples) {
   writers_[plane].Write(firstChroma_, row, samples, chromaCount_);
 }
 
+uint8_t* Destination::StartChromaPairs(int32_t r) {
+  const int64_t row = ChromaRow(r);
+  MakeRoom(1, firstChroma_, row, chromaCount_);
+  return writers_[1].Start(firstChroma_, row, chromaCount_);
+}
+
 void Destination::PutChroma(int32_t r, const uint8_t* u, const uint8_t* v) {
   if (chromaCount_ == 0) return;
   if (writesGroups_) {
@@ -353,11 +359,9 @@ void Destination::PutChroma(int32_t r, const uint8_t* u, const uint8_t* v) {
     PutChromaPlane(1, r, u);
     PutChromaPlane(2, r, v);
   } else if (u != nullptr) {
-    const int64_t row = ChromaRow(r);
-    MakeRoom(1, firstChroma_, row, chromaCount_);
-    uint8_t* pairs = writers_[1].Start(firstChroma_, row, chromaCount_);
+    uint8_t* const pairs = StartChromaPairs(r);
     rows_.interleave(pairs, chromaPairs_ == 1 ? u : v, chromaPairs_ == 1 ? v : u, chromaCount_);
-    writers_[1].Finish();
+    FinishChromaPairs();
   }
 }
 

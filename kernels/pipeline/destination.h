@@ -139,6 +139,9 @@ class Destination {
   // Memory for a row of luma, for the strip columns that it says; not where luma is exchanged.
   PixelRun StartLuma(int32_t r) { return StartPixels(r, 1); }
   void FinishLuma() { writers_[0].Finish(); }
+  // Memory for a row of pairs of chroma, for all of the strip's; where chromaPairs() is not 0.
+  uint8_t* StartChromaPairs(int32_t r);
+  void FinishChromaPairs() { writers_[1].Finish(); }
   // Either may be null.
   void PutChroma(int32_t r, const uint8_t* u, const uint8_t* v);
 

@@ -40,7 +40,10 @@ PixelFormat DescribePixels(const FormatDesc& format, const uint32_t* sizes,
     pixels.size[i] = sizes[i];
     pixels.position[i] = positions[i];
     positionSum += int32_t(positions[i]);
-    if (sizes[i] != 8 || positions[i] % 8 != 0) pixels.wholeBytes = false;
+    // A code can name fields beyond the pixel: they are zero, not the next pixel's bytes.
+    const bool isByte =
+        sizes[i] == 8 && positions[i] % 8 == 0 && int64_t{positions[i]} / 8 < pixels.bytes;
+    if (!isByte) pixels.wholeBytes = false;
   }
   // The byte left over by channels of 8 bits. Other layouts get what the same sum says, or none.
   const int32_t alphaByte = (48 - positionSum) / 8;

@@ -23,6 +23,8 @@ class Pipeline {
                                    !job.has(kNoDither))) {
     stripWidth_ = destination_.stripWidth();
     keepsPixels_ = KeepsPixels();
+    readsPairs_ = engine_.pathKind == PATH_YUV_TO_YUV && source_.chromaPairs() != 0 &&
+                  destination_.hasChroma() && !job_.has(kPairChroma);
     PrepareCarry();
     PrepareSums();
   }
@@ -116,6 +118,8 @@ class Pipeline {
       source_.SelectChroma(x, nullptr, nullptr, n_);
     } else if (engine_.pathKind == PATH_YUV_TO_RGB) {
       source_.SelectPixelChroma(x, n_);
+    } else if (readsPairs_) {
+      source_.SelectChromaPairs(x, destination_.uColumns(), destination_.chromaCount());
     } else if (engine_.pathKind == PATH_YUV_TO_YUV) {
       source_.SelectChroma(x, destination_.uColumns(), destination_.vColumns(),
                            destination_.chromaCount());
@@ -292,14 +296,14 @@ class Pipeline {
         uint8_t* const samples = hasLuma ? y + i : luma_;
         rows_.deinterleave(lumaFirst ? samples : u_, lumaFirst ? u_ : samples,
                            groups + ptrdiff_t{2} * i, n);
-        PutPairs(chroma.column + i / 2, chromaRow.destination, u_, pairs, n / 2);
+        CopyPairs(chroma.column + i / 2, chromaRow.destination, u_, pairs, n / 2);
       }
     }
     return true;
   }
 
   // Pairs of chroma (1: U first, 2: V first) as the destination has them.
-  void PutPairs(int64_t column, int64_t row, const uint8_t* samples, int pairs, int n) {
+  void CopyPairs(int64_t column, int64_t row, const uint8_t* samples, int pairs, int n) {
     uint8_t* const first = destination_.writer(1).Start(column, row, n);
     const int to = destination_.chromaPairs();
     if (to == pairs) {
@@ -463,14 +467,53 @@ class Pipeline {
   }
 
   void YuvToYuv(int32_t r) {
-    if (!lumaDone_) destination_.PutLuma(r, MapLevels(channels_[0], source_.Luma(r), 0, n_));
+    if (!lumaDone_) PutLuma(r);
     const int n = destination_.chromaCount();
     if (n == 0 || chromaDone_) return;
+    if (readsPairs_) {
+      if (destination_.WritesU(r)) PutPairs(r, n);
+      return;
+    }
     const uint8_t* u =
         destination_.WritesU(r) ? MapLevels(channels_[1], source_.U(r), 1, n) : nullptr;
     const uint8_t* v =
         destination_.WritesV(r) ? MapLevels(channels_[2], source_.V(r), 1, n) : nullptr;
     destination_.PutChroma(r, u, v);
+  }
+
+  // Where nothing else has to be done to it luma is read into the destination.
+  void PutLuma(int32_t r) {
+    const bool plain = !job_.mapsLevels() && !destination_.exchangesLuma() &&
+                       !destination_.writesGroups() && destination_.writer(0).inPlace();
+    if (!plain) {
+      return destination_.PutLuma(r, MapLevels(channels_[0], source_.Luma(r), 0, n_));
+    }
+    const Destination::PixelRun run = destination_.StartLuma(r);
+    if (run.pixels == nullptr) return;
+    const uint8_t* const luma = source_.Luma(r, run.n == n_ ? run.pixels : nullptr);
+    if (luma != run.pixels) memcpy(run.pixels, luma + run.first, size_t(run.n));
+    destination_.FinishLuma();
+  }
+
+  // Chroma of a row, both components at once.
+  void PutPairs(int32_t r, int n) {
+    const int from = source_.chromaPairs();
+    const int to = destination_.chromaPairs();
+    if (to == 0) {
+      const uint8_t* const pairs = source_.ChromaPairs(r, channels_[1]);
+      rows_.deinterleave(from == 1 ? u_ : v_, from == 1 ? v_ : u_, pairs, n);
+      destination_.PutChroma(r, MapLevels(u_, u_, 1, n), MapLevels(v_, v_, 1, n));
+      return;
+    }
+    uint8_t* const out = destination_.StartChromaPairs(r);
+    const uint8_t* const pairs = source_.ChromaPairs(r, from == to ? out : channels_[1]);
+    if (from != to) {
+      rows_.swapPairs(out, pairs, n);
+    } else if (pairs != out) {
+      memcpy(out, pairs, size_t{2} * size_t(n));
+    }
+    MapLevels(out, out, 1, 2 * n);
+    destination_.FinishChromaPairs();
   }
 
   void YuvToRgbDithered(int32_t r) {
@@ -815,6 +858,7 @@ class Pipeline {
   ArrangedSamples arranged_;
   bool clampedCarry_, dithers_;
   bool keepsPixels_;  // RGB to RGB of the same format
+  bool readsPairs_;   // YUV to YUV from pairs of chroma, both components from the same pixel
   kestrel::YuvToRgb colour_ = {};
   Carry carry_ = {};
   FieldShifts carryShifts_ = {};

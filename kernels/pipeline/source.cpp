@@ -108,6 +108,22 @@ void Source::SelectChroma(int32_t x, const int32_t* uColumns, const int32_t* vCo
   if (!sharesColumns_) select(&chromaV_, vColumns);
 }
 
+void Source::SelectChromaPairs(int32_t x, const int32_t* columns, int n) {
+  for (int i = 0; i < n; ++i) chromaU_.Set(i, ChromaColumn(x + columns[i]));
+  chromaU_.Finish(n);
+  if (chromaU_.contiguous) return;
+  for (int i = 0; i < n; ++i) chromaV_.offset[i] = chromaU_.offset[i] + 1;
+  chromaU_.PlanWith(chromaV_.offset, nullptr, rows_);
+}
+
+const uint8_t* Source::ChromaPairs(int32_t r, uint8_t* into) {
+  const int32_t row = rowPositions_.At(r, job_.engine.srcSubsample[4]).first;
+  const uint8_t* const pairs = RowStart(chromaPairs(), row);
+  if (chromaU_.contiguous) return pairs + chromaU_.offset[0];
+  rows_.readPairs(into, pairs, chromaPlan_);
+  return into;
+}
+
 void Source::SelectPixelChroma(int32_t x, int n) {
   const PlaneLayout& layout = job_.engine.srcLayout;
   const uint32_t factor = job_.engine.srcSubsample[1];
@@ -325,6 +341,9 @@ void Source::FetchLines(int32_t r, Fill fill, Line** first, Line** second, uint1
 }
 
 const uint8_t* Source::Luma(int32_t r, uint8_t* into) {
+  // Rows that are neither blended nor used again.
+  const bool once = into != nullptr && job_.engine.stepY >= 0x10000 && !interpolates_;
+  if (once && !BlendsRows(r)) return ReadSamples(into, RowStart(0, SourceRow(r, 1)), first_);
   Line *first, *second;
   uint16_t weight;
   FetchLines(r, &Source::FillLumaLine, &first, &second, &weight);

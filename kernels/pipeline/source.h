@@ -53,6 +53,8 @@ class Source {
   void SelectColumns(int32_t x, int n);
   // Selects the loop columns whose U and V are wanted, relative to x; null for the first n.
   void SelectChroma(int32_t x, const int32_t* uColumns, const int32_t* vColumns, int n);
+  // The same of both components at once, for ChromaPairs; where chromaPairs() is not 0.
+  void SelectChromaPairs(int32_t x, const int32_t* columns, int n);
 
   // Selects the chroma of loop columns [x, x + n), for ChromaOfPixels.
   void SelectPixelChroma(int32_t x, int n);
@@ -79,6 +81,8 @@ class Source {
   const uint8_t* Luma(int32_t r, uint8_t* into = nullptr);
   const uint8_t* U(int32_t r);
   const uint8_t* V(int32_t r);
+  // Pairs in the source's order; made in `into` when they are not in place.
+  const uint8_t* ChromaPairs(int32_t r, uint8_t* into);
   RgbRun Rgb(int32_t r);
   // The strip's packed pixels. Null unless HasPixels: where they come from a palette, or are
   // blended and not of four whole bytes. Not to be mixed with Rgb in a strip. What is not in place

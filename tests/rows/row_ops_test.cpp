@@ -37,6 +37,7 @@ static_assert((kLongest - kLongestOfAll) % 13 == 0, "the longest is among them")
 // ---- Arguments ----------------------------------------------------------------------------------
 
 constexpr PixelFormat kPixelFormats[] = {
+    {2, {8, 8, 8}, {0, 8, 16}, -1, false},  // the last field lies beyond the pixel
     {2, {5, 6, 5}, {11, 5, 0}, -1, false},    {2, {5, 6, 5}, {0, 5, 11}, -1, false},
     {2, {5, 5, 5}, {10, 5, 0}, -1, false},    {2, {4, 4, 4}, {0, 4, 8}, -1, false},
     {1, {3, 3, 2}, {5, 2, 0}, -1, false},     {3, {8, 8, 8}, {16, 8, 0}, -1, true},
@@ -49,7 +50,7 @@ constexpr PixelFormat kPixelFormats[] = {
 constexpr int kPixelFormatCount = int(std::size(kPixelFormats));
 
 // The four of them that have whole bytes and alpha.
-constexpr int kFirstWithAlpha = 10;
+constexpr int kFirstWithAlpha = 11;
 
 uint32_t Word(const uint8_t* pixel, int bytes) {
   uint32_t word = 0;
