@@ -134,6 +134,8 @@ typedef struct EngineContext {
   YuvToRgbSums rgbSums;             /* valid for PATH_YUV_TO_RGB */
   LevelSums levelSums;              /* valid where needsLevelTable is set */
   const struct KestrelRowOps* rows; /* row operations of the chosen instruction set */
+  uint32_t srcLayoutBit;            /* what kernels call each side's layout; 0 = they do not */
+  uint32_t dstLayoutBit;
 } EngineContext;
 
 /* A pass engine: the run-time view of one context, with the bindings of the most recent run. */

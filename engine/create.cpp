@@ -406,6 +406,8 @@ uint32_t BuildPass(const MPPFORMAT& dst, const MPPFORMAT& src, const MPPPARAM& p
     MMemFree(nullptr, engine);
     return result;
   }
+  context->srcLayoutBit = LayoutBit(context->srcFormat);
+  context->dstLayoutBit = LayoutBit(context->dstFormat);
   *out = engine;
   return KESTREL_OK;
 }

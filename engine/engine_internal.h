@@ -41,6 +41,10 @@ namespace kestrel {
 constexpr int64_t kMaxCoordinate = 1 << 24;
 constexpr int64_t kMaxPlaneSpan = INT32_MAX;
 
+// Implemented by kernels/table/: the bit of a layout in the sets that say what kernels take; 0 for
+// one that no kernel is made for.
+uint32_t LayoutBit(const FormatDesc& format);
+
 // Implemented by kernels/rows/: the row operations for this CPU.
 const ::KestrelRowOps* SelectRowOps();
 

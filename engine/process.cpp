@@ -53,6 +53,11 @@ bool IsWithinLimits(const PassEngine& engine, const MRECT& rect) {
          CanAddress(engine.srcLayout, int64_t(c.srcReadBottom) - 1);
 }
 
+// Factors are nearly always 1 or 2, and a small job would notice the divisions.
+int64_t SampleOf(uint32_t pixel, uint32_t factor) {
+  return factor == 1 ? pixel : factor == 2 ? pixel >> 1 : pixel / factor;
+}
+
 // The pixel that a walk starts from.
 int32_t StartColumn(const PassEngine& engine, const MRECT& rect) {
   return engine.mirrorX != 0 ? rect.right - 1 : rect.left;
@@ -86,12 +91,21 @@ bool BandsShow(const PassEngine& engine, const MRECT& rect) {
   return !wholeBytes || !evenRows || c.dither != 0 || rect.left < 0 || rect.top < 0;
 }
 
-int32_t RoundUpTowardZero(int32_t value, int32_t grid) {
-  return SaturateToInt32((int64_t(value) + grid - 1) / grid * grid);
+template <int kGrid>
+int32_t RoundUpTowardZero(int32_t value) {
+  return SaturateToInt32((int64_t(value) + kGrid - 1) / kGrid * kGrid);
 }
 
-int32_t RoundDownTowardZero(int32_t value, int32_t grid) {
-  return value / grid * grid;
+template <int kGrid>
+int32_t RoundDownTowardZero(int32_t value) {
+  return value / kGrid * kGrid;
+}
+
+// The part of a rectangle that lies on a grid.
+template <int kColumns, int kRows>
+MRECT InnerBlock(const MRECT& outer) {
+  return {RoundUpTowardZero<kColumns>(outer.left), RoundUpTowardZero<kRows>(outer.top),
+          RoundDownTowardZero<kColumns>(outer.right), RoundDownTowardZero<kRows>(outer.bottom)};
 }
 
 struct PlaneArrays {
@@ -124,11 +138,7 @@ void RunTiled(const MPPHandle& handle, const MRECT& outer, const PlaneArrays& ar
   const bool mirrorKeepsGrid = (blocks.mirrorX == 0 && blocks.mirrorY == 0) ||
                                (blocks.dstRegionWidth % 4 == 0 && blocks.dstRegionHeight % 4 == 0);
   const bool wide = arrays.AreWordAligned() && mirrorKeepsGrid;
-  const int32_t columns = wide ? 16 : 2;
-  const int32_t rows = wide ? 8 : 2;
-  MRECT inner = {RoundUpTowardZero(outer.left, columns), RoundUpTowardZero(outer.top, rows),
-                 RoundDownTowardZero(outer.right, columns),
-                 RoundDownTowardZero(outer.bottom, rows)};
+  MRECT inner = wide ? InnerBlock<16, 8>(outer) : InnerBlock<2, 2>(outer);
 
   const bool collapsed = inner.left > inner.right || inner.top > inner.bottom;
   if (inner.left > inner.right) inner.left = inner.right;
@@ -199,8 +209,8 @@ void MPMapDstRect(const PassEngine* engine, int32_t* dstPitches, MRECT* rect,
   const uint32_t x = uint32_t(StartColumn(*engine, *rect));
   const uint32_t y = uint32_t(StartRow(*engine, *rect));
   for (int i = 0; i < 3 && binding.plane[i] != nullptr; ++i) {
-    const int64_t column = x / factors[3 + i];
-    const int64_t row = y / factors[6 + i];
+    const int64_t column = SampleOf(x, factors[3 + i]);
+    const int64_t row = SampleOf(y, factors[6 + i]);
     const int64_t offset = dstPitches[i] * row + int64_t(factors[i]) * column;
     dstPlaneStarts[i] = binding.plane[i] + ptrdiff_t(offset);
     if (engine->mirrorY != 0) dstPitches[i] = -dstPitches[i];
@@ -270,8 +280,8 @@ uint32_t MPProcessEx(MPPHandle* handle, uint8_t* const* dstPlanes, const MRECT* 
   const int64_t unit = engine.dstLayout.bitsPerPixel >> 3;
   uint8_t* converted[3] = {nullptr, nullptr, nullptr};
   for (uint32_t i = 0; i < 3 && i < planes; ++i) {
-    const int64_t column = uint32_t(originRect->left) / factors[3 + i];
-    const int64_t row = uint32_t(originRect->top) / factors[6 + i];
+    const int64_t column = SampleOf(uint32_t(originRect->left), factors[3 + i]);
+    const int64_t row = SampleOf(uint32_t(originRect->top), factors[6 + i]);
     const int64_t offset = dstPitches[i] * row + unit * column;
     if (dstPlanes[i] != nullptr) converted[i] = dstPlanes[i] - ptrdiff_t(offset);
   }

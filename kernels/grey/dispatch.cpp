@@ -30,5 +30,6 @@ extern "C" uint32_t Gray2Gray_C_FAST(const MRECT* rect, const int32_t* dstPitche
                                      const int32_t* srcPitches, uint8_t* const* dstPlanes,
                                      const uint8_t* const* srcPlanes,
                                      const EngineContext* context) {
-  return Dispatch(ChooseGrey, rect, dstPitches, srcPitches, dstPlanes, srcPlanes, context);
+  return Dispatch({kGrey | kPlanar, kGrey}, ChooseGrey, rect, dstPitches, srcPitches, dstPlanes,
+                  srcPlanes, context);
 }

@@ -73,7 +73,8 @@ extern "C" {
 uint32_t NEC_ALL(const MRECT* rect, const int32_t* dstPitches, const int32_t* srcPitches,
                  uint8_t* const* dstPlanes, const uint8_t* const* srcPlanes,
                  const EngineContext* context) {
-  return Dispatch(ChooseNeon, rect, dstPitches, srcPitches, dstPlanes, srcPlanes, context);
+  return Dispatch({kAnyLayout, kAnyLayout}, ChooseNeon, rect, dstPitches, srcPitches, dstPlanes,
+                  srcPlanes, context);
 }
 
 void NEC_DebugWin32() {}

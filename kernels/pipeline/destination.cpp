@@ -40,8 +40,8 @@ void PlaneWriter::Finish() {
   if (inPlace() && copies_ == 1) return;
   const ptrdiff_t pitch = copies_ == 1 ? ptrdiff_t{n_} * unit_ : 0;
   for (int i = 0; i < started_ * copies_; ++i) {
-    rows_->writePixels(plane_.At(column_, row_ + i), plane_.columnStep, buffer_ + i * pitch, unit_,
-                       n_);
+    rows_.writePixels(plane_.At(column_, row_ + i), plane_.columnStep, buffer_ + i * pitch, unit_,
+                      n_);
   }
 }
 
@@ -50,22 +50,21 @@ void PlaneWriter::Write(int64_t column, int64_t row, const uint8_t* bytes, int n
     memcpy(Start(column, row, n), bytes, size_t(n));
     Finish();
   } else {
-    rows_->writeStrided(plane_.At(column, row), plane_.columnStep, bytes, n);
+    rows_.writeStrided(plane_.At(column, row), plane_.columnStep, bytes, n);
   }
 }
 
 void PlaneWriter::WriteTransposed(int64_t column, int64_t row, const uint8_t* units,
                                   ptrdiff_t pitch, int n, int runs) {
   if (plane_.rowStep == unit_) {
-    rows_->transpose(plane_.At(column, row), plane_.columnStep, units, pitch, unit_, runs, n);
+    rows_.transpose(plane_.At(column, row), plane_.columnStep, units, pitch, unit_, runs, n);
   } else if (plane_.rowStep == -unit_) {
-    rows_->transpose(plane_.At(column, row + runs - 1), plane_.columnStep,
-                     units + (runs - 1) * pitch, -pitch, unit_, runs, n);
+    rows_.transpose(plane_.At(column, row + runs - 1), plane_.columnStep,
+                    units + (runs - 1) * pitch, -pitch, unit_, runs, n);
   } else {
     // Samples of a packed image: they do not lie side by side.
     for (int i = 0; i < runs; ++i) {
-      rows_->writePixels(plane_.At(column, row + i), plane_.columnStep, units + i * pitch, unit_,
-                         n);
+      rows_.writePixels(plane_.At(column, row + i), plane_.columnStep, units + i * pitch, unit_, n);
     }
   }
 }
@@ -86,7 +85,7 @@ void PlaneWriter::WriteBlock(int64_t column, int64_t row, const uint8_t* units, 
     if (plane_.columnStep == unit_) {
       memcpy(start, units + i * pitch, bytes);
     } else {
-      rows_->writePixels(start, plane_.columnStep, units + i * pitch, unit_, n);
+      rows_.writePixels(start, plane_.columnStep, units + i * pitch, unit_, n);
     }
   }
 }
@@ -106,28 +105,21 @@ Destination::Destination(const Job& job)
       hasChroma_(job.engine.dstLayout.code != CODE_RGB && job.engine.dstLayout.code != CODE_GRAY8),
       exchange_(!ExchangesLuma(job.engine.dstLayout.code) ? LumaExchange::kNone
                 : job.engine.swapXY != 0                  ? LumaExchange::kRows
-                                                          : LumaExchange::kColumns) {
+                                                          : LumaExchange::kColumns),
+      tiles_(engine_.swapXY != 0 && exchange_ == LumaExchange::kNone),
+      planes_{Plane(0), Plane(1), Plane(2)},
+      chromaPairs_(FirstOfPairs()),
+      // A plane of YUV takes a quarter of what pixels may take, chroma pairs two quarters.
+      writers_{{planes_[0], engine_.dstLayout.code == CODE_RGB ? pixels_.bytes : 1, tiles_, buffer_,
+                rows_},
+               {planes_[chromaPairs_ == 0 ? 1 : chromaPairs_], chromaPairs_ == 0 ? 1 : 2, tiles_,
+                buffer_ + PlaneWriter::kTileSize, rows_},
+               {planes_[2], 1, tiles_, buffer_ + 2 * PlaneWriter::kTileSize, rows_}},
+      order_(OrderOfPixels()) {
   if (pixels_.alphaByte >= 0 && engine_.pathKind == PATH_YUV_TO_RGB) {
     const int shift = 8 * pixels_.alphaByte;
     alphaFill_ = {~(0xFFu << shift), engine_.alpha << shift};
   }
-  for (int i = 0; i < 3; ++i) planes_[i] = Plane(i);
-  const bool tiles = engine_.swapXY != 0 && exchange_ == LumaExchange::kNone;
-  const bool rgb = engine_.dstLayout.code == CODE_RGB;
-  // A plane of YUV takes a quarter of what pixels may take, chroma pairs two quarters.
-  constexpr ptrdiff_t kPlane = PlaneWriter::kTileSize;
-  writers_[0].Set(planes_[0], rgb ? pixels_.bytes : 1, tiles, buffer_, &rows_);
-  const ptrdiff_t apart = planes_[2].start - planes_[1].start;
-  if (engine_.dstLayout.planeCount == 3 && (apart == 1 || apart == -1) &&
-      engine_.dstPlaneFactors[1] == 2 && planes_[1].rowStep == planes_[2].rowStep &&
-      planes_[1].columnStep == planes_[2].columnStep) {
-    chromaPairs_ = apart == 1 ? 1 : 2;
-    writers_[1].Set(planes_[chromaPairs_], 2, tiles, buffer_ + kPlane, &rows_);
-  } else {
-    writers_[1].Set(planes_[1], 1, tiles, buffer_ + kPlane, &rows_);
-    writers_[2].Set(planes_[2], 1, tiles, buffer_ + 2 * kPlane, &rows_);
-  }
-  order_ = OrderOfPixels();
   if (job.has(kPairChroma)) {
     // A mirrored walk meets the pixel that is first in memory last.
     const bool firstInMemoryIsLast = engine_.mirrorX != 0;
@@ -157,29 +149,31 @@ DestinationPlane Destination::Plane(int i) const {
   const bool mirrorY = c.mirrorY != 0;
   const int64_t startX = mirrorX ? int64_t(region.left) + region.right - left - 1 : left;
   const int64_t startY = mirrorY ? int64_t(region.top) + region.bottom - top - 1 : top;
-  PlaneAxis across = {startX / int32_t(c.dstPlaneFactors[3 + i]), mirrorX ? -1 : 1,
-                      PlaneAxis::kNoLimit};
-  const PlaneAxis down = {startY / int32_t(c.dstPlaneFactors[6 + i]), mirrorY ? -1 : 1,
-                          PlaneAxis::kNoLimit};
+  DestinationPlane plane;
+  PlaneAxis& across = swap ? plane.rows : plane.columns;
+  PlaneAxis& down = swap ? plane.columns : plane.rows;
+  across.origin = DivideByFactor(startX, c.dstPlaneFactors[3 + i]);
+  across.direction = mirrorX ? -1 : 1;
+  down.origin = DivideByFactor(startY, c.dstPlaneFactors[6 + i]);
+  down.direction = mirrorY ? -1 : 1;
   if (i == 0 && exchange_ != LumaExchange::kNone) {
     // A row of pairs ends with the pair that holds its last pixel.
     const int64_t width = int64_t(swap ? r.bottom : r.right) - left;
     const int64_t right = mirrorX ? startX + 1 : startX + width;
     across.limit = RoundUpToEven(right > c.dstImageRight ? int32_t(right) : c.dstImageRight);
   }
-  DestinationPlane plane;
   plane.start = job_.dstStarts[i];
-  plane.columnStep = c.dstLayout.step[i];
-  plane.rowStep = job_.dstPitches[i];
-  plane.columns = across;
-  plane.rows = down;
-  if (swap) {
-    plane.columnStep = job_.dstPitches[i];
-    plane.rowStep = c.dstLayout.step[i];
-    plane.columns = down;
-    plane.rows = across;
-  }
+  plane.columnStep = swap ? job_.dstPitches[i] : c.dstLayout.step[i];
+  plane.rowStep = swap ? c.dstLayout.step[i] : job_.dstPitches[i];
   return plane;
+}
+
+int Destination::FirstOfPairs() const {
+  const ptrdiff_t apart = planes_[2].start - planes_[1].start;
+  const bool pairs = engine_.dstLayout.planeCount == 3 && (apart == 1 || apart == -1) &&
+                     engine_.dstPlaneFactors[1] == 2 && planes_[1].rowStep == planes_[2].rowStep &&
+                     planes_[1].columnStep == planes_[2].columnStep;
+  return !pairs ? 0 : apart == 1 ? 1 : 2;
 }
 
 Destination::Order Destination::OrderOfPixels() const {
@@ -203,8 +197,9 @@ int64_t Destination::ChromaColumn(int32_t x) const {
 int32_t Destination::LastXOfChroma(int64_t column) const {
   const int64_t factor = engine_.dstSubsample[1];
   const int64_t left = job_.rect.left;
-  const int64_t next = engine_.dstLayout.code == CODE_YUYV ? left + (column + 1) * factor
-                                                           : (left / factor + column + 1) * factor;
+  const int64_t next = engine_.dstLayout.code == CODE_YUYV
+                           ? left + (column + 1) * factor
+                           : (DivideByFactor(left, engine_.dstSubsample[1]) + column + 1) * factor;
   return int32_t(next < job_.rect.right ? next : job_.rect.right) - 1;
 }
 

@@ -51,15 +51,10 @@ class PlaneWriter {
 
   static constexpr int kTileSize = kTileColumns * kTileRows;  // units
 
-  // `buffer` is for kTileSize units.
-  void Set(const DestinationPlane& plane, int unit, bool tiles, uint8_t* buffer,
-           const RowOps* rows) {
-    plane_ = plane;
-    unit_ = unit;
-    tiles_ = tiles;
-    buffer_ = buffer;
-    rows_ = rows;
-  }
+  // `buffer` is for kTileSize units. The plane is not copied.
+  PlaneWriter(const DestinationPlane& plane, int unit, bool tiles, uint8_t* buffer,
+              const RowOps& rows)
+      : plane_(plane), rows_(rows), unit_(unit), tiles_(tiles), buffer_(buffer) {}
   bool tiles() const { return tiles_; }
   int unit() const { return unit_; }
   ptrdiff_t rowStep() const { return plane_.rowStep; }
@@ -91,16 +86,16 @@ class PlaneWriter {
   void WriteTransposed(int64_t column, int64_t row, const uint8_t* units, ptrdiff_t pitch, int n,
                        int runs);
 
-  DestinationPlane plane_;
-  const RowOps* rows_ = nullptr;
-  int unit_ = 1;
-  bool tiles_ = false;
+  const DestinationPlane& plane_;
+  const RowOps& rows_;
+  int unit_;
+  bool tiles_;
+  uint8_t* buffer_;
   int64_t column_ = 0, row_ = 0;  // of the tile's first run, or of the run that was started
   int n_ = 0;
   int started_ = 0;  // runs
   int copies_ = 1;
   int count_ = 0;  // runs in the tile
-  uint8_t* buffer_ = nullptr;
 };
 
 class Destination {
@@ -199,6 +194,7 @@ class Destination {
   enum class LumaExchange { kNone, kColumns, kRows };
 
   DestinationPlane Plane(int i) const;
+  int FirstOfPairs() const;
   Order OrderOfPixels() const;
   bool IsInside(int64_t row, int rows) const {
     return pixelEnd_ > firstPixel_ && planes_[0].rows.Contains(row) &&
@@ -215,15 +211,18 @@ class Destination {
   const Job& job_;
   const RowOps& rows_;
   const EngineContext& engine_;
-  DestinationPlane planes_[3];
-  PlaneWriter writers_[3];
-  int chromaPairs_ = 0;  // 1 or 2: the plane that begins each pair of a semi-planar image
   PixelFormat pixels_;
   FieldShifts narrowedShifts_, fullShifts_;
   AlphaFill alphaFill_ = {~0u, 0};  // the engine's alpha, for sources that have none
   bool hasChroma_;
   LumaExchange exchange_;
-  Order order_ = Order::kWalk;
+  bool tiles_;
+  // In the order in which they depend on each other: nothing of this is made twice or copied, which
+  // small jobs would notice.
+  DestinationPlane planes_[3];
+  int chromaPairs_;  // 1 or 2: the plane that begins each pair of a semi-planar image
+  PlaneWriter writers_[3];
+  Order order_;
   // Which pixel of a chroma block gives U and V: its last in loop order, or with pair chroma one
   // its first and the other its last, by their order in memory.
   bool uOfLastColumn_ = true, vOfLastColumn_ = true;

@@ -40,13 +40,37 @@ int ChooseI420ToI422(const Question& q) {
   }
 }
 
-// The first of the table's first 58 lines that accepts the job. Levels are never changed here.
+// The table's first 58 lines by layout: bit i of from[k] says that line i takes sources 1 << k.
+constexpr int kFirstLine = id::I422_TO_I420_NORESAMPLE_4x4;
+constexpr int kLines = id::YUYVtoYUYVFast_N_RESAMPLE_R0_4x4 - kFirstLine + 1;
+struct LinesByLayout {
+  uint64_t from[32], to[32];
+};
+constexpr LinesByLayout SortLines() {
+  constexpr uint32_t kSides[][2] = {
+#define KERNEL(name, sources, destinations, ...) {sources, destinations},
+#include "kernels/planar_yuv/kernels.def"
+#undef KERNEL
+  };
+  LinesByLayout lines = {};
+  for (int i = 0; i < kLines; ++i) {
+    for (int k = 0; k < 32; ++k) {
+      lines.from[k] |= uint64_t{kSides[i][0] >> k & 1} << i;
+      lines.to[k] |= uint64_t{kSides[i][1] >> k & 1} << i;
+    }
+  }
+  return lines;
+}
+constexpr LinesByLayout kLinesByLayout = SortLines();
+
+// The first of these lines that accepts the job. Levels are never changed here.
 int ChooseYuvToYuv(const Question& q) {
   if (q.engine.needsLevelTable != 0 || q.engine.pathKind != PATH_YUV_TO_YUV) return kDeclined;
-  for (int line = id::I422_TO_I420_NORESAMPLE_4x4; line <= id::YUYVtoYUYVFast_N_RESAMPLE_R0_4x4;
-       ++line) {
-    const KernelRow& row = kKernels[line];
-    if (q.fromTo(row.sources, row.destinations) && Accepts(row, q.engine)) return line;
+  uint64_t lines = kLinesByLayout.from[__builtin_ctz(q.source)] &
+                   kLinesByLayout.to[__builtin_ctz(q.destination)];
+  for (; lines != 0; lines &= lines - 1) {
+    const int line = kFirstLine + __builtin_ctzll(lines);
+    if (Accepts(kKernels[line], q.engine)) return line;
   }
   return kDeclined;
 }
@@ -58,13 +82,15 @@ extern "C" {
 uint32_t YUV2YUV_Fast(const MRECT* rect, const int32_t* dstPitches, const int32_t* srcPitches,
                       uint8_t* const* dstPlanes, const uint8_t* const* srcPlanes,
                       const EngineContext* context) {
-  return Dispatch(ChooseYuvToYuv, rect, dstPitches, srcPitches, dstPlanes, srcPlanes, context);
+  return Dispatch({kYuv, kYuv}, ChooseYuvToYuv, rect, dstPitches, srcPitches, dstPlanes, srcPlanes,
+                  context);
 }
 
 uint32_t I420_To_I422_Fast(const MRECT* rect, const int32_t* dstPitches, const int32_t* srcPitches,
                            uint8_t* const* dstPlanes, const uint8_t* const* srcPlanes,
                            const EngineContext* context) {
-  return Dispatch(ChooseI420ToI422, rect, dstPitches, srcPitches, dstPlanes, srcPlanes, context);
+  return Dispatch({kPlanar, kPlanar}, ChooseI420ToI422, rect, dstPitches, srcPitches, dstPlanes,
+                  srcPlanes, context);
 }
 
 }  // extern "C"

@@ -75,5 +75,6 @@ extern "C" uint32_t ANY_ANY_C_FAST_R8G8B8(const MRECT* rect, const int32_t* dstP
                                           const int32_t* srcPitches, uint8_t* const* dstPlanes,
                                           const uint8_t* const* srcPlanes,
                                           const EngineContext* context) {
-  return Dispatch(ChooseRgb24, rect, dstPitches, srcPitches, dstPlanes, srcPlanes, context);
+  return Dispatch({kPlanar | kNv21 | kRgb24 | kRgb32, kPlanar | kRgb24}, ChooseRgb24, rect,
+                  dstPitches, srcPitches, dstPlanes, srcPlanes, context);
 }

@@ -218,8 +218,8 @@ uint32_t YUV_RGB32_C_FAST(const MRECT* rect, const int32_t* dstPitches, const in
   if (!IsComplete(rect, dstPitches, srcPitches, dstPlanes, srcPlanes, context)) {
     return KESTREL_BAD_ARGUMENT;
   }
+  if ((context->dstLayoutBit & kRgb32) == 0) return KESTREL_UNSUPPORTED;
   const Question q(*context);
-  if (!q.to(kRgb32)) return KESTREL_UNSUPPORTED;
   const Choice choice = q.from(kI420Or422) ? ChooseFromPlanar(q, *rect) : Final(ChooseToRgb32(q));
   if (choice.kernel == kDeclined) return KESTREL_UNSUPPORTED;
   const uint32_t answer = RunKernel(kKernels[choice.kernel], rect, dstPitches, srcPitches,
@@ -230,13 +230,15 @@ uint32_t YUV_RGB32_C_FAST(const MRECT* rect, const int32_t* dstPitches, const in
 uint32_t YUYV_RGB32_FAST(const MRECT* rect, const int32_t* dstPitches, const int32_t* srcPitches,
                          uint8_t* const* dstPlanes, const uint8_t* const* srcPlanes,
                          const EngineContext* context) {
-  return Dispatch(ChooseYuyv, rect, dstPitches, srcPitches, dstPlanes, srcPlanes, context);
+  return Dispatch({kYuyv | kRgb32, kRgb32 | kYuyv | kSemiPlanar}, ChooseYuyv, rect, dstPitches,
+                  srcPitches, dstPlanes, srcPlanes, context);
 }
 
 uint32_t ANY_ANY_C_FAST_RGB32(const MRECT* rect, const int32_t* dstPitches,
                               const int32_t* srcPitches, uint8_t* const* dstPlanes,
                               const uint8_t* const* srcPlanes, const EngineContext* context) {
-  return Dispatch(ChooseAny, rect, dstPitches, srcPitches, dstPlanes, srcPlanes, context);
+  return Dispatch({kRgb24 | kRgb32 | kI444 | kSemiPlanar, kRgb24 | kRgb32}, ChooseAny, rect,
+                  dstPitches, srcPitches, dstPlanes, srcPlanes, context);
 }
 
 }  // extern "C"

@@ -162,5 +162,6 @@ extern "C" uint32_t ANY_ANY_C_FAST_R5G6B5(const MRECT* rect, const int32_t* dstP
                                           const int32_t* srcPitches, uint8_t* const* dstPlanes,
                                           const uint8_t* const* srcPlanes,
                                           const EngineContext* context) {
-  return Dispatch(ChooseRgb16, rect, dstPitches, srcPitches, dstPlanes, srcPlanes, context);
+  return Dispatch({kPlanar | kSemiPlanar | kRgb16 | kRgb24, kRgb16 | kPlanar | kNv12 | kYuyv},
+                  ChooseRgb16, rect, dstPitches, srcPitches, dstPlanes, srcPlanes, context);
 }

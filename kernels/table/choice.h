@@ -26,8 +26,8 @@ constexpr uint32_t kRedHigh = ChannelOrder(11, 5, 0);
 struct Question {
   explicit Question(const EngineContext& c)
       : engine(c),
-        source(FormatOf(c.srcFormat)),
-        destination(FormatOf(c.dstFormat)),
+        source(c.srcLayoutBit),
+        destination(c.dstLayoutBit),
         sourceOrder(ChannelOrder(c.srcChannelPos[0], c.srcChannelPos[1], c.srcChannelPos[2])),
         destinationOrder(ChannelOrder(c.dstChannelPos[0], c.dstChannelPos[1], c.dstChannelPos[2])),
         blockMode(c.blockMode),
@@ -53,12 +53,22 @@ struct Question {
   bool bilinear, dither, swap, mirrorX, mirrorY;
 };
 
+// The layouts beyond which a dispatcher declines whatever else the question is. There are ten
+// dispatchers, and most jobs concern few of them.
+struct Sides {
+  uint32_t sources, destinations;
+  bool Include(const EngineContext& c) const {
+    return (c.srcLayoutBit & sources) != 0 && (c.dstLayoutBit & destinations) != 0;
+  }
+};
+
 // A dispatcher: one kernel takes the whole job, or nobody has written.
-inline uint32_t Dispatch(int (*choose)(const Question&), const MRECT* rect,
+inline uint32_t Dispatch(const Sides& sides, int (*choose)(const Question&), const MRECT* rect,
                          const int32_t* dstPitches, const int32_t* srcPitches,
                          uint8_t* const* dstPlanes, const uint8_t* const* srcPlanes,
                          const EngineContext* context) {
   if (context == nullptr) return KESTREL_BAD_ARGUMENT;
+  if (!sides.Include(*context)) return KESTREL_UNSUPPORTED;
   const int id = choose(Question(*context));
   if (id == kDeclined) return KESTREL_UNSUPPORTED;
   return RunKernel(kKernels[id], rect, dstPitches, srcPitches, dstPlanes, srcPlanes, context);

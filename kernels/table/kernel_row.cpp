@@ -111,7 +111,7 @@ bool BlockHolds(Block block, uint32_t mode) {
 
 }  // namespace
 
-uint32_t FormatOf(const FormatDesc& format) {
+uint32_t LayoutBit(const FormatDesc& format) {
   switch (format.code) {
     case CODE_RGB:
       switch (format.colourStandard) {
@@ -152,8 +152,8 @@ uint32_t FormatOf(const FormatDesc& format) {
 }
 
 bool Accepts(const KernelRow& row, const EngineContext& engine) {
-  const uint32_t source = FormatOf(engine.srcFormat);
-  const uint32_t destination = FormatOf(engine.dstFormat);
+  const uint32_t source = engine.srcLayoutBit;
+  const uint32_t destination = engine.dstLayoutBit;
   return (row.sources & source) != 0 && (row.destinations & destination) != 0 &&
          PairingHolds(row.pairing, source, destination, engine) && ScaleHolds(row.scale, engine) &&
          TransformHolds(row.transform, engine) && BlockHolds(row.block, engine.blockMode);

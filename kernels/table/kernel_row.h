@@ -31,10 +31,9 @@ enum FormatSet : uint32_t {
   kI420Or422 = kI420 | kI440 | kI422,
   kPlanar = kI420 | kI440 | kI422 | kI444,
   kSemiPlanar = kNv21 | kNv12,
+  kYuv = kPlanar | kSemiPlanar | kGrey | kYv12 | kNv61 | kYuyv | kYuv444,
+  kAnyLayout = ~0u,
 };
-
-// The set with just this side's layout; 0 for a layout that no table names.
-uint32_t FormatOf(const FormatDesc& format);
 
 // The side whose colour standard rules a conversion: the source, unless that is RGB.
 inline const FormatDesc& YuvSide(const EngineContext& c) {

@@ -94,5 +94,6 @@ int ChooseYuyv(const Question& q) {
 extern "C" uint32_t YUV_YUV_C_FAST(const MRECT* rect, const int32_t* dstPitches,
                                    const int32_t* srcPitches, uint8_t* const* dstPlanes,
                                    const uint8_t* const* srcPlanes, const EngineContext* context) {
-  return Dispatch(ChooseYuyv, rect, dstPitches, srcPitches, dstPlanes, srcPlanes, context);
+  return Dispatch({kRgb24 | kGrey | kPlanar | kYuyv, kYuyv | kNv21}, ChooseYuyv, rect, dstPitches,
+                  srcPitches, dstPlanes, srcPlanes, context);
 }
