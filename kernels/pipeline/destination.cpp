@@ -22,6 +22,17 @@ int PlaneWriter::Room(int64_t column, int64_t row, int n, int most) const {
   return room < most ? room : most;
 }
 
+void PlaneWriter::Prefetch(int64_t column, int64_t row, int n, int runs) const {
+  const ptrdiff_t bytes = ptrdiff_t{n} * unit_;
+  const ptrdiff_t pitch = plane_.rowStep < 0 ? -plane_.rowStep : plane_.rowStep;
+  if (tiles_ || pitch < 2 * bytes) return;
+  for (int i = 0; i < runs; ++i) {
+    const uint8_t* const a = plane_.At(column, row + i);
+    const uint8_t* const leftmost = plane_.columnStep < 0 ? a + plane_.columnStep * (n - 1) : a;
+    for (ptrdiff_t k = 0; k < bytes; k += 64) __builtin_prefetch(leftmost + k, 1);
+  }
+}
+
 uint8_t* PlaneWriter::Start(int64_t column, int64_t row, int n, int runs, int copies) {
   started_ = runs;
   copies_ = copies;
@@ -391,6 +402,7 @@ Destination::PixelRun Destination::StartPixels(int32_t r, int rows, int copies) 
   if (!IsInside(row, rows * copies)) return {nullptr, 0, 0, 0};
   const int64_t column = int64_t(x_) + firstPixel_ - job_.rect.left;
   MakeRoom(0, column, row, n, rows);
+  writers_[0].Prefetch(column, row + rows * copies, n, rows * copies);
   uint8_t* const pixels = writers_[0].Start(column, row, n, rows, copies);
   return {pixels, writers_[0].startedPitch(), firstPixel_, n};
 }

@@ -71,6 +71,9 @@ class PlaneWriter {
   // Memory for some runs of n units; they are written by the Finish that follows. For `copies` of
   // one run, which go to as many rows, not in tiles.
   uint8_t* Start(int64_t column, int64_t row, int n, int runs = 1, int copies = 1);
+  // Asks for the memory of runs that are to be written soon. Where a strip is narrower than the
+  // picture nothing else would: its rows are far apart.
+  void Prefetch(int64_t column, int64_t row, int n, int runs) const;
   ptrdiff_t startedPitch() const { return inPlace() ? plane_.rowStep : ptrdiff_t{n_} * unit_; }
   void Finish();
   // The same for bytes that exist already.
