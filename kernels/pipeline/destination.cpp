@@ -125,7 +125,7 @@ Destination::Destination(const Job& job)
                 rows_},
                {planes_[chromaPairs_ == 0 ? 1 : chromaPairs_], chromaPairs_ == 0 ? 1 : 2, tiles_,
                 buffer_ + PlaneWriter::kTileSize, rows_},
-               {planes_[2], 1, tiles_, buffer_ + 2 * PlaneWriter::kTileSize, rows_}},
+               {planes_[2], 1, tiles_, buffer_ + ptrdiff_t{2} * PlaneWriter::kTileSize, rows_}},
       order_(OrderOfPixels()) {
   if (pixels_.alphaByte >= 0 && engine_.pathKind == PATH_YUV_TO_RGB) {
     const int shift = 8 * pixels_.alphaByte;

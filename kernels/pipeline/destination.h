@@ -241,7 +241,8 @@ class Destination {
   int firstPixel_ = 0, pixelEnd_ = 0;            // columns of the strip that are inside plane 0
   // Of all writers (planes of YUV share it), or of samples that are arranged.
   uint8_t buffer_[ArrangedSamples::kSize];
-  static_assert(sizeof(buffer_) >= 4 * PlaneWriter::kTileSize, "pixels have up to four bytes");
+  static_assert(sizeof(buffer_) >= size_t{4} * PlaneWriter::kTileSize,
+                "pixels have up to four bytes");
 };
 
 }  // namespace kestrel
