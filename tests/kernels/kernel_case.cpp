@@ -254,10 +254,17 @@ bool KernelBench::Prepare(const Case& drawn, const reference::Engine& engine) {
     expectedBlocks_[i] = Place(expected_[i].get(), drawn.dst, i);
     random.Fill(gotBlocks_[i].watched, gotBlocks_[i].watchedSize);
     std::memcpy(expectedBlocks_[i].watched, gotBlocks_[i].watched, gotBlocks_[i].watchedSize);
+    before_[i].assign(gotBlocks_[i].watched, gotBlocks_[i].watched + gotBlocks_[i].watchedSize);
   }
   reference::KernelCall call;
   // Processing stops before its kernels when cropping has left nothing of the source.
   return !engine.sourceIsEmpty && Bind(gotBlocks_, &call);
+}
+
+void KernelBench::Restore() {
+  for (int i = 0; i < case_.dst.blocks.count; ++i) {
+    std::memcpy(gotBlocks_[i].watched, before_[i].data(), before_[i].size());
+  }
 }
 
 bool KernelBench::Bind(const differential::PlacedBlock* dst, reference::KernelCall* call) const {

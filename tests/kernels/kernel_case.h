@@ -4,6 +4,7 @@
 
 #include <memory>
 #include <string>
+#include <vector>
 
 #include "engine/postprocess.h"
 #include "kernels/table/kernels.h"
@@ -36,6 +37,9 @@ class KernelBench {
 
   // Fills the images. False when the band of the case is nothing that a kernel is called for.
   bool Prepare(const differential::Case& drawn, const reference::Engine& engine);
+
+  // Puts what kernels draw on back to what Prepare filled it with.
+  void Restore();
 
   // From now on kernels are called for rectangles without pixels.
   void CollapseCalls() { collapsed_ = true; }
@@ -76,6 +80,7 @@ class KernelBench {
 
   Buffer source_[3], got_[3], expected_[3];
   differential::PlacedBlock sourceBlocks_[3] = {}, gotBlocks_[3] = {}, expectedBlocks_[3] = {};
+  std::vector<uint8_t> before_[3];
   differential::Case case_{};
   const reference::Engine* engine_ = nullptr;
   bool collapsed_ = false;
