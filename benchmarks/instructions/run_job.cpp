@@ -30,7 +30,8 @@ struct Job {
   uint32_t src;
   uint32_t dst;
   uint32_t transform = 0;
-  bool scaled = false;  // bilinear, to kSmaller
+  bool scaled = false;    // bilinear, to kSmaller
+  bool adjusted = false;  // contrast and saturation, beyond what the clamp tables hold
 
   Size DstSize() const {
     const Size size = scaled ? kSmaller : kSource;
@@ -41,6 +42,7 @@ struct Job {
 constexpr Job kJobs[] = {
     {"NV21_full_to_RGBA", 3.4, FORMAT_NV21 | kFull, kRgba},
     {"NV21_video_to_RGBA", 6, FORMAT_NV21 | kVideo, kRgba},
+    {"NV21_adjusted_to_RGBA", 0, FORMAT_NV21 | kVideo, kRgba, 0, false, true},
     {"NV21_full_to_RGBA_R90", 5, FORMAT_NV21 | kFull, kRgba, kRotate90},
     {"NV21_full_to_RGBA_mirrored", 0, FORMAT_NV21 | kFull, kRgba, MPP_MIRROR_X},
     {"NV21_full_to_RGBA_720p", 10, FORMAT_NV21 | kFull, kRgba, 0, true},
@@ -90,6 +92,7 @@ bool Run(const Job& job, int runs) {
   params.transformCode = job.transform;
   params.passMode = MPP_PASS_TILED;
   params.alpha = 255;
+  if (job.adjusted) params.contrast = params.saturation = 64;
   const bench::Engine engine({job.dst, dst.size.width, dst.size.height, nullptr},
                              {job.src, kSource.width, kSource.height, nullptr}, params);
   if (!engine.IsAccepted()) {

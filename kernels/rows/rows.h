@@ -40,7 +40,8 @@ struct YuvToRgbTable {
 };
 
 // The same by multiplication, in sums that cannot wrap, saturating:
-// channel = min(max((index >> narrowing) - base, 0), maximum).
+// channel = min(max((index >> narrowing) - base, 0), maximum), where maximum = 255 >> narrowing.
+// Gains and offsets are those of a standard under any adjustment.
 struct YuvToRgbWide {
   int32_t yGain, vToR, vToG, uToG, uToB;
   int32_t offset[3];

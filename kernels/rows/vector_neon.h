@@ -95,6 +95,14 @@ template <int kBits>
 inline Words ShiftRightUnsigned(Words a) {
   return {vshrq_n_u16(a.v, kBits)};
 }
+// Signed, and clamped to 16 bits instead of wrapping.
+inline Words AddSaturated(Words a, Words b) {
+  return Unsigned(vqaddq_s16(Signed(a), Signed(b)));
+}
+// By no more than 8.
+inline Bytes ShiftRightUnsigned(Bytes a, uint32_t bits) {
+  return {vshlq_u8(a.v, vdupq_n_s8(int8_t(-int(bits))))};
+}
 // base + the high half of the signed product: half of the doubled product's, both rounded down.
 inline Words AddHighProduct(Words base, Words a, Words b) {
   return Unsigned(vsraq_n_s16(Signed(base), vqdmulhq_s16(Signed(a), Signed(b)), 1));
@@ -143,6 +151,10 @@ class ChromaWord {
   // Without its lowest 12 bits, and modulo 65536: four fractional bits are left.
   Words Sixteenths(const ChromaFactor& c) const {
     return Unsigned(vcombine_s16(vshrn_n_s32(Sum(c.low), 12), vshrn_n_s32(Sum(c.high), 12)));
+  }
+  // The same clamped to 16 bits.
+  Words Clamped(const ChromaFactor& c) const {
+    return Unsigned(vcombine_s16(vqshrn_n_s32(Sum(c.low), 12), vqshrn_n_s32(Sum(c.high), 12)));
   }
   // Without its lowest 16 bits.
   Words Whole(const ChromaFactor& c) const {

@@ -494,11 +494,23 @@ void UnpackAlpha(uint8_t* alpha, const uint8_t* src, const PixelFormat& format, 
 }
 
 // ---- YUV to RGB
-// What one component of chroma adds to the channel that it alone changes, and to green.
+// What one component of chroma adds to the channel that it alone changes, and to green. The word
+// for green in the tables is more than this share by greenBase.
 struct ChromaShare {
   int32_t gain, offset;
-  int32_t greenGain, greenOffset;
+  int32_t greenGain, greenOffset, greenBase;
   int32_t sixBitGain, sixBitOffset, sixBitGreenGain;
+};
+
+struct ChromaShares {
+  explicit ChromaShares(const YuvToRgbWide& s) {
+    // Where value 0 of a channel lies in the clamp table, as part of its offset.
+    const auto base = [&](int c) { return s.base[c] << (s.narrowing[c] + 16); };
+    const int32_t greenOffset = s.offset[1] - base(1);
+    ofU = {s.uToB, s.offset[2] - base(2), s.uToG, 0, 0, 113, -14516, 22};
+    ofV = {s.vToR, s.offset[0] - base(0), s.vToG, greenOffset, base(1), 90, -11485, 46};
+  }
+  ChromaShare ofU, ofV;
 };
 
 constexpr int kGreenOffset = 8669;  // in the six-bit form
@@ -521,15 +533,19 @@ struct ChromaTerms {
   Words term[kCount];
 };
 
+// The table form is the wide one too, because its sums of 16 bits saturate. Under any adjustment
+// luma adds from 0 to less than 1024 levels, so what was clamped to the +-2048 of a word is beyond
+// the same end of a channel's range as before. Each share of green fits a word.
 template <YuvToRgbForm kForm>
 class ColourStage {
  public:
-  ColourStage(const YuvToRgbWide& s, const ChromaShare& a, const ChromaShare& b, int32_t greenBase)
+  ColourStage(const YuvToRgbWide& s, const ChromaShare& a, const ChromaShare& b)
       : a_(a.gain, a.offset),
         b_(b.gain, b.offset),
-        greenA_(a.greenGain, a.greenOffset - (kForm == YuvToRgbForm::kTable ? 0 : greenBase)),
+        greenA_(a.greenGain, a.greenOffset),
         greenB_(b.greenGain, b.greenOffset),
-        greenBase_(SetWords(greenBase >> 12)),
+        carryA_(PrepareCarry(SetWords(a.greenBase >> 12))),
+        carryB_(PrepareCarry(SetWords(b.greenBase >> 12))),
         lumaWhole_(s.yGain >> 12),
         lumaPart_(s.yGain << 4 & 0xFFFF),
         sixA_(a.sixBitGain),
@@ -550,13 +566,14 @@ class ColourStage {
       const ChromaFactor factorB(b);
       const Words greenA = greenA_.Sixteenths(factorA);
       const Words greenB = greenB_.Sixteenths(factorB);
-      const Words green = greenA + greenB;
+      const Words green = AddSaturated(greenA, greenB);
       if constexpr (kForm == YuvToRgbForm::kWholeLuma) {
         return {{a_.Whole(factorA), ShiftRight<4>(green), b_.Whole(factorB)}};
       } else {
         // What green takes of a component is the low half of that component's word in the tables.
-        return {{a_.Sixteenths(factorA), green - greenBase_, b_.Sixteenths(factorB),
-                 PrepareCarry(greenA), PrepareCarry(greenB)}};
+        // (Prepared sums are differences.)
+        return {
+            {a_.Clamped(factorA), green, b_.Clamped(factorB), carryA_ - greenA, carryB_ - greenB}};
       }
     }
   }
@@ -569,8 +586,8 @@ class ColourStage {
     if constexpr (kForm == YuvToRgbForm::kTable) {
       const Product part = Multiply(y, lumaPart_);
       const Words luma = MultiplyAdd(part.high, y, lumaWhole_);
-      return {luma + t[0] - CarryOf(part.low, t[3]), luma + t[1],
-              luma + t[2] - CarryOf(part.low, t[4])};
+      return {AddSaturated(luma - CarryOf(part.low, t[3]), t[0]), AddSaturated(luma, t[1]),
+              AddSaturated(luma - CarryOf(part.low, t[4]), t[2])};
     } else {
       return {y + t[0], y + t[1], y + t[2]};
     }
@@ -581,7 +598,7 @@ class ColourStage {
 
  private:
   ChromaWord a_, b_, greenA_, greenB_;
-  Words greenBase_;
+  Words carryA_, carryB_;
   Factor lumaWhole_, lumaPart_;
   Factor sixA_, sixB_, sixGreenA_, sixGreenB_;
   Words sixOffsetA_, sixOffsetB_;
@@ -711,6 +728,16 @@ KESTREL_INLINE void ConvertLine(const ColourStage<kForm>& stage, uint8_t* dst, c
                        stage.Clamp(first.high, second.high), alpha);
 }
 
+// Where each pixel has its own chroma. Terms are not kept for the next row: registers cannot hold
+// those of a whole vector of pixels.
+template <ChromaLayout kLayout, int kPixel, YuvToRgbForm kForm>
+KESTREL_INLINE void ConvertLine(const ColourStage<kForm>& stage, uint8_t* dst, const uint8_t* y,
+                                const uint8_t* a, const uint8_t* b, Bytes alpha) {
+  ChromaTerms<kForm> low, high;
+  LoadTerms<kForm, kLayout, kPixel>(stage, a, b, &low, &high);
+  ConvertLine<kForm, kPixel>(stage, dst, y, low, high, alpha);
+}
+
 template <ChromaLayout kLayout, int kPixel>
 KESTREL_INLINE void ConvertLine(const SixBitStage& stage, uint8_t* dst, const uint8_t* y,
                                 const uint8_t* a, const uint8_t* b, Bytes alpha) {
@@ -764,7 +791,7 @@ void ConvertVectors(const void* colourStage, const PixelLines& lines, uint8_t al
     const uint8_t* a = lines.a + chromaRow * lines.aPitch;
     const uint8_t* b = lines.b + chromaRow * lines.bPitch;
     for (int i = 0; i < n; i += kBytes) {
-      if constexpr (kForm == YuvToRgbForm::kSixBits && !IsHalf(kLayout)) {
+      if constexpr (!IsHalf(kLayout)) {
         ConvertLine<kLayout, kPixel>(stage, dst, y, a, b, alpha);
         if (two) {
           ConvertLine<kLayout, kPixel>(stage, dst + lines.dstPitch, y + lines.yPitch, a, b, alpha);
@@ -858,13 +885,12 @@ constexpr decltype(PixelConversion::vectors) kConverters[] = {
 template <YuvToRgbForm kForm>
 void ConvertYuv(const PixelRows& rows, const ChromaRows& chroma, const YuvToRgbWide& s,
                 const PixelShape& shape, uint8_t alpha, int n) {
-  // Where value 0 of a channel lies in the clamp table, as part of its offset.
-  const auto base = [&](int c) { return s.base[c] << (s.narrowing[c] + 16); };
-  const ChromaShare ofU = {s.uToB, s.offset[2] - base(2), s.uToG, 0, 113, -14516, 22};
-  const ChromaShare ofV = {s.vToR, s.offset[0] - base(0), s.vToG, s.offset[1], 90, -11485, 46};
+  const ChromaShares shares(s);
   const bool aIsU = shape.blueFirst;
-  const ColourStage<kForm> stage(s, aIsU ? ofU : ofV, aIsU ? ofV : ofU, base(1));
-  const SixBitStage sixBitStage(aIsU ? ofU : ofV, aIsU ? ofV : ofU);
+  const ChromaShare& ofA = aIsU ? shares.ofU : shares.ofV;
+  const ChromaShare& ofB = aIsU ? shares.ofV : shares.ofU;
+  const ColourStage<kForm> stage(s, ofA, ofB);
+  const SixBitStage sixBitStage(ofA, ofB);
   const uint8_t* a = aIsU ? chroma.u : chroma.v;
   const uint8_t* b = aIsU ? chroma.v : chroma.u;
   const ptrdiff_t aPitch = aIsU ? chroma.uPitch : chroma.vPitch;
@@ -894,9 +920,7 @@ void YuvToPixels(const PixelRows& rows, const ChromaRows& chroma, const YuvToRgb
                  const PixelFormat& format, AlphaFill alpha, int n) {
   const PixelShape shape(format);
   const uint8_t fill = AlphaOf(alpha);
-  if (shape.bytes == 0 || colour.form == YuvToRgbForm::kWide) {
-    return scalar::YuvToPixels(rows, chroma, colour, format, alpha, n);
-  }
+  if (shape.bytes == 0) return scalar::YuvToPixels(rows, chroma, colour, format, alpha, n);
   if (n > kBytes && chroma.shift != 0 && n % 2 != 0) {
     // A vector that reached back to a pixel in the middle would tear those that share chroma.
     --n;
@@ -909,13 +933,34 @@ void YuvToPixels(const PixelRows& rows, const ChromaRows& chroma, const YuvToRgb
         ofLast, colour, format, alpha, 1);
   }
   switch (colour.form) {
-    case YuvToRgbForm::kTable:
-      return ConvertYuv<YuvToRgbForm::kTable>(rows, chroma, colour.wide, shape, fill, n);
     case YuvToRgbForm::kWholeLuma:
       return ConvertYuv<YuvToRgbForm::kWholeLuma>(rows, chroma, colour.wide, shape, fill, n);
-    default:
+    case YuvToRgbForm::kSixBits:
       return ConvertYuv<YuvToRgbForm::kSixBits>(rows, chroma, colour.wide, shape, fill, n);
+    default:
+      return ConvertYuv<YuvToRgbForm::kTable>(rows, chroma, colour.wide, shape, fill, n);
   }
+}
+
+void YuvToRgbByWideSums(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u, const uint8_t* v,
+                        const YuvToRgbWide& sums, int n) {
+  const ChromaShares shares(sums);
+  const ColourStage<YuvToRgbForm::kTable> stage(sums, shares.ofV, shares.ofU);
+  uint8_t* const dsts[] = {rgb[0], rgb[1], rgb[2]};
+  ForRun<1>(
+      dsts, n,
+      [&](uint8_t* const* out, const uint8_t* inY, const uint8_t* inU, const uint8_t* inV) {
+        const WordsPair luma = Widen(LoadBytes(inY));
+        const WordsPair wideU = Widen(LoadBytes(inU));
+        const WordsPair wideV = Widen(LoadBytes(inV));
+        const auto low = stage.Add(luma.low, stage.Terms(wideV.low, wideU.low).term);
+        const auto high = stage.Add(luma.high, stage.Terms(wideV.high, wideU.high).term);
+        const uint32_t* const narrowing = sums.narrowing;
+        StoreBytes(out[0], ShiftRightUnsigned(stage.Clamp(low.low, high.low), narrowing[0]));
+        StoreBytes(out[1], ShiftRightUnsigned(stage.Clamp(low.middle, high.middle), narrowing[1]));
+        StoreBytes(out[2], ShiftRightUnsigned(stage.Clamp(low.high, high.high), narrowing[2]));
+      },
+      Units{y, 1}, Units{u, 1}, Units{v, 1});
 }
 
 // ---- RGB to YUV, levels
@@ -1142,7 +1187,7 @@ constexpr RowOps VectorRows(const char* name) noexcept {
           ForLong<&RowOps::unpackRgb, UnpackRgb>::Run,
           ForLong<&RowOps::unpackAlpha, UnpackAlpha>::Run,
           scalar::UnpackIndexed,
-          scalar::YuvToRgbByWideSums,
+          ForLong<&RowOps::yuvToRgbWide, YuvToRgbByWideSums>::Run,
           scalar::YuvToRgbCarry,
           TableYuvToPixels,
           ForLong<&RowOps::rgbToYuv, RgbToYuv>::Run,

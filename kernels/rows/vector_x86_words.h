@@ -143,6 +143,15 @@ template <int kBits>
 inline Words ShiftRightUnsigned(Words a) {
   return {KESTREL_SIMD(srli_epi16)(a.v, kBits)};
 }
+// Signed, and clamped to 16 bits instead of wrapping.
+inline Words AddSaturated(Words a, Words b) {
+  return {KESTREL_SIMD(adds_epi16)(a.v, b.v)};
+}
+// By no more than 8.
+inline Bytes ShiftRightUnsigned(Bytes a, uint32_t bits) {
+  const Words shifted = {KESTREL_SIMD(srl_epi16)(a.v, _mm_cvtsi32_si128(int(bits)))};
+  return {(shifted & Words{SetBytes(255 >> bits).v}).v};
+}
 // base + the high half of the signed product.
 inline Words AddHighProduct(Words base, Words a, Words b) {
   return base + Words{KESTREL_SIMD(mulhi_epi16)(a.v, b.v)};
@@ -190,8 +199,9 @@ inline Words CarryOf(Words low, Words preparedAddend) {
 // A component of chroma, prepared for several words, and a word that it is converted to:
 // offset + c * gain, in numbers of 32 bits.
 struct ChromaFactor {
-  explicit ChromaFactor(Words component) : c(component), times16(ShiftLeft<4>(component)) {}
-  Words c, times16;
+  explicit ChromaFactor(Words component)
+      : c(component), times16(ShiftLeft<4>(component)), centred(component - SetWords(128)) {}
+  Words c, times16, centred;
 };
 class ChromaWord {
  public:
@@ -199,18 +209,32 @@ class ChromaWord {
       : high_(gain >> 12),
         low_(gain & 4095),
         offset_(SetWords(offset >> 12)),
-        carry_(PrepareCarry(SetWords((offset & 4095) << 4))) {}
+        carry_(PrepareCarry(SetWords((offset & 4095) << 4))),
+        half_(gain >> 13),
+        otherHalf_((gain >> 12) - (gain >> 13)),
+        centre_(SetWords((offset >> 12) + (gain >> 12) * 128)) {}
   // Without its lowest 12 bits, and modulo 65536: four fractional bits are left.
   Words Sixteenths(const ChromaFactor& chroma) const {
-    const Product low = Multiply(chroma.times16, low_);
-    return MultiplyAdd(low.high + offset_, chroma.c, high_) - CarryOf(low.low, carry_);
+    return MultiplyAdd(LowPart(chroma, offset_), chroma.c, high_);
+  }
+  // The same clamped to 16 bits, in two steps of which the first always fits.
+  Words Clamped(const ChromaFactor& chroma) const {
+    const Words part = MultiplyAdd(LowPart(chroma, centre_), chroma.centred, half_);
+    return AddSaturated(part, chroma.centred * otherHalf_.words);
   }
   // Without its lowest 16 bits.
   Words Whole(const ChromaFactor& chroma) const { return ShiftRight<4>(Sixteenths(chroma)); }
 
  private:
+  Words LowPart(const ChromaFactor& chroma, Words offset) const {
+    const Product low = Multiply(chroma.times16, low_);
+    return low.high + offset - CarryOf(low.low, carry_);
+  }
+
   Factor high_, low_;
   Words offset_, carry_;
+  Factor half_, otherHalf_;
+  Words centre_;
 };
 
 // ---- Pairs of bytes

@@ -173,8 +173,37 @@ constexpr uint32_t kStandards[] = {FORMAT_BT601_VIDEO, FORMAT_BT601_FULL, FORMAT
 constexpr uint32_t kRgb555 = 0x15000444;
 constexpr uint32_t kRgb444 = 0x15000333;
 
+// To 8-bit channels and to 16 bits, from any standard, under any extremes of adjustments.
+constexpr int kToRgbCount = 11;
+constexpr int kAdjusted = kToRgbCount;
+constexpr int kAdjusted16 = kToRgbCount + 1;
+constexpr int kAllToRgbCount = kToRgbCount + 2;
+
+const ColourEngine& AdjustedToRgb(Trial* trial, bool is16Bit) {
+  static constexpr int32_t kExtremes[] = {-128, 0, 128};
+  static const auto* const engines = [] {
+    auto* const list = new std::vector<std::unique_ptr<ColourEngine>>;
+    for (const uint32_t dst : {FORMAT_RGB888, FORMAT_RGB565}) {
+      for (const uint32_t standard : kStandards) {
+        for (int k = 0; k < 27; ++k) {
+          list->push_back(std::make_unique<ColourEngine>(
+              dst, FORMAT_I444 | standard,
+              kestrel::test::Param().Adjust(kExtremes[k / 9], kExtremes[k / 3 % 3],
+                                            kExtremes[k % 3])));
+        }
+      }
+    }
+    return list;
+  }();
+  const int half = int(engines->size()) / 2;
+  return *(*engines)[size_t(trial->random().Between(0, half - 1) + (is16Bit ? half : 0))];
+}
+
 // Engines to 8-bit channels, to both orders of 16 bits, and some with gains beyond the clamp table.
-const ColourEngine& ToRgb(int variant) {
+const ColourEngine& ToRgb(Trial* trial, int variant) {
+  if (variant >= kToRgbCount) {
+    return AdjustedToRgb(trial, variant == kAdjusted16);
+  }
   static const auto* const engines = [] {
     auto* const list = new std::vector<std::unique_ptr<ColourEngine>>;
     using kestrel::test::Param;
@@ -196,7 +225,6 @@ const ColourEngine& ToRgb(int variant) {
   }();
   return *engines->at(size_t(variant));
 }
-constexpr int kToRgbCount = 11;
 
 const ColourEngine& ToYuv(int variant) {
   static const auto* const engines = [] {
@@ -435,7 +463,7 @@ void UnpackIndexed(Trial* trial, const RowOps& ops, int n, int variant) {
 }
 
 void YuvToRgbWide(Trial* trial, const RowOps& ops, int n, int variant) {
-  const ColourEngine& engine = ToRgb(variant);
+  const ColourEngine& engine = ToRgb(trial, variant);
   const Sources yuv(trial, n);
   Destinations dst(trial, n);
   reference::YuvToRgb::Carry none{};
@@ -447,7 +475,7 @@ void YuvToRgbWide(Trial* trial, const RowOps& ops, int n, int variant) {
 
 // The remainders that a run leaves are those that the next one starts with.
 void YuvToRgbCarry(Trial* trial, const RowOps& ops, int n, int variant) {
-  const ColourEngine& engine = ToRgb(variant);
+  const ColourEngine& engine = ToRgb(trial, variant);
   reference::YuvToRgb::Carry expected = engine.model.StartCarry(true);
   Carry carry{};
   for (size_t c = 0; c < 3; ++c) {
@@ -473,31 +501,31 @@ constexpr struct {
   int engine;
   int format;
 } kYuvToPixels[] = {
-    {YuvToRgbForm::kWide, 5, 5},       {YuvToRgbForm::kWide, 5, 6},
-    {YuvToRgbForm::kWide, 5, 10},      {YuvToRgbForm::kWide, 5, 11},
-    {YuvToRgbForm::kWide, 5, 12},      {YuvToRgbForm::kWide, 5, 13},
-    {YuvToRgbForm::kTable, 0, 5},      {YuvToRgbForm::kTable, 0, 6},
-    {YuvToRgbForm::kTable, 0, 10},     {YuvToRgbForm::kTable, 0, 11},
-    {YuvToRgbForm::kTable, 0, 12},     {YuvToRgbForm::kTable, 0, 13},
-    {YuvToRgbForm::kTable, 6, 5},      {YuvToRgbForm::kTable, 6, 6},
-    {YuvToRgbForm::kTable, 6, 10},     {YuvToRgbForm::kTable, 6, 13},
-    {YuvToRgbForm::kWholeLuma, 6, 5},  {YuvToRgbForm::kWholeLuma, 6, 6},
-    {YuvToRgbForm::kWholeLuma, 6, 10}, {YuvToRgbForm::kWholeLuma, 6, 11},
-    {YuvToRgbForm::kWholeLuma, 6, 12}, {YuvToRgbForm::kWholeLuma, 6, 13},
-    {YuvToRgbForm::kSixBits, 6, 5},    {YuvToRgbForm::kSixBits, 6, 6},
-    {YuvToRgbForm::kSixBits, 6, 10},   {YuvToRgbForm::kSixBits, 6, 11},
-    {YuvToRgbForm::kSixBits, 6, 12},   {YuvToRgbForm::kSixBits, 6, 13},
-    {YuvToRgbForm::kWide, 4, 0},       {YuvToRgbForm::kWide, 4, 1},
-    {YuvToRgbForm::kTable, 2, 0},      {YuvToRgbForm::kTable, 2, 1},
-    {YuvToRgbForm::kTable, 3, 0},      {YuvToRgbForm::kTable, 3, 1},
-    {YuvToRgbForm::kWholeLuma, 2, 0},  {YuvToRgbForm::kWholeLuma, 2, 1},
-    {YuvToRgbForm::kWholeLuma, 7, 0},  {YuvToRgbForm::kWholeLuma, 7, 1},
-    {YuvToRgbForm::kSixBits, 2, 0},    {YuvToRgbForm::kSixBits, 2, 1},
-    {YuvToRgbForm::kWide, 9, 2},       {YuvToRgbForm::kSixBits, 9, 2},
-    {YuvToRgbForm::kWide, 10, 3},      {YuvToRgbForm::kSixBits, 10, 3},
-    {YuvToRgbForm::kWide, 8, 7},       {YuvToRgbForm::kWide, 8, 8},
-    {YuvToRgbForm::kTable, 8, 7},      {YuvToRgbForm::kTable, 8, 8},
-    {YuvToRgbForm::kSixBits, 8, 7},    {YuvToRgbForm::kSixBits, 8, 8},
+    {YuvToRgbForm::kWide, kAdjusted, 5},   {YuvToRgbForm::kWide, kAdjusted, 6},
+    {YuvToRgbForm::kWide, kAdjusted, 10},  {YuvToRgbForm::kWide, kAdjusted, 11},
+    {YuvToRgbForm::kWide, kAdjusted, 12},  {YuvToRgbForm::kWide, kAdjusted, 13},
+    {YuvToRgbForm::kTable, 0, 5},          {YuvToRgbForm::kTable, 0, 6},
+    {YuvToRgbForm::kTable, 0, 10},         {YuvToRgbForm::kTable, 0, 11},
+    {YuvToRgbForm::kTable, 0, 12},         {YuvToRgbForm::kTable, 0, 13},
+    {YuvToRgbForm::kTable, 6, 5},          {YuvToRgbForm::kTable, 6, 6},
+    {YuvToRgbForm::kTable, 6, 10},         {YuvToRgbForm::kTable, 6, 13},
+    {YuvToRgbForm::kWholeLuma, 6, 5},      {YuvToRgbForm::kWholeLuma, 6, 6},
+    {YuvToRgbForm::kWholeLuma, 6, 10},     {YuvToRgbForm::kWholeLuma, 6, 11},
+    {YuvToRgbForm::kWholeLuma, 6, 12},     {YuvToRgbForm::kWholeLuma, 6, 13},
+    {YuvToRgbForm::kSixBits, 6, 5},        {YuvToRgbForm::kSixBits, 6, 6},
+    {YuvToRgbForm::kSixBits, 6, 10},       {YuvToRgbForm::kSixBits, 6, 11},
+    {YuvToRgbForm::kSixBits, 6, 12},       {YuvToRgbForm::kSixBits, 6, 13},
+    {YuvToRgbForm::kWide, kAdjusted16, 0}, {YuvToRgbForm::kWide, kAdjusted16, 1},
+    {YuvToRgbForm::kTable, 2, 0},          {YuvToRgbForm::kTable, 2, 1},
+    {YuvToRgbForm::kTable, 3, 0},          {YuvToRgbForm::kTable, 3, 1},
+    {YuvToRgbForm::kWholeLuma, 2, 0},      {YuvToRgbForm::kWholeLuma, 2, 1},
+    {YuvToRgbForm::kWholeLuma, 7, 0},      {YuvToRgbForm::kWholeLuma, 7, 1},
+    {YuvToRgbForm::kSixBits, 2, 0},        {YuvToRgbForm::kSixBits, 2, 1},
+    {YuvToRgbForm::kWide, 9, 2},           {YuvToRgbForm::kSixBits, 9, 2},
+    {YuvToRgbForm::kWide, 10, 3},          {YuvToRgbForm::kSixBits, 10, 3},
+    {YuvToRgbForm::kWide, 8, 7},           {YuvToRgbForm::kWide, 8, 8},
+    {YuvToRgbForm::kTable, 8, 7},          {YuvToRgbForm::kTable, 8, 8},
+    {YuvToRgbForm::kSixBits, 8, 7},        {YuvToRgbForm::kSixBits, 8, 8},
 };
 constexpr int kYuvToPixelsCount = int(std::size(kYuvToPixels));
 
@@ -505,7 +533,7 @@ constexpr int kYuvToPixelsCount = int(std::size(kYuvToPixels));
 // either order, pitches of either sign.
 void YuvToPixels(Trial* trial, const RowOps& ops, int n, int variant) {
   const YuvToRgbForm form = kYuvToPixels[variant].form;
-  const ColourEngine& engine = ToRgb(kYuvToPixels[variant].engine);
+  const ColourEngine& engine = ToRgb(trial, kYuvToPixels[variant].engine);
   const PixelFormat& format = kPixelFormats[kYuvToPixels[variant].format];
   const AlphaFill alpha = DrawAlpha(trial, format);
   if (form == YuvToRgbForm::kTable || form == YuvToRgbForm::kWholeLuma) {
@@ -818,8 +846,8 @@ constexpr Operation kOperations[] = {
     {"UnpackRgb", kPixelFormatCount, UnpackRgb},
     {"UnpackAlpha", kPixelFormatCount - kFirstWithAlpha, UnpackAlpha},
     {"UnpackIndexed", 9, UnpackIndexed},
-    {"YuvToRgbWide", kToRgbCount, YuvToRgbWide},
-    {"YuvToRgbCarry", kToRgbCount, YuvToRgbCarry},
+    {"YuvToRgbWide", kAllToRgbCount, YuvToRgbWide},
+    {"YuvToRgbCarry", kAllToRgbCount, YuvToRgbCarry},
     {"YuvToPixels", kYuvToPixelsCount, YuvToPixels},
     {"RgbToYuv", 12, RgbToYuv},
     {"PixelsToYuv", 3 * kPixelFormatCount, PixelsToYuv},
