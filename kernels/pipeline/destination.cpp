@@ -241,9 +241,12 @@ int64_t Destination::BlockOfRow(int64_t r) const {
 }
 
 bool Destination::WritesChroma(int32_t r, bool ofLastRow) const {
-  const int64_t block = BlockOfRow(r);
-  const bool decides = ofLastRow ? r == job_.rect.bottom - 1 || BlockOfRow(int64_t(r) + 1) != block
-                                 : r == job_.rect.top || BlockOfRow(int64_t(r) - 1) != block;
+  // A block of rows ends before the next multiple of the factor, or with the job.
+  const uint32_t factor = engine_.dstSubsample[4];
+  const int32_t next = ofLastRow ? r + 1 : r;
+  const bool isMultiple = factor <= 2 ? (next & int32_t(factor - 1)) == 0
+                                      : BlockOfRow(next) != BlockOfRow(int64_t{next} - 1);
+  const bool decides = isMultiple || r == (ofLastRow ? job_.rect.bottom - 1 : job_.rect.top);
   return decides && planes_[1].rows.Contains(ChromaRow(r));
 }
 

@@ -802,16 +802,20 @@ class Pipeline {
                           chroma.lastX <= luma.lastX;
       if (!inTurn) return false;
     }
+    // Of source row 0.
+    const uint8_t* const lumaPixels = source_.LumaAt(luma.firstX, 0);
+    const uint8_t* const chromaPixels =
+        chroma.n > 0 ? source_.LumaAt(chroma.firstX, 0) : lumaPixels;
     for (int32_t r = job_.rect.top; r < job_.rect.bottom; ++r) {
       const int32_t row = source_.SourceRow(r, 1);
       if (destination_.ContainsLumaRow(r)) {
         uint8_t* const samples =
             destination_.writer(0).Start(luma.column, int64_t(r) - job_.rect.top, luma.n);
-        rows_.pixelsToYuv(samples, source_.LumaAt(luma.firstX, row), source_.pixelFormat(),
+        rows_.pixelsToYuv(samples, lumaPixels + source_.pitch(0) * row, source_.pixelFormat(),
                           yuvTables(), luma.n);
       }
       if (chroma.n > 0 && destination_.WritesU(r)) {
-        ConvertChromaInPlace(r, source_.LumaAt(chroma.firstX, row), chroma, step);
+        ConvertChromaInPlace(r, chromaPixels + source_.pitch(0) * row, chroma, step);
       }
     }
     return true;

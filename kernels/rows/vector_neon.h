@@ -457,12 +457,12 @@ class WeightedSum {
     if constexpr (kParts == LowParts::kMinus) {
       low = vmlsl_u8(vmlsl_u8(vmlsl_u8(lowOffset_, l, low_[0]), m, low_[1]), h, low_[2]);
     } else {
-      const uint16x8_t first = kAnyOffset ? vmlal_u8(lowOffset_, l, low_[0]) : vmull_u8(l, low_[0]);
-      low = vmlal_u8(vmlal_u8(first, m, low_[1]), h, low_[2]);
+      const uint16x8_t first = kAnyOffset ? vmlal_u8(lowOffset_, h, low_[2]) : vmull_u8(h, low_[2]);
+      low = vmlal_u8(vmlal_u8(first, m, low_[1]), l, low_[0]);
     }
     const uint16x8_t first =
-        kAnyOffset ? vmlal_u8(highOffset_, l, high_[0]) : vmull_u8(l, high_[0]);
-    const uint16x8_t high = vmlal_u8(vmlal_u8(first, m, high_[1]), h, high_[2]);
+        kAnyOffset ? vmlal_u8(highOffset_, h, high_[2]) : vmull_u8(h, high_[2]);
+    const uint16x8_t high = vmlal_u8(vmlal_u8(first, m, high_[1]), l, high_[0]);
     return vshrn_n_u16(vsraq_n_u16(high, low, 8), 8);
   }
 
