@@ -297,24 +297,36 @@ void ForChannels(const uint8_t* src, const PixelFormat& format, int n, const Cal
   }
 }
 
-void PixelsToYuv(uint8_t* dst, const uint8_t* src, const PixelFormat& format, RgbToYuvTables tables,
-                 int n) {
-  if (!format.wholeBytes) {
-    return ForChannels(src, format, n, [=](int x, uint8_t* const rgb[3], int count) {
-      RgbToYuv(dst + x, rgb, tables, count);
-    });
-  }
+// Of pixels of whole bytes, `pitch` bytes apart.
+void WholeBytesToYuv(uint8_t* dst, ptrdiff_t step, const uint8_t* src, ptrdiff_t pitch,
+                     const PixelFormat& format, RgbToYuvTables tables, int n) {
   const uint8_t* const red = src + format.position[0] / 8;
   const uint8_t* const green = src + format.position[1] / 8;
   const uint8_t* const blue = src + format.position[2] / 8;
   for (int i = 0; i < n; ++i) {
-    const ptrdiff_t at = ptrdiff_t{i} * format.bytes;
-    dst[i] = uint8_t((tables[0][red[at]] + tables[1][green[at]] + tables[2][blue[at]]) >> 16);
+    const ptrdiff_t at = i * pitch;
+    dst[i * step] =
+        uint8_t((tables[0][red[at]] + tables[1][green[at]] + tables[2][blue[at]]) >> 16);
   }
+}
+
+void PixelsToYuv(uint8_t* dst, const uint8_t* src, const PixelFormat& format, RgbToYuvTables tables,
+                 int n) {
+  if (format.wholeBytes) return WholeBytesToYuv(dst, 1, src, format.bytes, format, tables, n);
+  ForChannels(src, format, n, [=](int x, uint8_t* const rgb[3], int count) {
+    RgbToYuv(dst + x, rgb, tables, count);
+  });
 }
 
 void PixelPairsToChroma(uint8_t* u, uint8_t* v, int step, const uint8_t* src,
                         const PixelFormat& format, RgbToYuvTables tables, int n) {
+  if (format.wholeBytes) {
+    const uint8_t* const seconds = src + format.bytes;
+    const ptrdiff_t pitch = ptrdiff_t{2} * format.bytes;
+    WholeBytesToYuv(u, step, seconds, pitch, format, tables + 3, n);
+    WholeBytesToYuv(v, step, seconds, pitch, format, tables + 5, n);
+    return;
+  }
   ForChannels(src, format, 2 * n, [=](int x, uint8_t* const rgb[3], int count) {
     for (int i = 0; i < count / 2; ++i) {
       for (int c = 0; c < 3; ++c) rgb[c][i] = rgb[c][2 * i + 1];
