@@ -58,6 +58,7 @@ class PlaneWriter {
   bool tiles() const { return tiles_; }
   int unit() const { return unit_; }
   ptrdiff_t rowStep() const { return plane_.rowStep; }
+  uint8_t* At(int64_t column, int64_t row) const { return plane_.At(column, row); }
   // Whether runs lie in memory as they are packed; Start then gives the destination itself.
   bool inPlace() const { return !tiles_ && plane_.columnStep == unit_; }
   // Whether runs can join the tile as it stands.

@@ -809,8 +809,7 @@ class Pipeline {
     for (int32_t r = job_.rect.top; r < job_.rect.bottom; ++r) {
       const int32_t row = source_.SourceRow(r, 1);
       if (destination_.ContainsLumaRow(r)) {
-        uint8_t* const samples =
-            destination_.writer(0).Start(luma.column, int64_t(r) - job_.rect.top, luma.n);
+        uint8_t* const samples = destination_.writer(0).At(luma.column, int64_t(r) - job_.rect.top);
         rows_.pixelsToYuv(samples, lumaPixels + source_.pitch(0) * row, source_.pixelFormat(),
                           yuvTables(), luma.n);
       }
@@ -823,10 +822,9 @@ class Pipeline {
 
   void ConvertChromaInPlace(int32_t r, const uint8_t* first, const PlaneRun& run, int step) {
     const int64_t row = destination_.ChromaRow(r);
-    uint8_t* const samples = destination_.writer(1).Start(run.column, row, run.n);
+    uint8_t* const samples = destination_.writer(1).At(run.column, row);
     if (!pairsWriter()) {
-      PixelsToChroma(samples, destination_.writer(2).Start(run.column, row, run.n), 1, first, step,
-                     run.n);
+      PixelsToChroma(samples, destination_.writer(2).At(run.column, row), 1, first, step, run.n);
       return;
     }
     const bool uFirst = destination_.chromaPairs() == 1;
