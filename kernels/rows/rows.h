@@ -120,6 +120,7 @@ struct PixelTaps {
 };
 
 // Error carry of 16-bit RGB: the bits that narrowing drops are added to the next pixel's index.
+// Masks are of the lowest 0 to 8 bits, remainders within them.
 struct Carry {
   int32_t mask[3];
   int32_t remainder[3];

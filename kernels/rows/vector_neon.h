@@ -99,6 +99,19 @@ inline Words ShiftRightUnsigned(Words a) {
 inline Words AddSaturated(Words a, Words b) {
   return Unsigned(vqaddq_s16(Signed(a), Signed(b)));
 }
+// Of unsigned bytes: wrapping, and clamped to 255.
+inline Bytes operator+(Bytes a, Bytes b) {
+  return {vaddq_u8(a.v, b.v)};
+}
+inline Bytes operator-(Bytes a, Bytes b) {
+  return {vsubq_u8(a.v, b.v)};
+}
+inline Bytes operator&(Bytes a, Bytes b) {
+  return {vandq_u8(a.v, b.v)};
+}
+inline Bytes AddSaturated(Bytes a, Bytes b) {
+  return {vqaddq_u8(a.v, b.v)};
+}
 // By no more than 8.
 inline Bytes ShiftRightUnsigned(Bytes a, uint32_t bits) {
   return {vshlq_u8(a.v, vdupq_n_s8(int8_t(-int(bits))))};
@@ -234,6 +247,17 @@ inline void Store3(uint8_t* p, Bytes a, Bytes b, Bytes c) {
 }
 
 // ---- Order of bytes
+// Of each byte and all before it, modulo 256; and the last byte everywhere.
+inline Bytes RunningSums(Bytes b) {
+  const uint8x16_t zero = vdupq_n_u8(0);
+  uint8x16_t sums = vaddq_u8(b.v, vextq_u8(zero, b.v, 15));
+  sums = vaddq_u8(sums, vextq_u8(zero, sums, 14));
+  sums = vaddq_u8(sums, vextq_u8(zero, sums, 12));
+  return {vaddq_u8(sums, vextq_u8(zero, sums, 8))};
+}
+inline Bytes LastByte(Bytes b) {
+  return {vdupq_lane_u8(vget_high_u8(b.v), 7)};
+}
 // The last unit first.
 template <int kUnit>
 inline void StoreReversed(uint8_t* p, const uint8_t* src) {

@@ -555,7 +555,9 @@ class ColourStage {
         sixOffsetA_(SetWords(a.sixBitOffset)),
         sixOffsetB_(SetWords(b.sixBitOffset)) {}
 
-  ChromaTerms<kForm> Terms(Words a, Words b) const {
+  // Wrapping sums have their lower bits right, whatever the adjustments.
+  template <bool kWraps = false>
+  KESTREL_INLINE ChromaTerms<kForm> Terms(Words a, Words b) const {
     if constexpr (kForm == YuvToRgbForm::kSixBits) {
       const Words green =
           MultiplySubtract(MultiplySubtract(SetWords(kGreenOffset), a, sixGreenA_), b, sixGreenB_);
@@ -566,14 +568,15 @@ class ColourStage {
       const ChromaFactor factorB(b);
       const Words greenA = greenA_.Sixteenths(factorA);
       const Words greenB = greenB_.Sixteenths(factorB);
-      const Words green = AddSaturated(greenA, greenB);
+      const Words green = kWraps ? greenA + greenB : AddSaturated(greenA, greenB);
       if constexpr (kForm == YuvToRgbForm::kWholeLuma) {
         return {{a_.Whole(factorA), ShiftRight<4>(green), b_.Whole(factorB)}};
       } else {
         // What green takes of a component is the low half of that component's word in the tables.
         // (Prepared sums are differences.)
-        return {
-            {a_.Clamped(factorA), green, b_.Clamped(factorB), carryA_ - greenA, carryB_ - greenB}};
+        return {{kWraps ? a_.Sixteenths(factorA) : a_.Clamped(factorA), green,
+                 kWraps ? b_.Sixteenths(factorB) : b_.Clamped(factorB), carryA_ - greenA,
+                 carryB_ - greenB}};
       }
     }
   }
@@ -582,12 +585,14 @@ class ColourStage {
     Words low, middle, high;
   };
   // With four fractional bits in the table form.
-  Channels Add(Words y, const Words* t) const {
+  template <bool kWraps = false>
+  KESTREL_INLINE Channels Add(Words y, const Words* t) const {
     if constexpr (kForm == YuvToRgbForm::kTable) {
       const Product part = Multiply(y, lumaPart_);
       const Words luma = MultiplyAdd(part.high, y, lumaWhole_);
-      return {AddSaturated(luma - CarryOf(part.low, t[3]), t[0]), AddSaturated(luma, t[1]),
-              AddSaturated(luma - CarryOf(part.low, t[4]), t[2])};
+      const auto add = [](Words a, Words b) { return kWraps ? a + b : AddSaturated(a, b); };
+      return {add(luma - CarryOf(part.low, t[3]), t[0]), add(luma, t[1]),
+              add(luma - CarryOf(part.low, t[4]), t[2])};
     } else {
       return {y + t[0], y + t[1], y + t[2]};
     }
@@ -942,25 +947,106 @@ void YuvToPixels(const PixelRows& rows, const ChromaRows& chroma, const YuvToRgb
   }
 }
 
-void YuvToRgbByWideSums(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u, const uint8_t* v,
-                        const YuvToRgbWide& sums, int n) {
+// Sums of kBytes pixels, for each channel: with four fractional bits, saturating or wrapping.
+template <bool kWraps>
+KESTREL_INLINE void AddUp(const ColourStage<YuvToRgbForm::kTable>& stage, const uint8_t* y,
+                          const uint8_t* u, const uint8_t* v, WordsPair (&sums)[3]) {
+  const WordsPair luma = Widen(LoadBytes(y));
+  const WordsPair wideU = Widen(LoadBytes(u));
+  const WordsPair wideV = Widen(LoadBytes(v));
+  const auto low = stage.Add<kWraps>(luma.low, stage.Terms<kWraps>(wideV.low, wideU.low).term);
+  const auto high = stage.Add<kWraps>(luma.high, stage.Terms<kWraps>(wideV.high, wideU.high).term);
+  sums[0] = {low.low, high.low};
+  sums[1] = {low.middle, high.middle};
+  sums[2] = {low.high, high.high};
+}
+
+inline ColourStage<YuvToRgbForm::kTable> RedFirstStage(const YuvToRgbWide& sums) {
   const ChromaShares shares(sums);
-  const ColourStage<YuvToRgbForm::kTable> stage(sums, shares.ofV, shares.ofU);
+  return {sums, shares.ofV, shares.ofU};
+}
+
+void YuvToRgbByWideSums(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u, const uint8_t* v,
+                        const YuvToRgbWide& s, int n) {
+  const auto stage = RedFirstStage(s);
   uint8_t* const dsts[] = {rgb[0], rgb[1], rgb[2]};
   ForRun<1>(
       dsts, n,
       [&](uint8_t* const* out, const uint8_t* inY, const uint8_t* inU, const uint8_t* inV) {
-        const WordsPair luma = Widen(LoadBytes(inY));
-        const WordsPair wideU = Widen(LoadBytes(inU));
-        const WordsPair wideV = Widen(LoadBytes(inV));
-        const auto low = stage.Add(luma.low, stage.Terms(wideV.low, wideU.low).term);
-        const auto high = stage.Add(luma.high, stage.Terms(wideV.high, wideU.high).term);
-        const uint32_t* const narrowing = sums.narrowing;
-        StoreBytes(out[0], ShiftRightUnsigned(stage.Clamp(low.low, high.low), narrowing[0]));
-        StoreBytes(out[1], ShiftRightUnsigned(stage.Clamp(low.middle, high.middle), narrowing[1]));
-        StoreBytes(out[2], ShiftRightUnsigned(stage.Clamp(low.high, high.high), narrowing[2]));
+        WordsPair sums[3];
+        AddUp<false>(stage, inY, inU, inV, sums);
+#pragma GCC unroll 3  // or the sums would go through memory
+        for (int c = 0; c < 3; ++c) {
+          const Bytes levels = stage.Clamp(sums[c].low, sums[c].high);
+          StoreBytes(out[c], ShiftRightUnsigned(levels, s.narrowing[c]));
+        }
       },
       Units{y, 1}, Units{u, 1}, Units{v, 1});
+}
+
+// Remainders of one channel. Each is the lowest bits of the sum of a level and the remainder before
+// it, so it is those of the sum of all levels so far: what looks serial is a running sum.
+class Remainders {
+ public:
+  Remainders(const Carry& carry, int c)
+      : next_(SetBytes(carry.remainder[c])), mask_(SetBytes(carry.mask[c])) {}
+  // Before each of the next kBytes pixels, of whose levels the lowest 8 bits are given.
+  Bytes Before(Bytes levels) {
+    const Bytes sums = RunningSums(levels) + next_;
+    next_ = LastByte(sums);
+    return (sums - levels) & mask_;
+  }
+  int32_t next() const {
+    uint8_t bytes[kBytes];
+    StoreBytes(bytes, next_ & mask_);
+    return bytes[0];
+  }
+
+ private:
+  Bytes next_, mask_;
+};
+
+void YuvToRgbCarry(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u, const uint8_t* v,
+                   const YuvToRgbWide& s, Carry* carry, int n) {
+  const auto stage = RedFirstStage(s);
+  Remainders remainders[3] = {{*carry, 0}, {*carry, 1}, {*carry, 2}};
+  int i = 0;
+  for (; i + kBytes <= n; i += kBytes) {
+    // Sums that wrap have the bits that remain, sums that saturate those that are seen.
+    WordsPair wrapping[3], sums[3];
+    AddUp<true>(stage, y + i, u + i, v + i, wrapping);
+    AddUp<false>(stage, y + i, u + i, v + i, sums);
+#pragma GCC unroll 3
+    for (int c = 0; c < 3; ++c) {
+      const Words mask = SetWords(0xFF);
+      const Bytes levels = Narrow(ShiftRightUnsigned<4>(wrapping[c].low) & mask,
+                                  ShiftRightUnsigned<4>(wrapping[c].high) & mask);
+      const WordsPair before = Widen(remainders[c].Before(levels));
+      const Bytes carried = Narrow(ShiftRight<4>(sums[c].low) + before.low,
+                                   ShiftRight<4>(sums[c].high) + before.high);
+      StoreBytes(rgb[c] + i, ShiftRightUnsigned(carried, s.narrowing[c]));
+    }
+  }
+  for (int c = 0; c < 3; ++c) carry->remainder[c] = remainders[c].next();
+  uint8_t* const rest[3] = {rgb[0] + i, rgb[1] + i, rgb[2] + i};
+  kNarrower.yuvToRgbCarry(rest, y + i, u + i, v + i, s, carry, n - i);
+}
+
+void NarrowWithCarry(uint8_t* const dst[3], const uint8_t* const src[3], const FieldShifts& shifts,
+                     Carry* carry, int n) {
+  const int whole = n & -kBytes;
+  for (int c = 0; c < 3; ++c) {
+    Remainders remainders(*carry, c);
+    for (int i = 0; i < whole; i += kBytes) {
+      const Bytes levels = LoadBytes(src[c] + i);
+      const Bytes carried = AddSaturated(levels, remainders.Before(levels));
+      StoreBytes(dst[c] + i, ShiftRightUnsigned(carried, uint32_t(shifts.right[c])));
+    }
+    carry->remainder[c] = remainders.next();
+  }
+  uint8_t* const restOfDst[3] = {dst[0] + whole, dst[1] + whole, dst[2] + whole};
+  const uint8_t* const restOfSrc[3] = {src[0] + whole, src[1] + whole, src[2] + whole};
+  kNarrower.narrowWithCarry(restOfDst, restOfSrc, shifts, carry, n - whole);
 }
 
 // ---- RGB to YUV, levels
@@ -1188,13 +1274,13 @@ constexpr RowOps VectorRows(const char* name) noexcept {
           ForLong<&RowOps::unpackAlpha, UnpackAlpha>::Run,
           scalar::UnpackIndexed,
           ForLong<&RowOps::yuvToRgbWide, YuvToRgbByWideSums>::Run,
-          scalar::YuvToRgbCarry,
+          YuvToRgbCarry,
           TableYuvToPixels,
           ForLong<&RowOps::rgbToYuv, RgbToYuv>::Run,
           ForLong<&RowOps::pixelsToYuv, PixelsToYuv>::Run,
           ForLong<&RowOps::pixelPairsToChroma, PixelPairsToChroma>::Run,
           ForLong<&RowOps::mapLevels, MapLevels>::Run,
-          scalar::NarrowWithCarry,
+          NarrowWithCarry,
           ForLong<&RowOps::packRgb, PackRgb>::Run,
           ForLong<&RowOps::repackPixels, RepackPixels>::Run,
           scalar::PutAlpha,

@@ -186,6 +186,29 @@ KESTREL_INLINE void Store4InTurn(uint8_t* p, Bytes a, Bytes b, Bytes c, Bytes d)
 }
 
 // ---- Order of bytes
+// To each lane the last byte of the lane so many before it.
+template <int kLanes>
+constexpr Order LastOfLanes() {
+  Order order = {};
+  for (int i = 16 * kLanes; i < kBytes; ++i) order.of[i] = uint8_t((i | 15) - 16 * kLanes);
+  return order;
+}
+template <int kLanes>
+constexpr Order kLastOfLanes = LastOfLanes<kLanes>();
+template <int kLanes>
+inline Bytes AddLastOfLanes(Bytes b) {
+  constexpr uint64_t kHaveOne = ~uint64_t{0} << (16 * kLanes);
+  const Register last = _mm512_maskz_permutexvar_epi8(kHaveOne, Load(kLastOfLanes<kLanes>.of), b.v);
+  return b + Bytes{last};
+}
+// Of each byte and all before it, modulo 256; and the last byte everywhere.
+inline Bytes RunningSums(Bytes b) {
+  return AddLastOfLanes<2>(AddLastOfLanes<1>(RunningSumsOfLanes(b)));
+}
+inline Bytes LastByte(Bytes b) {
+  return {_mm512_permutexvar_epi8(SetBytes(kBytes - 1).v, b.v)};
+}
+
 template <int kUnit>
 constexpr Order Reversed() {
   Order order = {};

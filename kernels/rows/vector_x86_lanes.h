@@ -147,18 +147,29 @@ KESTREL_INLINE void Store3(uint8_t* p, Bytes a, Bytes b, Bytes c) {
   Register v[4];
   for (int i = 0; i < 4; ++i) v[i] = KESTREL_SIMD(shuffle_epi8)(quads.v[i], order);
   const auto join = [](Register x, Register y) { return (Words{x} | Words{y}).v; };
-#ifdef __AVX2__
-#define KESTREL_LANE_SHIFT(direction) _mm256_b##direction##li_epi128
-#else
-#define KESTREL_LANE_SHIFT(direction) _mm_b##direction##li_si128
-#endif
   StoreLanes(p, 0, 3, join(v[0], KESTREL_LANE_SHIFT(sl)(v[1], 12)));
   StoreLanes(p, 1, 3, join(KESTREL_LANE_SHIFT(sr)(v[1], 4), KESTREL_LANE_SHIFT(sl)(v[2], 8)));
   StoreLanes(p, 2, 3, join(KESTREL_LANE_SHIFT(sr)(v[2], 8), KESTREL_LANE_SHIFT(sl)(v[3], 4)));
-#undef KESTREL_LANE_SHIFT
 }
 
 // ---- Order of bytes
+// Of each byte and all before it, modulo 256; and the last byte everywhere.
+inline Bytes RunningSums(Bytes b) {
+  Bytes sums = RunningSumsOfLanes(b);
+#ifdef __AVX2__
+  const Register last = _mm256_shuffle_epi8(sums.v, SetBytes(15).v);
+  sums = sums + Bytes{_mm256_permute2x128_si256(last, last, 0x08)};
+#endif
+  return sums;
+}
+inline Bytes LastByte(Bytes b) {
+  const Register last = KESTREL_SIMD(shuffle_epi8)(b.v, SetBytes(15).v);
+#ifdef __AVX2__
+  return {_mm256_permute4x64_epi64(last, 0xFF)};
+#else
+  return {last};
+#endif
+}
 // The last unit first.
 template <int kUnit>
 inline void StoreReversed(uint8_t* p, const uint8_t* src) {

@@ -147,10 +147,23 @@ inline Words ShiftRightUnsigned(Words a) {
 inline Words AddSaturated(Words a, Words b) {
   return {KESTREL_SIMD(adds_epi16)(a.v, b.v)};
 }
+// Of unsigned bytes: wrapping, and clamped to 255.
+inline Bytes operator+(Bytes a, Bytes b) {
+  return {KESTREL_SIMD(add_epi8)(a.v, b.v)};
+}
+inline Bytes operator-(Bytes a, Bytes b) {
+  return {KESTREL_SIMD(sub_epi8)(a.v, b.v)};
+}
+inline Bytes operator&(Bytes a, Bytes b) {
+  return {KESTREL_SIMD_WHOLE(and)(a.v, b.v)};
+}
+inline Bytes AddSaturated(Bytes a, Bytes b) {
+  return {KESTREL_SIMD(adds_epu8)(a.v, b.v)};
+}
 // By no more than 8.
 inline Bytes ShiftRightUnsigned(Bytes a, uint32_t bits) {
-  const Words shifted = {KESTREL_SIMD(srl_epi16)(a.v, _mm_cvtsi32_si128(int(bits)))};
-  return {(shifted & Words{SetBytes(255 >> bits).v}).v};
+  const Bytes shifted = {KESTREL_SIMD(srl_epi16)(a.v, _mm_cvtsi32_si128(int(bits)))};
+  return shifted & SetBytes(255 >> bits);
 }
 // base + the high half of the signed product.
 inline Words AddHighProduct(Words base, Words a, Words b) {
@@ -282,6 +295,20 @@ inline Bytes NarrowShifted(Words low, Words high) {
 // Each word twice: words of half as many samples become words for pixels.
 inline WordsPair Double(Words w) {
   return {{KESTREL_SIMD(unpacklo_epi16)(w.v, w.v)}, {KESTREL_SIMD(unpackhi_epi16)(w.v, w.v)}};
+}
+
+// ---- Order within lanes
+#if defined(__AVX2__)
+#define KESTREL_LANE_SHIFT(direction) KESTREL_SIMD(b##direction##li_epi128)
+#else
+#define KESTREL_LANE_SHIFT(direction) _mm_b##direction##li_si128
+#endif
+// Of each byte of a lane and all before it there, modulo 256.
+inline Bytes RunningSumsOfLanes(Bytes b) {
+  b = b + Bytes{KESTREL_LANE_SHIFT(sl)(b.v, 1)};
+  b = b + Bytes{KESTREL_LANE_SHIFT(sl)(b.v, 2)};
+  b = b + Bytes{KESTREL_LANE_SHIFT(sl)(b.v, 4)};
+  return b + Bytes{KESTREL_LANE_SHIFT(sl)(b.v, 8)};
 }
 
 // ---- Pixels of four bytes
