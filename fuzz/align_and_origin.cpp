@@ -73,6 +73,8 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
   }
   MPPHandle* handle = nullptr;
   if (MPPCreate(&call.dst, &call.src, &call.params, &handle) != KESTREL_OK) return 0;
+  const auto& sets = testing_support::InstructionSets();
+  ForceRows(handle, sets[size_t(input.Between(0, int32_t(sets.size()) - 1))]);
   for (int32_t i = 0; i <= plans; ++i) Plan(&input, handle);
   if (!job.hasImages) {
     MPPDestroy(handle);

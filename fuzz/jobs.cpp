@@ -15,8 +15,8 @@ using differential::Random;
 using differential::Side;
 using testing_support::GuardedBuffer;
 
-constexpr size_t kCapacity = size_t{1} << 19;
-constexpr int64_t kMostPixels = int64_t{1} << 15;
+constexpr size_t kCapacity = size_t{1} << 22;
+constexpr int64_t kMostPixels = 1200 * 300;
 constexpr int64_t kFarthest = 16777216;  // regions that start beyond are not drawn
 
 constexpr uint32_t kListed[] = {FORMAT_NV21,
@@ -201,6 +201,7 @@ MPPPARAM DrawParams(Input* input) {
 int32_t DrawLength(Input* input) {
   const int32_t kind = input->Between(0, 63);
   if (kind == 63) return int32_t(input->Word());
+  if (kind == 62) return input->Between(301, 1200);  // more than a strip of a row
   if (kind >= 60) return input->Between(1, 300);
   return input->Between(1, kind < 40 ? 20 : 70);
 }

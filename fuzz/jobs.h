@@ -23,7 +23,7 @@ uint32_t DrawFormat(Input* input);
 // left zero.
 MPPPARAM DrawParams(Input* input);
 
-// Pixels a side: small, sometimes hundreds, seldom any word.
+// Pixels a side: small, sometimes hundreds or a thousand, seldom any word.
 int32_t DrawLength(Input* input);
 
 // Anything; often near the images of jobs.

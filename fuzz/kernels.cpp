@@ -42,6 +42,13 @@ uint32_t DrawCodeOf(Input* input, uint32_t layouts) {
   return code >> 28 >= 5 ? code | uint32_t(input->Between(0, 3)) << 12 : code;
 }
 
+// Pixels a side: few, or enough for what is done in strips and tiles.
+int32_t DrawKernelLength(Input* input) {
+  const int32_t kind = input->Between(1, 80);
+  if (kind <= 70) return kind;
+  return kind <= 77 ? input->Between(71, 300) : input->Between(301, 1200);
+}
+
 // The transform that a row asks for more often than chance would have it.
 uint32_t DrawTransform(Input* input, kestrel::Transform wanted, uint32_t drawn) {
   constexpr uint32_t kCodesOf[] = {0, 1, 2, 3, 4, 5, 6, 7};
@@ -62,13 +69,13 @@ Case DrawCall(Input* input, const kestrel::KernelRow& row) {
   if (params.passMode == MPP_PASS_TILED) params.passMode = uint32_t(input->Between(1, 4));
   MPPFORMAT& src = drawn.src.record;
   MPPFORMAT& dst = drawn.dst.record;
-  src.width = input->Between(1, 70);
-  src.height = input->Between(1, 70);
+  src.width = DrawKernelLength(input);
+  src.height = DrawKernelLength(input);
   const bool swaps = (params.transformCode & MPP_SWAP_XY) != 0;
   const bool isUnit = row.scale == kestrel::Scale::kUnit ||
                       row.scale == kestrel::Scale::kUnitSteps || input->OneIn(3);
-  dst.width = isUnit ? (swaps ? src.height : src.width) : input->Between(1, 70);
-  dst.height = isUnit ? (swaps ? src.width : src.height) : input->Between(1, 70);
+  dst.width = isUnit ? (swaps ? src.height : src.width) : DrawKernelLength(input);
+  dst.height = isUnit ? (swaps ? src.width : src.height) : DrawKernelLength(input);
   if (input->OneIn(4)) {
     MRECT& rect = params.srcRect;
     rect.left = input->Between(0, 20);

@@ -233,7 +233,7 @@ void DrawBand(Random* random, const reference::Engine& engine, Case* drawn) {
 }
 
 KernelBench::KernelBench() {
-  constexpr size_t kCapacity = size_t{1} << 17;
+  constexpr size_t kCapacity = size_t{1} << 22;
   for (int i = 0; i < 3; ++i) {
     source_[i] = std::make_unique<GuardedBuffer>(kCapacity);
     got_[i] = std::make_unique<GuardedBuffer>(kCapacity);
