@@ -17,7 +17,7 @@ int32_t RoundUpToEven(int32_t value) {
 
 int PlaneWriter::Room(int64_t column, int64_t row, int n, int most) const {
   if (inPlace()) return most;
-  int room = tiles_ ? kTileRows : kTileSize / n;
+  int room = tiles_ ? TileRows(n) : kTileSize / n;
   if (tiles_ && Fits(column, row, n)) room -= count_;
   return room < most ? room : most;
 }

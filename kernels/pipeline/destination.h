@@ -64,9 +64,11 @@ class PlaneWriter {
   // Whether runs can join the tile as it stands.
   bool Fits(int64_t column, int64_t row, int n, int runs = 1) const {
     return count_ == 0 ||
-           (count_ + runs <= kTileRows && column == column_ && n == n_ && row == row_ + count_);
+           (count_ + runs <= TileRows(n) && column == column_ && n == n_ && row == row_ + count_);
   }
 
+  // Runs of n units in a tile.
+  static int TileRows(int n) { return n > kTileColumns ? kTileSize / n : kTileRows; }
   // How many of `most` runs of n units one Start can be for.
   int Room(int64_t column, int64_t row, int n, int most) const;
   // Memory for some runs of n units; they are written by the Finish that follows. For `copies` of
