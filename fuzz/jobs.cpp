@@ -16,7 +16,7 @@ using differential::Side;
 using testing_support::GuardedBuffer;
 
 constexpr size_t kCapacity = size_t{1} << 22;
-constexpr int64_t kMostPixels = 1200 * 300;
+constexpr int64_t kMostPixels = int64_t{1200} * 300;
 constexpr int64_t kFarthest = 16777216;  // regions that start beyond are not drawn
 
 constexpr uint32_t kListed[] = {FORMAT_NV21,

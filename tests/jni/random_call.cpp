@@ -27,8 +27,9 @@ jint DrawSide(Input* input) {
 
 void PlanFailures(Input* input, Machine* machine) {
   if (input->OneIn(3)) {
-    machine->FailNth(machine->FailableCalls() + size_t(input->Between(1, 16)),
-                     input->OneIn(2) ? Failure::kException : Failure::kQuiet);
+    const size_t calls = size_t(input->Between(1, 16));
+    const Failure how = input->OneIn(2) ? Failure::kException : Failure::kQuiet;
+    machine->FailNth(machine->FailableCalls() + calls, how);
   }
   machine->SetBitmapFailure(-input->Between(1, 4));
   if (input->OneIn(4)) machine->SetCreatedStrideChange(input->Between(-4, 64));

@@ -113,12 +113,12 @@ class Walk {
   uint64_t pictures() const { return pictures_; }
 
  private:
-  // The shortest always, all of them when there are as many crossings.
+  // A short one first, which is quick; all of them when there are as many crossings.
   int Other(int crossing, int crossings) {
-    if (crossings >= kLongest || crossing < 2) {
-      return crossing % kLongest + 1;
+    if (crossings == kLongest) {
+      return crossing + 1;
     }
-    return random_.Between(3, kLongest);
+    return crossing == 0 ? random_.Between(2, 9) : crossing == 1 ? 1 : random_.Between(3, kLongest);
   }
 
   bool RunSize(int width, int height, bool ofSource) {
@@ -205,7 +205,11 @@ bool ParseOptions(int argc, char** argv, Options* options) {
     if (std::strcmp(argv[i], "--kernel") == 0) {
       options->kernel = argv[i + 1];
     } else if (std::strcmp(argv[i], "--crossings") == 0) {
-      options->crossings = std::atoi(argv[i + 1]);
+      char* end = nullptr;
+      options->crossings = int(std::strtol(argv[i + 1], &end, 10));
+      if (*end != '\0') {
+        return false;
+      }
     } else {
       return false;
     }
