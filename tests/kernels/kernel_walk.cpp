@@ -1,7 +1,7 @@
-// Every kernel of the table over all lengths of both directions, with every instruction set. The
-// planes are tight, and lie flush against the page before them, flush against the page after them,
-// and at odd addresses. All bytes must be those of the model. Random jobs of kernels are elsewhere;
-// this walk leaves no length, edge or set to chance.
+// Every kernel of the table over all lengths of both directions and some that are cut into strips,
+// with every instruction set. The planes are tight, and lie flush against the page before them,
+// flush against the page after them, and at odd addresses. All bytes must be those of the model.
+// Random jobs of kernels are elsewhere; this walk leaves no length, edge or set to chance.
 #include <algorithm>
 #include <csignal>
 #include <cstdio>
@@ -23,7 +23,8 @@ using testing_support::GuardedBuffer;
 using testing_support::InstructionSet;
 
 constexpr int kLongest = 70;
-constexpr int kMostDraws = 100000;  // until an engine suits a kernel
+constexpr int kStripLengths[] = {130, 514};  // more than a strip, upright or turned by a quarter
+constexpr int kMostDraws = 100000;           // until an engine suits a kernel
 
 enum class Place { kStart, kEnd, kOdd, kCount };
 
@@ -98,11 +99,15 @@ class Walk {
   bool Run(int crossings) {
     for (int length = 1; length <= kLongest; ++length) {
       for (int crossing = 0; crossing < crossings; ++crossing) {
-        const int other = Other(crossing, crossings);
-        for (const bool ofSource : {false, true}) {
-          if (!RunSize(length, other, ofSource) || !RunSize(other, length, ofSource)) {
-            return false;
-          }
+        if (!RunCrossing(length, Other(crossing, crossings))) {
+          return false;
+        }
+      }
+    }
+    for (const int length : kStripLengths) {
+      for (int crossing = 0; crossing < crossings; ++crossing) {
+        if (!RunCrossing(length, random_.Between(33, 40))) {  // whole tiles
+          return false;
         }
       }
     }
@@ -119,6 +124,15 @@ class Walk {
       return crossing + 1;
     }
     return crossing == 0 ? random_.Between(2, 9) : crossing == 1 ? 1 : random_.Between(3, kLongest);
+  }
+
+  bool RunCrossing(int length, int other) {
+    for (const bool ofSource : {false, true}) {
+      if (!RunSize(length, other, ofSource) || !RunSize(other, length, ofSource)) {
+        return false;
+      }
+    }
+    return true;
   }
 
   bool RunSize(int width, int height, bool ofSource) {
