@@ -47,17 +47,17 @@ void ArrangedSamples::Append(const SampleRows& in) {
                            ptrdiff_t pitch, int unit, int rows, int columns) {
     const int at = backwards_ ? most - done - rows : done;
     const uint8_t* const first = backwards_ ? samples + (rows - 1) * pitch : samples;
-    rows_.transpose(block + at * unit, ptrdiff_t{most} * unit, first, backwards_ ? -pitch : pitch,
-                    unit, rows, columns);
+    rows_.transpose(block + ptrdiff_t{at} * unit, ptrdiff_t{most} * unit, first,
+                    backwards_ ? -pitch : pitch, unit, rows, columns);
   };
   turn(memory_, most_, count_, in.y, in.yPitch, 1, in.rows, n_);
   const ChromaPlanes planes(chroma_.rows);
   const int samples = SamplesOf(chroma_, n_);
-  uint8_t* block = memory_ + n_ * most_;
+  uint8_t* block = memory_ + ptrdiff_t{n_} * most_;
   for (int i = 0; i < planes.count; ++i) {
     turn(block, chromaMost(), count_ >> chroma_.rows.rowShift, planes.start[i], planes.pitch[i],
          planes.unit, RowsOf(chroma_.rows, in.rows), samples);
-    block += samples * chromaMost();
+    block += ptrdiff_t{samples} * chromaMost();
   }
   count_ += in.rows;
 }
@@ -67,7 +67,7 @@ SampleRows ArrangedSamples::turned() const {
   const int step = chroma_.rows.step;
   const ptrdiff_t pitch = ptrdiff_t{chromaMost()} * step;
   const int first = backwards_ ? chromaMost() - RowsOf(chroma_.rows, count_) : 0;
-  const uint8_t* const block = memory_ + n_ * most_ + first * step;
+  const uint8_t* const block = memory_ + ptrdiff_t{n_} * most_ + ptrdiff_t{first} * step;
   ChromaRows chroma = Moved(chroma_.rows, block, samples * pitch);
   chroma.shift = chroma_.rows.rowShift;
   chroma.rowShift = chroma_.rows.shift;
@@ -78,7 +78,7 @@ SampleRows ArrangedSamples::turned() const {
 SampleRows ArrangedSamples::Mirror(const SampleRows& in, int n) {
   const auto mirror = [this](uint8_t* to, const uint8_t* from, ptrdiff_t pitch, int unit, int rows,
                              int count) {
-    const int size = count * unit;
+    const ptrdiff_t size = ptrdiff_t{count} * unit;
     for (int i = 0; i < rows; ++i) {
       rows_.writePixels(to + i * size + size - unit, -unit, from + i * pitch, unit, count);
     }
@@ -87,10 +87,10 @@ SampleRows ArrangedSamples::Mirror(const SampleRows& in, int n) {
   const ChromaPlanes planes(in.chroma.rows);
   const int samples = SamplesOf(in.chroma, n);
   const int rows = RowsOf(in.chroma.rows, in.rows);
-  uint8_t* const block = memory_ + in.rows * n;
+  uint8_t* const block = memory_ + ptrdiff_t{in.rows} * n;
   for (int i = 0; i < planes.count; ++i) {
-    mirror(block + i * rows * samples, planes.start[i], planes.pitch[i], planes.unit, rows,
-           samples);
+    mirror(block + ptrdiff_t{i} * rows * samples, planes.start[i], planes.pitch[i], planes.unit,
+           rows, samples);
   }
   ChromaRows chroma = Moved(in.chroma.rows, block, ptrdiff_t{rows} * samples);
   chroma.uPitch = chroma.vPitch = ptrdiff_t{samples} * planes.unit;

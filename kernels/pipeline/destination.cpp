@@ -402,10 +402,11 @@ Destination::PixelRun Destination::PlacePixels(int32_t r, int rows) const {
 Destination::PixelRun Destination::StartPixels(int32_t r, int rows, int copies) {
   const int64_t row = int64_t(r) - job_.rect.top;
   const int n = pixelEnd_ - firstPixel_;
-  if (!IsInside(row, rows * copies)) return {nullptr, 0, 0, 0};
+  const int written = rows * copies;
+  if (!IsInside(row, written)) return {nullptr, 0, 0, 0};
   const int64_t column = int64_t(x_) + firstPixel_ - job_.rect.left;
   MakeRoom(0, column, row, n, rows);
-  writers_[0].Prefetch(column, row + rows * copies, n, rows * copies);
+  writers_[0].Prefetch(column, row + written, n, written);
   uint8_t* const pixels = writers_[0].Start(column, row, n, rows, copies);
   return {pixels, writers_[0].startedPitch(), firstPixel_, n};
 }

@@ -49,7 +49,9 @@ struct Job {
 // every row of a narrow job would cost more than its pixels. (Compilers would make one division of
 // `value / 2` and the last case.)
 inline int64_t DivideByFactor(int64_t value, uint32_t factor) {
-  return factor == 1 ? value : factor == 2 ? (value + (value < 0)) >> 1 : value / int32_t(factor);
+  return factor <= 1   ? value
+         : factor == 2 ? (value + (value < 0 ? 1 : 0)) >> 1
+                       : value / int32_t(factor);
 }
 
 // Whether a job can be drawn at all: its planes and table exist, and there is something to read.

@@ -353,8 +353,9 @@ class Pipeline {
   // Rows without gaps between them, on both sides, are one long row.
   void RearrangeChroma(const PlaneRun& run, const PlaneRow& first, int rows, int from, int to) {
     const bool unbroken =
-        source_.pitch(1) == run.n * (from != 0 ? 2 : 1) && source_.pitch(2) == source_.pitch(1) &&
-        destination_.writer(1).rowStep() == run.n * (to != 0 ? 2 : 1) &&
+        source_.pitch(1) == ptrdiff_t{run.n} * (from != 0 ? 2 : 1) &&
+        source_.pitch(2) == source_.pitch(1) &&
+        destination_.writer(1).rowStep() == ptrdiff_t{run.n} * (to != 0 ? 2 : 1) &&
         (to != 0 || destination_.writer(2).rowStep() == run.n) && run.n <= INT32_MAX / 4 / rows;
     const int n = unbroken ? run.n * rows : run.n;
     for (int i = 0; i < (unbroken ? 1 : rows); ++i) {
@@ -873,10 +874,10 @@ class Pipeline {
   bool chromaOfSeconds_ = false;  // every pixel, or the second of each two, decides
   // Runs of samples; or those of short rows, luma and then chroma.
   uint8_t memory_[3 * kCollected];
-  uint8_t* const channels_[3] = {memory_, memory_ + kStrip, memory_ + 2 * kStrip};
-  uint8_t* const luma_ = memory_ + 3 * kStrip;
-  uint8_t* const u_ = memory_ + 4 * kStrip;
-  uint8_t* const v_ = memory_ + 5 * kStrip;
+  uint8_t* const channels_[3] = {memory_, memory_ + kStrip, memory_ + ptrdiff_t{2} * kStrip};
+  uint8_t* const luma_ = memory_ + ptrdiff_t{3} * kStrip;
+  uint8_t* const u_ = memory_ + ptrdiff_t{4} * kStrip;
+  uint8_t* const v_ = memory_ + ptrdiff_t{5} * kStrip;
 };
 
 static_assert(sizeof(Pipeline) < size_t{50} * 1024, "camera threads have small stacks");
