@@ -23,7 +23,7 @@ class ArrangedSamples {
   // first row the leftmost one, or the rightmost when `backwards`.
   void BeginTurned(int n, int most, bool backwards);
   // Rows that share chroma are the only ones of their block; backwards they are one, or an even
-  // number. Others have their components of chroma apart.
+  // number. All rows of a block have chroma of the same layout.
   void Append(const SampleRows& in);
   int count() const { return count_; }
   // What was collected: n rows of count() pixels.
