@@ -7,6 +7,7 @@
 #include <cstdlib>
 #include <cstring>
 #include <exception>
+#include <random>
 #include <regex>
 #include <string>
 #include <vector>
@@ -115,9 +116,18 @@ Result Measure(const Job& job, const std::vector<Contender>& contenders, const O
     const double time = BriefTime(entry.plan.run);
     entry.repetitions = std::max(1, int(std::ceil(options.sliceNanoseconds / time)));
   }
+  // Each slice begins with an untimed call, and the turns change: what the contender before leaves
+  // in the caches (memcpy writes around them) would cost whoever always follows it up to a third.
+  std::mt19937 random(1);
+  std::vector<Entry*> turns;
+  for (Entry& entry : result.entries) {
+    if (entry.Takes()) turns.push_back(&entry);
+  }
   for (int round = 0; round < options.rounds; ++round) {
-    for (Entry& entry : result.entries) {
-      if (entry.Takes()) entry.times.push_back(TimePerCall(entry.repetitions, entry.plan.run));
+    std::shuffle(turns.begin(), turns.end(), random);
+    for (Entry* entry : turns) {
+      entry->plan.run();
+      entry->times.push_back(TimePerCall(entry->repetitions, entry->plan.run));
     }
   }
   return result;
