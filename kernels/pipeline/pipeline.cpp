@@ -143,7 +143,7 @@ class Pipeline {
       return false;
     }
     const bool inPlace = source_.PixelsLieInPlace(job_.rect.left, Width());
-    if (inPlace && writer.inPlace()) stripWidth_ = Width();
+    if (writer.inPlace() && (inPlace || HasGroups())) stripWidth_ = inPlace ? Width() : kCollected;
     mostRows_ = !inPlace           ? 1
                 : writer.inPlace() ? INT32_MAX
                 : destination_.pixelOrder() == PixelOrder::kMirrored
@@ -158,6 +158,13 @@ class Pipeline {
       r += rows;
     }
     return true;
+  }
+
+  // Whether all strips are of whole groups of packed 4:2:2, if they are of an even width.
+  bool HasGroups() {
+    if (Width() % 2 != 0) return false;
+    SelectColumns(job_.rect.left);
+    return source_.Groups(job_.rect.top) != nullptr;
   }
 
   static int CommonStep(const int32_t* columns, int n) {
@@ -586,6 +593,9 @@ class Pipeline {
       return {y, source_.pitch(0), rows, source_.ChromaOfPixels(r)};
     }
     if (most >= 2 && kCollected / n_ >= 2) return CollectRows(r, most);
+    if (const uint8_t* const groups = source_.Groups(r); groups != nullptr) {
+      return {memory_, 0, 1, source_.ReadGroups(groups, r, memory_, memory_ + kCollected)};
+    }
     return {y != nullptr ? y : source_.Luma(r), 0, 1, source_.ChromaOfPixels(r)};
   }
 
@@ -594,9 +604,15 @@ class Pipeline {
     SampleRows collected = {memory_, n_, rows, {}};
     for (int i = 0; i < rows; ++i) {
       uint8_t* const into = memory_ + ptrdiff_t{i} * n_;
-      const uint8_t* const luma = source_.Luma(r + i, into);
-      if (luma != into) memcpy(into, luma, size_t(n_));
-      const PixelChroma row = CollectChroma(r + i, i);
+      PixelChroma row;
+      if (const uint8_t* const groups = source_.Groups(r + i); groups != nullptr) {
+        row = source_.ReadGroups(groups, r + i, into, CollectedChroma(i));
+        row.rows.uPitch = row.rows.vPitch = ptrdiff_t{2} * n_;
+      } else {
+        const uint8_t* const luma = source_.Luma(r + i, into);
+        if (luma != into) memcpy(into, luma, size_t(n_));
+        row = CollectChroma(r + i, i);
+      }
       if (i == 0) collected.chroma = row;
     }
     return collected;
@@ -661,9 +677,11 @@ class Pipeline {
     return rows;
   }
 
+  uint8_t* CollectedChroma(int i) { return memory_ + kCollected + ptrdiff_t{i} * 2 * n_; }
+
   // Chroma of a row as row i of those collected.
   PixelChroma CollectChroma(int32_t r, int i) {
-    uint8_t* const into = memory_ + kCollected + ptrdiff_t{i} * 2 * n_;
+    uint8_t* const into = CollectedChroma(i);
     PixelChroma chroma = source_.ChromaOfPixels(r, into);
     ChromaRows& rows = chroma.rows;
     if (source_.ChromaIsGrey()) return chroma;
@@ -783,12 +801,13 @@ class Pipeline {
     }
   }
 
-  // Pixels of RGB that are in place on both sides become YUV in rows as wide as the job: strips
-  // would read a large picture in short pieces, far apart. False where they are not in place.
+  // Pixels of RGB that are in place on both sides, or become whole groups of packed 4:2:2, become
+  // YUV in rows as wide as the job: strips would read a large picture in short pieces, far apart.
+  // False where they are not in place.
   bool ConvertRgbInPlace() {
     const bool unit = engine_.stepX == 0x10000 && engine_.stepY == 0x10000;
     if (!unit || engine_.pathKind != PATH_RGB_TO_YUV || job_.has(kPairChroma) ||
-        destination_.exchangesLuma() || job_.rect.left < 0 || !destination_.AllInPlace()) {
+        destination_.exchangesLuma() || job_.rect.left < 0) {
       return false;
     }
     const PlaneRun luma = destination_.LumaRun();
@@ -803,12 +822,20 @@ class Pipeline {
                           chroma.lastX <= luma.lastX;
       if (!inTurn) return false;
     }
+    const bool groups = step == 2 && luma.n == 2 * chroma.n && chroma.firstX == luma.firstX + 1 &&
+                        destination_.GroupsAt(luma, chroma, job_.rect.top) != nullptr;
+    if (!groups && !destination_.AllInPlace()) return false;
     // Of source row 0.
     const uint8_t* const lumaPixels = source_.LumaAt(luma.firstX, 0);
     const uint8_t* const chromaPixels =
         chroma.n > 0 ? source_.LumaAt(chroma.firstX, 0) : lumaPixels;
     for (int32_t r = job_.rect.top; r < job_.rect.bottom; ++r) {
       const int32_t row = source_.SourceRow(r, 1);
+      if (groups) {
+        ConvertToGroups(destination_.GroupsAt(luma, chroma, r), lumaPixels + source_.pitch(0) * row,
+                        luma.n);
+        continue;
+      }
       if (destination_.ContainsLumaRow(r)) {
         uint8_t* const samples = destination_.writer(0).At(luma.column, int64_t(r) - job_.rect.top);
         rows_.pixelsToYuv(samples, lumaPixels + source_.pitch(0) * row, source_.pixelFormat(),
@@ -819,6 +846,22 @@ class Pipeline {
       }
     }
     return true;
+  }
+
+  // An even number of pixels.
+  void ConvertToGroups(uint8_t* groups, const uint8_t* pixels, int n) {
+    const PlaneLayout& to = engine_.dstLayout;
+    const int uFirst = to.uOffset < to.vOffset ? 1 : 0;
+    const bool lumaFirst = to.yOffset == 0;
+    for (int i = 0; i < n; i += kStrip) {
+      const int count = n - i < kStrip ? n - i : kStrip;
+      const uint8_t* const from = pixels + ptrdiff_t{i} * source_.pixelFormat().bytes;
+      rows_.pixelsToYuv(luma_, from, source_.pixelFormat(), yuvTables(), count);
+      rows_.pixelPairsToChroma(u_ + 1 - uFirst, u_ + uFirst, 2, from, source_.pixelFormat(),
+                               yuvTables(), count / 2);
+      rows_.interleave(groups + ptrdiff_t{2} * i, lumaFirst ? luma_ : u_, lumaFirst ? u_ : luma_,
+                       count);
+    }
   }
 
   void ConvertChromaInPlace(int32_t r, const uint8_t* first, const PlaneRun& run, int step) {

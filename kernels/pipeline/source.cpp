@@ -216,6 +216,30 @@ bool Source::PixelsLieInPlace(int32_t x, int32_t n) const {
          LumaLiesInPlace(x, n);
 }
 
+const uint8_t* Source::Groups(int32_t r) const {
+  if (pixelChroma_ != PixelChromaRead::kStrided || chromaU_.step != 4 || first_.step != 2 ||
+      !first_.contiguous || phase_ != 0 || first_.n != 2 * chromaCount_ ||
+      job_.engine.stepY != 0x10000) {
+    return nullptr;
+  }
+  const int32_t row = SourceRow(r, 1);
+  const uint8_t* const y = RowStart(0, row) + first_.offset[0];
+  const uint8_t* const u = RowStart(1, row) + chromaU_.offset[0];
+  const uint8_t* const v = RowStart(2, row) + chromaU_.offset[0];
+  const uint8_t* const chroma = u < v ? u : v;
+  const bool inTurn = (u - v == 2 || v - u == 2) && (y - chroma == 1 || chroma - y == 1);
+  return !inTurn ? nullptr : y < chroma ? y : chroma;
+}
+
+PixelChroma Source::ReadGroups(const uint8_t* groups, int32_t r, uint8_t* luma,
+                               uint8_t* pairs) const {
+  const int32_t row = SourceRow(r, 1);
+  const bool lumaFirst = groups == RowStart(0, row) + first_.offset[0];
+  const bool uFirst = RowStart(1, row) < RowStart(2, row);
+  rows_.deinterleave(lumaFirst ? luma : pairs, lumaFirst ? pairs : luma, groups, first_.n);
+  return {{pairs + (uFirst ? 0 : 1), pairs + (uFirst ? 1 : 0), shift_, 2, 0, 0, 0}};
+}
+
 bool Source::LumaLiesInPlace(int32_t x, int32_t n) const {
   const bool packedYuv = job_.engine.srcLayout.code != CODE_RGB && first_.step != 1;
   return !packedYuv && LumaAdvances(x, n);

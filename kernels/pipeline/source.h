@@ -105,6 +105,11 @@ class Source {
   int RowsInPlace(int32_t r, int most) const;
   // Whether luma and chroma of n loop columns from x are in place, so that a strip may be as wide.
   bool PixelsLieInPlace(int32_t x, int32_t n) const;
+  // Where a row of the strip begins that consists of whole groups of packed 4:2:2; null when it
+  // does not, or not untransformed.
+  const uint8_t* Groups(int32_t r) const;
+  // Takes such a row apart, into luma and pairs of chroma.
+  PixelChroma ReadGroups(const uint8_t* groups, int32_t r, uint8_t* luma, uint8_t* pairs) const;
 
  private:
   // The two source lines, already filtered horizontally, that rows are blended from. An enlarged

@@ -42,31 +42,57 @@ struct Units {
   const uint8_t* At(int i) const { return start + ptrdiff_t{i} * unit; }
 };
 
-// Calls block(destinations, sources...) for each kBytes of n >= kBytes units. The last vector
-// reaches back over units that others do as well. Where one source is written over it is made
-// before them, in a copy.
-template <int kDstUnit, int kDsts, typename Block, typename... Sources>
+// Stores of wide vectors cost twice as much where they cross cache lines. Units of kUnit bytes from
+// `at` on, or below it, to the next address that a vector never crosses one from; 0 where there is
+// none, and for runs that are too short to gain from it.
+template <int kUnit>
+inline int UnitsToBoundary(const uint8_t* at, int n, bool below = false) {
+  if (kBytes < 32 || n < 4 * kBytes) return 0;
+  const int address = int(reinterpret_cast<uintptr_t>(at) & (kBytes - 1));
+  const int bytes = (below ? address : -address) & (kBytes - 1);
+  // A third of some bytes, modulo a power of two up to 128.
+  return kUnit == 3 ? bytes * 43 & (kBytes - 1) : bytes % kUnit == 0 ? bytes / kUnit : 0;
+}
+
+// Calls block(destinations, sources...) for each kBytes of n >= kBytes units. The second vector
+// begins where stores are aligned, within the first, and the last one reaches back: those units are
+// done twice. Where one source is written over the last vector is made before all others, in a
+// copy. (Each kTogether units are something whole.)
+template <int kDstUnit, int kTogether = 1, int kDsts, typename Block, typename... Sources>
 inline void ForRun(uint8_t* const (&dst)[kDsts], int n, const Block& block, Sources... sources) {
   uint8_t* at[kDsts];
   for (int d = 0; d < kDsts; ++d) at[d] = dst[d];
-  const int back = -n & (kBytes - 1);
-  const bool isCopied = back != 0 && ((sources.start == dst[0]) || ...);
+  const auto advance = [&](int units) {
+    for (int d = 0; d < kDsts; ++d) at[d] += units * kDstUnit;
+    ((sources.start += units * sources.unit), ...);
+    n -= units;
+  };
+  const bool inPlace = ((sources.start == dst[0]) || ...);
+  const bool isCopied = inPlace && n % kBytes != 0;
   uint8_t last[kDsts][kDstUnit * kBytes];
   if (isCopied) {
     uint8_t* into[kDsts];
     for (int d = 0; d < kDsts; ++d) into[d] = last[d];
     block(into, sources.At(n - kBytes)...);
   }
-  // (Pointers that move on cost nothing where loads and stores can move them.)
-  for (n -= kBytes; n >= 0; n -= kBytes) {
+  const int lead = inPlace ? 0 : UnitsToBoundary<kDstUnit>(dst[0], n);
+  if (lead != 0 && lead % kTogether == 0) {
     block(at, sources.start...);
-    for (int d = 0; d < kDsts; ++d) at[d] += kBytes * kDstUnit;
-    ((sources.start += kBytes * sources.unit), ...);
+    advance(lead);
   }
-  if (back == 0) return;
-  for (int d = 0; d < kDsts; ++d) at[d] -= back * kDstUnit;
-  if (!isCopied) return block(at, sources.At(-back)...);
-  for (int d = 0; d < kDsts; ++d) memcpy(at[d], last[d], sizeof(last[d]));
+  // (Pointers that move on cost nothing where loads and stores can move them.)
+  while (n >= kBytes) {
+    block(at, sources.start...);
+    advance(kBytes);
+  }
+  if (isCopied) {
+    for (int d = 0; d < kDsts; ++d) {
+      memcpy(at[d] + (n - kBytes) * kDstUnit, last[d], sizeof(last[d]));
+    }
+  } else if (n != 0) {
+    advance(n - kBytes);
+    block(at, sources.start...);
+  }
 }
 
 // ---- Resampling
@@ -147,7 +173,7 @@ void BlendPixelRows(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t w
                     int alphaByte, int n) {
   const Words weights = QuadWords(alphaByte, 0, int(weight));
   uint8_t* const dsts[] = {dst};
-  ForRun<1>(
+  ForRun<1, 4>(
       dsts, 4 * n,
       [=](uint8_t* const* out, const uint8_t* inA, const uint8_t* inB) {
         const WordsPair first = Widen(LoadBytes(inA));
@@ -826,13 +852,19 @@ struct PixelConversion {
   int pixel;  // bytes
   uint8_t alpha;
 
-  // The last vector reaches back over pixels that are done already: n is even where two pixels
-  // share chroma.
+  // The second vector begins where stores are aligned, and the last one reaches back: n is even
+  // where two pixels share chroma.
   void Convert(const PixelLines& lines, int n) const {
     if (kIsNarrowest && n < kBytes) return ConvertCopies(lines, n);
-    const int whole = n / kBytes * kBytes;
-    vectors(stage, lines, alpha, whole);
-    if (whole < n) vectors(stage, At(lines, n - kBytes), alpha, kBytes);
+    int lead = pixel == 4   ? UnitsToBoundary<4>(lines.dst, n)
+               : pixel == 3 ? UnitsToBoundary<3>(lines.dst, n)
+                            : UnitsToBoundary<2>(lines.dst, n);
+    if (IsHalf(layout) && lead % 2 != 0) lead = 0;
+    if (lead != 0) vectors(stage, lines, alpha, kBytes);
+    const PixelLines rest = At(lines, lead);
+    const int whole = (n - lead) / kBytes * kBytes;
+    vectors(stage, rest, alpha, whole);
+    if (lead + whole < n) vectors(stage, At(lines, n - kBytes), alpha, kBytes);
   }
 
  private:
@@ -1221,7 +1253,7 @@ void Deinterleave(uint8_t* a, uint8_t* b, const uint8_t* src, int n) {
 
 void SwapPairs(uint8_t* dst, const uint8_t* src, int n) {
   uint8_t* const dsts[] = {dst};
-  ForRun<1>(
+  ForRun<1, 2>(
       dsts, 2 * n,
       [](uint8_t* const* out, const uint8_t* in) {
         StoreBytes(out[0], SwapNeighbours(LoadBytes(in)));
@@ -1229,14 +1261,17 @@ void SwapPairs(uint8_t* dst, const uint8_t* src, int n) {
       Units{src, 1});
 }
 
+// n >= kBytes units downwards from the one at dst.
 template <int kUnit>
-int WriteReversed(uint8_t* dst, const uint8_t* src, int n) {
+void WriteReversed(uint8_t* dst, const uint8_t* src, int n) {
   constexpr int kUnits = kBytes / kUnit;
-  int i = 0;
-  for (; i + kUnits <= n; i += kUnits) {
+  const auto write = [=](int i) {
     StoreReversed<kUnit>(dst - ptrdiff_t{i + kUnits - 1} * kUnit, src + i * kUnit);
-  }
-  return i;
+  };
+  int i = UnitsToBoundary<kUnit>(dst + kUnit, n, true);
+  if (i != 0) write(0);
+  for (; i + kUnits <= n; i += kUnits) write(i);
+  if (i < n) write(n - kUnits);
 }
 
 void WritePixels(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int bytes, int n) {
@@ -1244,14 +1279,18 @@ void WritePixels(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int bytes, in
     memcpy(dst, src, size_t(n) * size_t(bytes));
     return;
   }
-  int i = 0;
-  if (step == -bytes) {
-    i = bytes == 1   ? WriteReversed<1>(dst, src, n)
-        : bytes == 2 ? WriteReversed<2>(dst, src, n)
-        : bytes == 4 ? WriteReversed<4>(dst, src, n)
-                     : 0;
+  if (step != -bytes || bytes == 3) return scalar::WritePixels(dst, step, src, bytes, n);
+  if (n < kBytes) {
+    return kIsNarrowest ? scalar::WritePixels(dst, step, src, bytes, n)
+                        : kNarrower.writePixels(dst, step, src, bytes, n);
   }
-  scalar::WritePixels(dst + i * step, step, src + ptrdiff_t{i} * bytes, bytes, n - i);
+  if (bytes == 1) {
+    WriteReversed<1>(dst, src, n);
+  } else if (bytes == 2) {
+    WriteReversed<2>(dst, src, n);
+  } else {
+    WriteReversed<4>(dst, src, n);
+  }
 }
 
 void WriteStrided(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int n) {
