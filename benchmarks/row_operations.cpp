@@ -22,7 +22,7 @@ using kestrel::RowOps;
 using kestrel::YuvToRgbForm;
 
 constexpr int kPixels = 1920;
-constexpr int kPairs = kestrel::PairPlan::kMost;
+constexpr int kPairs = 512;
 constexpr int kSquare = 64;  // side of what is transposed
 
 constexpr PixelFormat kRgba = {4, {8, 8, 8}, {0, 8, 16}, 3, true};
@@ -101,6 +101,7 @@ struct Runs {
     // Each with its right neighbour.
     for (int i = 0; i < kPairs; ++i) neighbours.push_back(scaled[size_t(i)] + 1);
     plan.n = kPairs;
+    plan.prepared = prepared.data();
     plan.first = scaled.data();
     plan.second = neighbours.data();
     plan.stride = 1;
@@ -127,6 +128,7 @@ struct Runs {
   std::vector<uint8_t> out[3];
   std::vector<int32_t> scaled, scaledPixels, nextPixels, neighbours;
   std::vector<uint16_t> weights;
+  std::vector<uint8_t> prepared = std::vector<uint8_t>(3 * kPairs);
   std::vector<uint8_t> blends = std::vector<uint8_t>(4 * kPairs);
   kestrel::PairPlan plan = {};
   kestrel::Carry carry = {{7, 3, 7}, {0, 0, 0}};

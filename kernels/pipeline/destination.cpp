@@ -120,12 +120,10 @@ Destination::Destination(const Job& job)
       tiles_(engine_.swapXY != 0 && exchange_ == LumaExchange::kNone),
       planes_{Plane(0), Plane(1), Plane(2)},
       chromaPairs_(FirstOfPairs()),
-      // A plane of YUV takes a quarter of what pixels may take, chroma pairs two quarters.
-      writers_{{planes_[0], engine_.dstLayout.code == CODE_RGB ? pixels_.bytes : 1, tiles_, buffer_,
-                rows_},
-               {planes_[chromaPairs_ == 0 ? 1 : chromaPairs_], chromaPairs_ == 0 ? 1 : 2, tiles_,
-                buffer_ + PlaneWriter::kTileSize, rows_},
-               {planes_[2], 1, tiles_, buffer_ + ptrdiff_t{2} * PlaneWriter::kTileSize, rows_}},
+      writers_{
+          {planes_[0], engine_.dstLayout.code == CODE_RGB ? pixels_.bytes : 1, tiles_, rows_},
+          {planes_[chromaPairs_ == 0 ? 1 : chromaPairs_], chromaPairs_ == 0 ? 1 : 2, tiles_, rows_},
+          {planes_[2], 1, tiles_, rows_}},
       order_(OrderOfPixels()) {
   if (pixels_.alphaByte >= 0 && engine_.pathKind == PATH_YUV_TO_RGB) {
     const int shift = 8 * pixels_.alphaByte;
@@ -144,6 +142,23 @@ Destination::Destination(const Job& job)
     fullShifts_.right[c] = 8 - bits;
     narrowedShifts_.right[c] = bits > 8 ? 8 - bits : 0;
   }
+}
+
+void Destination::TakeMemory(StripMemory* memory, int columns) {
+  if (hasChroma_) {
+    uColumns_ = vColumns_ = memory->Take<int32_t>(size_t(columns));
+    if (uOfLastColumn_ != vOfLastColumn_) vColumns_ = memory->Take<int32_t>(size_t(columns));
+  }
+  // Runs that are in place need none, unless one is copied to several rows.
+  const bool copies = engine_.stepY < 0x10000 && !hasChroma_;
+  const size_t size = !AllInPlace() || order_ != Order::kWalk ? size_t{ArrangedSamples::kSize}
+                      : copies ? size_t(columns) * size_t(writers_[0].unit())
+                               : 0;
+  buffer_ = memory->Take<uint8_t>(size);
+  if (buffer_ == nullptr) return;
+  // A plane of YUV takes a quarter of what pixels may take, chroma pairs two quarters.
+  for (int i = 0; i < 3; ++i)
+    writers_[i].SetBuffer(buffer_ + (AllInPlace() ? 0 : ptrdiff_t{i} * PlaneWriter::kTileSize));
 }
 
 // The kernel contract gives start addresses only; where they lie in the plane follows from the job
@@ -276,7 +291,7 @@ void Destination::SelectColumns(int32_t x, int n) {
     if (planes_[1].columns.Contains(chroma)) {
       if (chromaCount_ == 0) firstChroma_ = chroma;
       uColumns_[chromaCount_] = uOfLastColumn_ ? i : first;
-      vColumns_[chromaCount_] = vOfLastColumn_ ? i : first;
+      if (vColumns_ != uColumns_) vColumns_[chromaCount_] = vOfLastColumn_ ? i : first;
       ++chromaCount_;
     }
     first = i + 1;

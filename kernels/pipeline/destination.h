@@ -51,10 +51,11 @@ class PlaneWriter {
 
   static constexpr int kTileSize = kTileColumns * kTileRows;  // units
 
-  // `buffer` is for kTileSize units. The plane is not copied.
-  PlaneWriter(const DestinationPlane& plane, int unit, bool tiles, uint8_t* buffer,
-              const RowOps& rows)
-      : plane_(plane), rows_(rows), unit_(unit), tiles_(tiles), buffer_(buffer) {}
+  // The plane is not copied.
+  PlaneWriter(const DestinationPlane& plane, int unit, bool tiles, const RowOps& rows)
+      : plane_(plane), rows_(rows), unit_(unit), tiles_(tiles) {}
+  // For kTileSize units; or for a run that is copied, if runs are in place.
+  void SetBuffer(uint8_t* buffer) { buffer_ = buffer; }
   bool tiles() const { return tiles_; }
   int unit() const { return unit_; }
   ptrdiff_t rowStep() const { return plane_.rowStep; }
@@ -96,7 +97,7 @@ class PlaneWriter {
   const RowOps& rows_;
   int unit_;
   bool tiles_;
-  uint8_t* buffer_;
+  uint8_t* buffer_ = nullptr;
   int64_t column_ = 0, row_ = 0;  // of the tile's first run, or of the run that was started
   int n_ = 0;
   int started_ = 0;  // runs
@@ -115,12 +116,14 @@ class Destination {
 
   explicit Destination(const Job& job);
 
-  // Loop columns to select at once.
-  int stripWidth() const {
-    if (engine_.swapXY == 0) return kStrip;
+  // Loop columns that may be selected at once.
+  int widestStrip() const {
+    if (engine_.swapXY == 0) return kWidestStrip;
     return order_ == Order::kWalk ? PlaneWriter::kTileColumns : ArrangedSamples::kTurnedColumns;
   }
-  // Selects loop columns [x, x + n), n <= stripWidth().
+  // Before anything is selected: takes the memory for strips of some columns.
+  void TakeMemory(StripMemory* memory, int columns);
+  // Selects loop columns [x, x + n).
   void SelectColumns(int32_t x, int n);
 
   // YUV. Chroma is overwritten by every pixel of its block: only the last one in loop order counts,
@@ -131,9 +134,7 @@ class Destination {
   bool WritesU(int32_t r) const { return WritesChroma(r, uOfLastRow_); }
   bool WritesV(int32_t r) const { return WritesChroma(r, vOfLastRow_); }
   const int32_t* uColumns() const { return uColumns_; }
-  const int32_t* vColumns() const {
-    return uOfLastColumn_ == vOfLastColumn_ ? uColumns_ : vColumns_;
-  }
+  const int32_t* vColumns() const { return vColumns_; }
   int chromaCount() const { return chromaCount_; }
   // (Where packed 4:2:2 is written whole, luma is kept until the row's chroma comes.)
   void PutLuma(int32_t r, const uint8_t* luma);
@@ -239,13 +240,14 @@ class Destination {
   bool writesGroups_ = false;
   const uint8_t* heldLuma_ = nullptr;
   int chromaCount_ = 0;
-  int64_t firstChroma_ = 0;                      // plane column of the first chroma sample
-  int32_t uColumns_[kStrip], vColumns_[kStrip];  // columns of the strip
-  int firstPixel_ = 0, pixelEnd_ = 0;            // columns of the strip that are inside plane 0
+  int64_t firstChroma_ = 0;                            // plane column of the first chroma sample
+  int32_t *uColumns_ = nullptr, *vColumns_ = nullptr;  // columns of the strip
+  int firstPixel_ = 0, pixelEnd_ = 0;  // columns of the strip that are inside plane 0
   // Of all writers (planes of YUV share it), or of samples that are arranged.
-  uint8_t buffer_[ArrangedSamples::kSize];
-  static_assert(sizeof(buffer_) >= size_t{4} * PlaneWriter::kTileSize,
+  uint8_t* buffer_ = nullptr;
+  static_assert(ArrangedSamples::kSize >= 4 * PlaneWriter::kTileSize,
                 "pixels have up to four bytes");
+  static_assert(PlaneWriter::kTileSize >= kWidestStrip, "a run fits into the buffer");
 };
 
 }  // namespace kestrel

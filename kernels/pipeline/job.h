@@ -9,9 +9,9 @@
 
 namespace kestrel {
 
-// Pixels of a row that are handled at once. Everything a strip needs lives on the stack and stays
-// in the first-level cache.
+// Columns of a strip: any job has memory for kStrip of them, and none uses more than kWidestStrip.
 constexpr int kStrip = 512;
+constexpr int kWidestStrip = 2048;
 
 // Where a kernel's bytes differ, on purpose, from what the generic converter gives.
 enum Quirk : uint32_t {

@@ -17,11 +17,11 @@ class Pipeline {
         engine_(job.engine),
         source_(job),
         destination_(job),
+        stripWidth_(ShareMemory()),
         arranged_(rows_, destination_.arrangingMemory()),
         clampedCarry_(job.has(kClampedCarry) && (engine_.dither != 0 || !job.has(kCarryIfAsked))),
         dithers_(clampedCarry_ || (engine_.dither != 0 && engine_.pathKind == PATH_YUV_TO_RGB &&
                                    !job.has(kNoDither))) {
-    stripWidth_ = destination_.stripWidth();
     keepsPixels_ = KeepsPixels();
     readsPairs_ = engine_.pathKind == PATH_YUV_TO_YUV && source_.chromaPairs() != 0 &&
                   destination_.hasChroma() && !job_.has(kPairChroma);
@@ -57,15 +57,53 @@ class Pipeline {
   using PlaneRun = Destination::PlaneRun;
   using PixelOrder = Destination::Order;
 
-  // Samples of short rows that are converted at once, and rows that are mirrored at once.
+  // Samples of short rows that are converted at once,.
   static constexpr int kCollected = 2048;
-  static constexpr int kMirroredRows = ArrangedSamples::kPixels / kStrip;
 
   // Where a loop row of a plane is on both sides.
   struct PlaneRow {
     int32_t source;
     int64_t destination;
   };
+
+  // Shares out the memory, for strips as wide as the job or, where that is too wide, for strips of
+  // about the same width.
+  int32_t ShareMemory() {
+    const int32_t width = Width();
+    int32_t columns = destination_.widestStrip();
+    if (width <= columns) columns = width;
+    if (columns > kStrip) {
+      columns = WholeVectors(columns);
+      while (MemoryFor(columns) > StripMemory::kSize) columns -= 64;
+      const int32_t strips = (width + columns - 1) / columns;
+      columns = WholeVectors((width + strips - 1) / strips);
+    }
+    StripMemory memory(stripMemory_);
+    TakeMemory(&memory, columns);
+    return columns;
+  }
+  static int32_t WholeVectors(int32_t columns) { return (columns + 63) & ~63; }
+  size_t MemoryFor(int32_t columns) {
+    StripMemory counted(nullptr);
+    TakeMemory(&counted, columns);
+    return counted.taken();
+  }
+  void TakeMemory(StripMemory* memory, int32_t columns) {
+    source_.TakeMemory(memory, columns);
+    destination_.TakeMemory(memory, columns);
+    // Chroma of RGB is made of channels that are picked.
+    const bool makesChroma =
+        engine_.pathKind == PATH_RGB_TO_YUV || engine_.pathKind == PATH_YUV_TO_YUV;
+    const ptrdiff_t run = columns > kStrip ? columns : kStrip;
+    const ptrdiff_t runs = makesChroma ? 6 : 3;
+    const ptrdiff_t least = ptrdiff_t{3} * kCollected;
+    memory_ = memory->Take<uint8_t>(size_t(runs * run > least ? runs * run : least));
+    if (memory_ == nullptr) return;
+    for (int c = 0; c < 3; ++c) channels_[c] = memory_ + c * run;
+    luma_ = memory_ + 3 * run;
+    u_ = memory_ + 4 * run;
+    v_ = memory_ + 5 * run;
+  }
 
   int32_t Width() const { return job_.rect.right - job_.rect.left; }
   int StripWidth(int32_t x) const {
@@ -147,7 +185,7 @@ class Pipeline {
     mostRows_ = !inPlace           ? 1
                 : writer.inPlace() ? INT32_MAX
                 : destination_.pixelOrder() == PixelOrder::kMirrored
-                    ? kMirroredRows
+                    ? ArrangedSamples::kPixels / stripWidth_
                     : PlaneWriter::kTileSize / stripWidth_;
     for (int32_t r = job_.rect.top; r < job_.rect.bottom;) {
       int rows = 0;
@@ -548,7 +586,7 @@ class Pipeline {
       case PixelOrder::kTurnedBackwards:
         return TurnRows(r, most);
       case PixelOrder::kMirrored: {
-        if (most > kMirroredRows) most = kMirroredRows;
+        if (most > ArrangedSamples::kPixels / n_) most = ArrangedSamples::kPixels / n_;
         const SampleRows rows = ReadRows(r, most);
         const Destination::PixelRun run = destination_.PlacePixels(r, rows.rows);
         if (run.pixels != nullptr) {
@@ -832,6 +870,7 @@ class Pipeline {
     for (int32_t r = job_.rect.top; r < job_.rect.bottom; ++r) {
       const int32_t row = source_.SourceRow(r, 1);
       if (groups) {
+        if (!destination_.ContainsLumaRow(r)) continue;
         ConvertToGroups(destination_.GroupsAt(luma, chroma, r), lumaPixels + source_.pitch(0) * row,
                         luma.n);
         continue;
@@ -901,6 +940,11 @@ class Pipeline {
   const EngineContext& engine_;
   Source source_;
   Destination destination_;
+  // Runs of samples; or those of short rows, luma and then chroma.
+  uint8_t* memory_ = nullptr;
+  uint8_t* channels_[3] = {};
+  uint8_t *luma_ = nullptr, *u_ = nullptr, *v_ = nullptr;
+  int32_t stripWidth_;
   ArrangedSamples arranged_;
   bool clampedCarry_, dithers_;
   bool keepsPixels_;  // RGB to RGB of the same format
@@ -908,22 +952,16 @@ class Pipeline {
   kestrel::YuvToRgb colour_ = {};
   Carry carry_ = {};
   FieldShifts carryShifts_ = {};
-  int32_t stripWidth_ = 0;
   int32_t mostRows_ = INT32_MAX;  // to convert at once
   int n_ = 0;
   bool lumaDone_ = false, chromaDone_ = false;  // by CopyPlanes
   // From each column of the strip that decides chroma to the next; 0 when it varies.
   int uStep_ = 0, vStep_ = 0;
   bool chromaOfSeconds_ = false;  // every pixel, or the second of each two, decides
-  // Runs of samples; or those of short rows, luma and then chroma.
-  uint8_t memory_[3 * kCollected];
-  uint8_t* const channels_[3] = {memory_, memory_ + kStrip, memory_ + ptrdiff_t{2} * kStrip};
-  uint8_t* const luma_ = memory_ + ptrdiff_t{3} * kStrip;
-  uint8_t* const u_ = memory_ + ptrdiff_t{4} * kStrip;
-  uint8_t* const v_ = memory_ + ptrdiff_t{5} * kStrip;
+  alignas(64) uint8_t stripMemory_[StripMemory::kSize];
 };
 
-static_assert(sizeof(Pipeline) < size_t{50} * 1024, "camera threads have small stacks");
+static_assert(sizeof(Pipeline) < size_t{54} * 1024, "camera threads have small stacks");
 
 }  // namespace
 

@@ -27,6 +27,11 @@ void SampleColumns::Plan(const RowOps& rows) {
   rows.planPairs(plan);
 }
 
+void SampleColumns::PlanApart(int32_t apart, const RowOps& rows) {
+  plan->apart = apart;
+  PlanWith(nullptr, nullptr, rows);
+}
+
 void SampleColumns::PlanWith(const int32_t* second, const uint16_t* weights, const RowOps& rows) {
   plan->n = n;
   plan->first = offset;
@@ -53,9 +58,65 @@ Source::Source(const Job& job)
   chromaU_.step = chromaV_.step = layout.step[1];
   first_.plan = &firstPlan_;
   chromaU_.plan = &chromaPlan_;
-  if (layout.code == CODE_GRAY8) {
-    memset(u_, 128, sizeof(u_));
-    memset(v_, 128, sizeof(v_));
+}
+
+int Source::ChromaOf(int columns) const {
+  const EngineContext& c = job_.engine;
+  if (c.pathKind == PATH_YUV_TO_RGB) return columns;
+  const bool hasChroma = c.pathKind == PATH_YUV_TO_YUV && c.dstLayout.code != CODE_GRAY8;
+  // A strip may begin and end within samples of chroma.
+  return !hasChroma ? 0 : c.dstSubsample[1] >= 2 ? columns / 2 + 2 : columns;
+}
+
+void Source::TakeMemory(StripMemory* memory, int columns) {
+  const auto blocks = [](int n) {
+    return size_t((n + PairPlan::kBlock - 1) / PairPlan::kBlock * PairPlan::kBlock);
+  };
+  // n columns in each of some pieces, which follow each other.
+  const auto takePieces = [=](auto& pieces, size_t n) {
+    uint8_t* const all = memory->Take<uint8_t>(n * (sizeof(pieces) / sizeof(pieces[0])));
+    size_t i = 0;
+    for (uint8_t*& piece : pieces) piece = all == nullptr ? nullptr : all + n * i++;
+  };
+  const EngineContext& c = job_.engine;
+  const size_t n = size_t(columns);
+  const bool blends = c.bilinear != 0 && !job_.has(kNearestOnly);
+  const bool isRgb = c.srcLayout.code == CODE_RGB;
+  first_.offset = memory->Take<int32_t>(n);
+  if (blends) {
+    second_.offset = memory->Take<int32_t>(n);
+    weights_ = memory->Take<uint16_t>(n);
+  }
+  if (isRgb) {
+    for (Line& line : lines_) takePieces(line.samples, n);
+    packed_ = memory->Take<uint8_t>(n * size_t(palette_ != nullptr ? 1 : pixels_.bytes));
+    if (blends) {
+      takePieces(scratch_, n);
+      takePieces(blended_, n);
+    }
+    if (pixels_.bytes == 2) firstPlan_.prepared = memory->Take<uint8_t>(3 * blocks(columns));
+    return;
+  }
+  firstPlan_.prepared = memory->Take<uint8_t>(3 * blocks(blends ? columns : columns / 2));
+  for (Line& line : lines_) line.samples[0] = memory->Take<uint8_t>(n);
+  if (blends) {
+    firstPlan_.blends = memory->Take<uint8_t>(4 * blocks(columns));
+    blended_[0] = memory->Take<uint8_t>(n);
+  }
+  const int chroma = ChromaOf(columns);
+  const bool toPixels = c.pathKind == PATH_YUV_TO_RGB;
+  if (c.srcLayout.code == CODE_GRAY8) {
+    u_ = v_ = memory->Take<uint8_t>(size_t(chroma));
+    if (u_ != nullptr) memset(u_, 128, size_t(chroma));
+    return;
+  }
+  chromaU_.offset = memory->Take<int32_t>(size_t(chroma));
+  if (job_.has(kPairChroma)) chromaV_.offset = memory->Take<int32_t>(size_t(chroma));
+  chromaPlan_.prepared = memory->Take<uint8_t>(3 * blocks(chroma));
+  if (toPixels) packed_ = memory->Take<uint8_t>(2 * n);
+  if (!toPixels || c.dither != 0 || job_.has(kClampedCarry)) {
+    u_ = memory->Take<uint8_t>(size_t(chroma));
+    v_ = memory->Take<uint8_t>(size_t(chroma));
   }
 }
 
@@ -73,29 +134,27 @@ void Source::SelectColumns(int32_t x, int n) {
   for (int i = 0; i < n; ++i) {
     const Taps taps = columnPositions_.At(x + i);
     first_.Set(i, taps.first ^ exchange);
+    if (weights_ == nullptr) continue;
     second_.Set(i, taps.second ^ exchange);
     weights_[i] = taps.weight;
     if (taps.weight != 0) interpolates_ = true;
   }
   first_.Finish(n);
-  second_.Finish(n);
+  if (interpolates_) second_.Finish(n);
   if (job_.engine.srcLayout.code == CODE_RGB) {
     // Pixels are gathered whole; those of two bytes are pairs of them.
-    if (pixels_.bytes != 2 || interpolates_ || palette_ != nullptr) return;
-    int32_t* const second = chromaU_.offset;
-    for (int i = 0; i < n; ++i) second[i] = first_.offset[i] + 1;
-    first_.PlanWith(second, nullptr, rows_);
+    if (pixels_.bytes == 2 && !interpolates_ && palette_ == nullptr) first_.PlanApart(1, rows_);
     return;
   }
   if (!interpolates_) {
     first_.Plan(rows_);
   } else {
-    firstPlan_.blends = blends_;
     first_.PlanWith(second_.offset, weights_, rows_);
   }
 }
 
 void Source::SelectChroma(int32_t x, const int32_t* uColumns, const int32_t* vColumns, int n) {
+  if (job_.engine.srcLayout.code == CODE_GRAY8) return;
   sharesColumns_ = uColumns == vColumns;
   const auto select = [=](SampleColumns* chroma, const int32_t* columns) {
     for (int i = 0; i < n; ++i) {
@@ -111,9 +170,7 @@ void Source::SelectChroma(int32_t x, const int32_t* uColumns, const int32_t* vCo
 void Source::SelectChromaPairs(int32_t x, const int32_t* columns, int n) {
   for (int i = 0; i < n; ++i) chromaU_.Set(i, ChromaColumn(x + columns[i]));
   chromaU_.Finish(n);
-  if (chromaU_.contiguous) return;
-  for (int i = 0; i < n; ++i) chromaV_.offset[i] = chromaU_.offset[i] + 1;
-  chromaU_.PlanWith(chromaV_.offset, nullptr, rows_);
+  if (!chromaU_.contiguous) chromaU_.PlanApart(1, rows_);
 }
 
 const uint8_t* Source::ChromaPairs(int32_t r, uint8_t* into) {
@@ -149,9 +206,8 @@ void Source::SelectPixelChroma(int32_t x, int n) {
       vFromU < chromaU_.step && -vFromU < chromaU_.step && job_.srcPitches[1] == job_.srcPitches[2];
   if (grouped) {
     pixelChroma_ = PixelChromaRead::kPairs;
-    for (int i = 0; i < n; ++i) chromaV_.offset[i] = chromaU_.offset[i] + int32_t(vFromU);
     chromaU_.n = n;
-    chromaU_.PlanWith(chromaV_.offset, nullptr, rows_);
+    chromaU_.PlanApart(int32_t(vFromU), rows_);
   } else {
     pixelChroma_ = PixelChromaRead::kGathered;
     chromaU_.Finish(n);

@@ -4,6 +4,7 @@
 
 #include "kernels/pipeline/job.h"
 #include "kernels/pipeline/positions.h"
+#include "kernels/pipeline/strip_memory.h"
 
 namespace kestrel {
 
@@ -11,16 +12,18 @@ namespace kestrel {
 // all its rows.
 struct SampleColumns {
   int n = 0;
-  ptrdiff_t step = 1;        // bytes between neighbouring samples of the row
-  bool contiguous = false;   // offsets rise by exactly `step`
-  int32_t offset[kStrip];    // bytes from the start of the row
-  PairPlan* plan = nullptr;  // unless contiguous: how they are read, if there is room for that
+  ptrdiff_t step = 1;         // bytes between neighbouring samples of the row
+  bool contiguous = false;    // offsets rise by exactly `step`
+  int32_t* offset = nullptr;  // bytes from the start of the row
+  PairPlan* plan = nullptr;   // unless contiguous: how they are read, if there is room for that
 
   void Set(int i, int64_t sample) { offset[i] = int32_t(sample * step); }
   void Finish(int count);
   void Plan(const RowOps& rows);
   // Pairs of each column's sample and another, with weights or null.
   void PlanWith(const int32_t* second, const uint16_t* weights, const RowOps& rows);
+  // Pairs of each column's sample and the one so many bytes after it.
+  void PlanApart(int32_t apart, const RowOps& rows);
 };
 
 // A run of channel values; points into the strip's buffers or straight into the source.
@@ -48,8 +51,10 @@ struct SampleRows {
 class Source {
  public:
   explicit Source(const Job& job);
+  // Before anything is selected: takes the memory for strips of some columns.
+  void TakeMemory(StripMemory* memory, int columns);
 
-  // Selects loop columns [x, x + n), n <= kStrip, for Luma and Rgb.
+  // Selects loop columns [x, x + n) for Luma and Rgb.
   void SelectColumns(int32_t x, int n);
   // Selects the loop columns whose U and V are wanted, relative to x; null for the first n.
   void SelectChroma(int32_t x, const int32_t* uColumns, const int32_t* vColumns, int n);
@@ -118,7 +123,7 @@ class Source {
     int32_t row;
     const uint8_t* channel[3];  // into `samples`, or into the source
     const uint8_t* alpha;
-    uint8_t samples[4][kStrip];  // channels and alpha, or packed pixels
+    uint8_t* samples[4];  // channels and alpha, or packed pixels, in one piece
   };
 
   const uint8_t* RowStart(int plane, int32_t row) const {
@@ -128,6 +133,8 @@ class Source {
                              const SampleColumns& columns) const;
   void ReadPixels(uint8_t* const rgb[3], const uint8_t* row, const SampleColumns& columns);
   int32_t ChromaColumn(int32_t x) const;
+  // Samples of chroma that a strip may have.
+  int ChromaOf(int columns) const;
   const uint8_t* Chroma(int plane, int32_t r, const SampleColumns& columns, uint8_t* buffer);
   // Whether a loop row is between two source rows.
   bool BlendsRows(int32_t r) const;
@@ -156,15 +163,14 @@ class Source {
   SampleColumns first_, second_, chromaU_, chromaV_;
   PairPlan firstPlan_, chromaPlan_;
   bool sharesColumns_ = false;  // U and V
-  uint16_t weights_[kStrip];
-  uint8_t blends_[4 * kStrip];  // of firstPlan_, where the strip interpolates
+  uint16_t* weights_ = nullptr;
   PixelChromaRead pixelChroma_ = PixelChromaRead::kGrey;
   int chromaCount_ = 0, phase_ = 0, shift_ = 0;
   Line lines_[2];
-  uint8_t scratch_[3][kStrip];  // second taps
-  uint8_t packed_[4 * kStrip];  // gathered pixels, or pairs of chroma samples
-  uint8_t blended_[4][kStrip];  // channels, or packed pixels
-  uint8_t u_[kStrip], v_[kStrip];
+  uint8_t* scratch_[3] = {};   // second taps
+  uint8_t* packed_ = nullptr;  // gathered pixels, or pairs of chroma samples
+  uint8_t* blended_[4] = {};   // channels, or packed pixels, in one piece
+  uint8_t *u_ = nullptr, *v_ = nullptr;
 };
 
 }  // namespace kestrel

@@ -97,19 +97,25 @@ struct LevelMap {
 // For each of n pairs of bytes where they come from, and what an instruction set prepares of that
 // for itself. The lists are the caller's: byte offsets from the start of a row.
 struct PairPlan {
-  static constexpr int kMost = 512;
+  static constexpr int kBlock = 64;  // of pairs
   int n = 0;
   const int32_t* first = nullptr;  // of pair i: first[i * stride], second[i * stride]
   const int32_t* second = nullptr;
+  int32_t apart = 0;  // without `second`: from each first byte to the second
   int stride = 1;
   const uint16_t* weights = nullptr;  // for blendPairs: a weight for each pair
-  uint8_t* blends = nullptr;          // and memory: four bytes for each, in whole blocks of 64
+  // Memory for what is prepared, in whole blocks: 3 bytes for each pair, and 4 for each that has a
+  // weight.
+  uint8_t* prepared = nullptr;
+  uint8_t* blends = nullptr;
+
+  int32_t First(int i) const { return first[i * stride]; }
+  int32_t Second(int i) const { return second != nullptr ? second[i * stride] : First(i) + apart; }
 
   // Of each eight pairs: one or two windows of 16 bytes, for all or for half of them, or -1 where
   // there is none, and where in the windows their bytes are; by blocks as vectors take them.
-  int windows;      // of each eight
-  bool hasWindows;  // everywhere
-  uint8_t prepared[3 * kMost];
+  int windows = 0;          // of each eight
+  bool hasWindows = false;  // everywhere
 };
 
 // Byte offsets of two neighbouring pixels, and the weight of the second.
@@ -141,7 +147,7 @@ struct KestrelRowOps {
   void (*gather)(uint8_t* dst, const uint8_t* src, const int32_t* offsets, int n);
   // Pixels of `bytes` bytes at src + offsets[i], packed together.
   void (*gatherPixels)(uint8_t* dst, const uint8_t* src, const int32_t* offsets, int bytes, int n);
-  // Prepares a plan whose n (at most kMost) and lists are set, and, if it has weights, its memory.
+  // Prepares a plan whose n, lists and memory are set.
   void (*planPairs)(kestrel::PairPlan* plan);
   // The first and second bytes of pairs in turn.
   void (*readPairs)(uint8_t* dst, const uint8_t* src, const kestrel::PairPlan& plan);

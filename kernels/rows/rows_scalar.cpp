@@ -91,8 +91,8 @@ void PlanPairs(PairPlan*) {}
 
 void ReadSomePairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan, int i, int end) {
   for (; i < end; ++i) {
-    dst[2 * i] = src[plan.first[i * plan.stride]];
-    dst[2 * i + 1] = src[plan.second[i * plan.stride]];
+    dst[2 * i] = src[plan.First(i)];
+    dst[2 * i + 1] = src[plan.Second(i)];
   }
 }
 
@@ -102,8 +102,7 @@ void ReadPairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan) {
 
 void BlendSomePairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan, int i, int end) {
   for (; i < end; ++i) {
-    dst[i] =
-        Blend(src[plan.first[i * plan.stride]], src[plan.second[i * plan.stride]], plan.weights[i]);
+    dst[i] = Blend(src[plan.First(i)], src[plan.Second(i)], plan.weights[i]);
   }
 }
 

@@ -235,9 +235,9 @@ bool PlanWindows(PairPlan* plan, int32_t lowest, int32_t end) {
     const int eight = i % kPairs / 8;
     const int first = FirstPairOf(*plan, i / kPairs) + 8 * eight;
     for (int k = 0; k < 8; ++k) {
-      const int pair = (first + k < plan->n ? first + k : plan->n - 1) * plan->stride;
-      offsets[2 * k] = plan->first[pair];
-      offsets[2 * k + 1] = plan->second[pair];
+      const int pair = first + k < plan->n ? first + k : plan->n - 1;
+      offsets[2 * k] = plan->First(pair);
+      offsets[2 * k + 1] = plan->Second(pair);
     }
     uint8_t* const block = plan->prepared + 3 * (i - i % kPairs);
     uint8_t at[16];
@@ -260,7 +260,7 @@ void PlanPairs(PairPlan* plan) {
   int32_t lowest = INT32_MAX;
   int32_t end = 0;
   for (int i = 0; i < plan->n; ++i) {
-    const int32_t offsets[2] = {plan->first[i * plan->stride], plan->second[i * plan->stride]};
+    const int32_t offsets[2] = {plan->First(i), plan->Second(i)};
     for (const int32_t offset : offsets) {
       if (offset < lowest) lowest = offset;
       if (offset >= end) end = offset + 1;

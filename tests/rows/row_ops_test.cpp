@@ -29,6 +29,7 @@ using testing_support::GuardedBuffer;
 // Every length as far as two of the widest vectors and a rest, then some of several vectors.
 constexpr int kLongestOfAll = 130;
 constexpr int kLongest = 260;
+constexpr int kLongestPlan = 2048;
 constexpr int NextLength(int n) {
   return n < kLongestOfAll ? n + 1 : n + 13;
 }
@@ -288,7 +289,7 @@ void GatherPixels(Trial* trial, const RowOps& ops, int n, int variant) {
 // The sources of pairs: both lists in one, or each by itself. The longest run is a whole plan.
 struct Pairs {
   Pairs(Trial* trial, int n, int variant) {
-    plan.n = n == kLongest ? PairPlan::kMost : n;
+    plan.n = n == kLongest ? kLongestPlan : n;
     const int32_t size = trial->random().Between(1, 2 * plan.n + 1);
     src = trial->Source(size_t(size));
     std::vector<int32_t> first = DrawOffsets(trial, plan.n, variant % 3, size);
@@ -297,7 +298,17 @@ struct Pairs {
       std::transform(first.begin(), first.end(), second.begin(),
                      [size](int32_t offset) { return std::min(offset + 1, size - 1); });
     }
-    if (variant < 3) {
+    prepared.resize(size_t(3) * WholeBlocks(plan.n));
+    plan.prepared = prepared.data();
+    if (variant < 3 && trial->random().Percent(30)) {
+      plan.stride = 1;
+      const int32_t most = std::min(2, size - 1);
+      plan.apart = trial->random().Between(-most, most);
+      std::transform(first.begin(), first.end(), first.begin(), [this, size](int32_t offset) {
+        return std::clamp(offset, std::max(0, -plan.apart), size - 1 - std::max(0, plan.apart));
+      });
+      plan.first = trial->Source(first);
+    } else if (variant < 3) {
       plan.stride = 1;
       plan.first = trial->Source(first);
       plan.second = trial->Source(second);
@@ -311,10 +322,17 @@ struct Pairs {
       plan.second = plan.first + 1;
     }
   }
+  static size_t WholeBlocks(int n) {
+    return size_t((n + PairPlan::kBlock - 1) / PairPlan::kBlock * PairPlan::kBlock);
+  }
   uint8_t First(ptrdiff_t i) const { return src[plan.first[i * plan.stride]]; }
-  uint8_t Second(ptrdiff_t i) const { return src[plan.second[i * plan.stride]]; }
+  uint8_t Second(ptrdiff_t i) const {
+    return plan.second != nullptr ? src[plan.second[i * plan.stride]]
+                                  : src[plan.first[i * plan.stride] + plan.apart];
+  }
 
   PairPlan plan{};
+  std::vector<uint8_t> prepared;
   const uint8_t* src;
 };
 
