@@ -65,7 +65,6 @@ inline void ForRun(uint8_t* const (&dst)[kDsts], int n, const Block& block, Sour
   const auto advance = [&](int units) {
     for (int d = 0; d < kDsts; ++d) at[d] += units * kDstUnit;
     ((sources.start += units * sources.unit), ...);
-    n -= units;
   };
   const bool inPlace = ((sources.start == dst[0]) || ...);
   const bool isCopied = inPlace && n % kBytes != 0;
@@ -79,18 +78,21 @@ inline void ForRun(uint8_t* const (&dst)[kDsts], int n, const Block& block, Sour
   if (lead != 0 && lead % kTogether == 0) {
     block(at, sources.start...);
     advance(lead);
+    n -= lead;
   }
   // (Pointers that move on cost nothing where loads and stores can move them.)
-  while (n >= kBytes) {
+  int vectors = n / kBytes;
+  do {
     block(at, sources.start...);
     advance(kBytes);
-  }
+  } while (--vectors != 0);
+  const int rest = n % kBytes;
   if (isCopied) {
     for (int d = 0; d < kDsts; ++d) {
-      memcpy(at[d] + (n - kBytes) * kDstUnit, last[d], sizeof(last[d]));
+      memcpy(at[d] + (rest - kBytes) * kDstUnit, last[d], sizeof(last[d]));
     }
-  } else if (n != 0) {
-    advance(n - kBytes);
+  } else if (rest != 0) {
+    advance(rest - kBytes);
     block(at, sources.start...);
   }
 }
