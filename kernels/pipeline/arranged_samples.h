@@ -10,12 +10,22 @@ namespace kestrel {
 
 class ArrangedSamples {
  public:
-  // Pixels of a block, when each may have its own samples of chroma. Twice as many can be turned
-  // where four share them.
-  static constexpr int kPixels = 64 * 64;
+  // A block of pixels to be turned, when each may have its own samples of chroma. Twice as many
+  // rows can be turned where four pixels share them.
+  // Preparing a row of a block costs as much as many pixels, and wide blocks have fewer rows; but
+  // long vectors want long rows of what was turned, and fewer of them at once in the caches.
+#ifdef __x86_64__
   static constexpr int kTurnedColumns = 128;
+  static constexpr int kTurnedRows = 64;
+#else
+  static constexpr int kTurnedColumns = 256;
+  static constexpr int kTurnedRows = 48;
+#endif
+  // Pixels to be mirrored at once.
+  static constexpr int kMirrored = 4096;
   // Bytes. (A run may begin and end in the middle of a sample of chroma.)
-  static constexpr int kSize = 3 * kPixels + 2 * kTurnedColumns;
+  static constexpr int kTurnedSize = 3 * kTurnedColumns * kTurnedRows + 2 * kTurnedColumns;
+  static constexpr int kMirroredSize = 3 * kMirrored + 2 * kMirrored / 16;
 
   ArrangedSamples(const RowOps& rows, uint8_t* memory) : rows_(rows), memory_(memory) {}
 
@@ -25,7 +35,9 @@ class ArrangedSamples {
   // Rows that share chroma are the only ones of their block; backwards they are one, or an even
   // number. All rows of a block have chroma of the same layout.
   void Append(const SampleRows& in);
-  int count() const { return count_; }
+  int count() const {
+    return count_;
+  }
   // What was collected: n rows of count() pixels.
   SampleRows turned() const;
 
@@ -34,7 +46,9 @@ class ArrangedSamples {
 
  private:
   // Of chroma, in the block: samples of a row.
-  int chromaMost() const { return most_ >> chroma_.rows.rowShift; }
+  int chromaMost() const {
+    return most_ >> chroma_.rows.rowShift;
+  }
 
   const RowOps& rows_;
   uint8_t* memory_;

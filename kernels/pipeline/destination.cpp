@@ -144,17 +144,28 @@ Destination::Destination(const Job& job)
   }
 }
 
+int Destination::BufferSize(int columns) const {
+  // Dithered pixels are gathered in tiles in any order.
+  constexpr int kPixels = 4 * PlaneWriter::kTileSize;
+  switch (order_) {
+    case Order::kTurned:
+    case Order::kTurnedBackwards:
+      return ArrangedSamples::kTurnedSize;
+    case Order::kMirrored:
+      return ArrangedSamples::kMirroredSize;
+    default:
+      if (!AllInPlace()) return kPixels;
+      // Runs that are in place need none, unless one is copied to several rows.
+      return engine_.stepY < 0x10000 && !hasChroma_ ? columns * writers_[0].unit() : 0;
+  }
+}
+
 void Destination::TakeMemory(StripMemory* memory, int columns) {
   if (hasChroma_) {
     uColumns_ = vColumns_ = memory->Take<int32_t>(size_t(columns));
     if (uOfLastColumn_ != vOfLastColumn_) vColumns_ = memory->Take<int32_t>(size_t(columns));
   }
-  // Runs that are in place need none, unless one is copied to several rows.
-  const bool copies = engine_.stepY < 0x10000 && !hasChroma_;
-  const size_t size = !AllInPlace() || order_ != Order::kWalk ? size_t{ArrangedSamples::kSize}
-                      : copies ? size_t(columns) * size_t(writers_[0].unit())
-                               : 0;
-  buffer_ = memory->Take<uint8_t>(size);
+  buffer_ = memory->Take<uint8_t>(size_t(BufferSize(columns)));
   if (buffer_ == nullptr) return;
   // A plane of YUV takes a quarter of what pixels may take, chroma pairs two quarters.
   for (int i = 0; i < 3; ++i)

@@ -201,6 +201,7 @@ class Destination {
   enum class LumaExchange { kNone, kColumns, kRows };
 
   DestinationPlane Plane(int i) const;
+  int BufferSize(int columns) const;
   int FirstOfPairs() const;
   Order OrderOfPixels() const;
   bool IsInside(int64_t row, int rows) const {
@@ -245,8 +246,6 @@ class Destination {
   int firstPixel_ = 0, pixelEnd_ = 0;  // columns of the strip that are inside plane 0
   // Of all writers (planes of YUV share it), or of samples that are arranged.
   uint8_t* buffer_ = nullptr;
-  static_assert(ArrangedSamples::kSize >= 4 * PlaneWriter::kTileSize,
-                "pixels have up to four bytes");
   static_assert(PlaneWriter::kTileSize >= kWidestStrip, "a run fits into the buffer");
 };
 

@@ -96,7 +96,12 @@ class Pipeline {
         engine_.pathKind == PATH_RGB_TO_YUV || engine_.pathKind == PATH_YUV_TO_YUV;
     const ptrdiff_t run = columns > kStrip ? columns : kStrip;
     const ptrdiff_t runs = makesChroma ? 6 : 3;
-    const ptrdiff_t least = ptrdiff_t{3} * kCollected;
+    constexpr ptrdiff_t least = ptrdiff_t{3} * kCollected;
+    // For a column no job takes more than 44 bytes besides, and none that turns YUV more than 32.
+    static_assert(StripMemory::kSize >= ArrangedSamples::kTurnedSize + least +
+                                            32 * ArrangedSamples::kTurnedColumns &&
+                      StripMemory::kSize >= ArrangedSamples::kMirroredSize + least + 44 * kStrip,
+                  "there is room for the narrowest strips");
     memory_ = memory->Take<uint8_t>(size_t(runs * run > least ? runs * run : least));
     if (memory_ == nullptr) return;
     for (int c = 0; c < 3; ++c) channels_[c] = memory_ + c * run;
@@ -185,7 +190,7 @@ class Pipeline {
     mostRows_ = !inPlace           ? 1
                 : writer.inPlace() ? INT32_MAX
                 : destination_.pixelOrder() == PixelOrder::kMirrored
-                    ? ArrangedSamples::kPixels / stripWidth_
+                    ? ArrangedSamples::kMirrored / stripWidth_
                     : PlaneWriter::kTileSize / stripWidth_;
     for (int32_t r = job_.rect.top; r < job_.rect.bottom;) {
       int rows = 0;
@@ -586,7 +591,7 @@ class Pipeline {
       case PixelOrder::kTurnedBackwards:
         return TurnRows(r, most);
       case PixelOrder::kMirrored: {
-        if (most > ArrangedSamples::kPixels / n_) most = ArrangedSamples::kPixels / n_;
+        if (most > ArrangedSamples::kMirrored / n_) most = ArrangedSamples::kMirrored / n_;
         const SampleRows rows = ReadRows(r, most);
         const Destination::PixelRun run = destination_.PlacePixels(r, rows.rows);
         if (run.pixels != nullptr) {
@@ -658,7 +663,7 @@ class Pipeline {
 
   // Quarter turns, a block of rows at a time.
   int TurnRows(int32_t r, int most) {
-    constexpr int kRows = ArrangedSamples::kPixels / ArrangedSamples::kTurnedColumns;
+    constexpr int kRows = ArrangedSamples::kTurnedRows;
     const bool backwards = destination_.pixelOrder() == PixelOrder::kTurnedBackwards;
     const int shared = RowsSharingChroma(r, most < 2 * kRows ? most : 2 * kRows);
     if (shared > 1) {

@@ -272,10 +272,9 @@ bool Source::PixelsLieInPlace(int32_t x, int32_t n) const {
          LumaLiesInPlace(x, n);
 }
 
-const uint8_t* Source::Groups(int32_t r) const {
-  if (pixelChroma_ != PixelChromaRead::kStrided || chromaU_.step != 4 || first_.step != 2 ||
-      !first_.contiguous || phase_ != 0 || first_.n != 2 * chromaCount_ ||
-      job_.engine.stepY != 0x10000) {
+const uint8_t* Source::FindGroups(int32_t r) const {
+  if (chromaU_.step != 4 || first_.step != 2 || !first_.contiguous || phase_ != 0 ||
+      first_.n != 2 * chromaCount_ || job_.engine.stepY != 0x10000) {
     return nullptr;
   }
   const int32_t row = SourceRow(r, 1);
@@ -394,30 +393,31 @@ void Source::FillRgbLine(Line* line, int32_t row) {
   for (int c = 0; c < 3; ++c) rows_.blendColumns(rgb[c], rgb[c], second[c], weights_, first_.n);
 }
 
-Source::Line* Source::FetchLine(int32_t row, const Line* keep, Fill fill) {
-  for (Line& line : lines_) {
-    if (line.row == row) return &line;
-  }
-  Line* line = keep == &lines_[0] ? &lines_[1] : &lines_[0];
-  (this->*fill)(line, row);
-  line->row = row;
-  return line;
-}
-
 void Source::FetchLines(int32_t r, Fill fill, Line** first, Line** second, uint16_t* weight) {
   const Taps taps = rowPositions_.At(r, 1);
+  const auto refill = [=](Line* line, int32_t row) {
+    (this->*fill)(line, row);
+    line->row = row;
+  };
+  Line* a = &lines_[0];
+  Line* b = &lines_[1];
+  if (a->row != taps.first) {
+    a = &lines_[1];
+    b = &lines_[0];
+    if (a->row != taps.first) {
+      // The line that the second tap is about to use must survive fetching the first.
+      if (a->row == taps.second) {
+        a = &lines_[0];
+        b = &lines_[1];
+      }
+      refill(a, taps.first);
+    }
+  }
+  *first = *second = a;
   *weight = taps.first == taps.second ? uint16_t{0} : taps.weight;
-  if (*weight == 0) {
-    *first = *second = FetchLine(taps.first, nullptr, fill);
-    return;
-  }
-  // A line that the second tap is about to reuse must survive fetching the first.
-  const Line* reused = nullptr;
-  for (const Line& line : lines_) {
-    if (line.row == taps.second) reused = &line;
-  }
-  *first = FetchLine(taps.first, reused, fill);
-  *second = FetchLine(taps.second, *first, fill);
+  if (*weight == 0) return;
+  if (b->row != taps.second) refill(b, taps.second);
+  *second = b;
 }
 
 const uint8_t* Source::Luma(int32_t r, uint8_t* into) {

@@ -112,7 +112,9 @@ class Source {
   bool PixelsLieInPlace(int32_t x, int32_t n) const;
   // Where a row of the strip begins that consists of whole groups of packed 4:2:2; null when it
   // does not, or not untransformed.
-  const uint8_t* Groups(int32_t r) const;
+  const uint8_t* Groups(int32_t r) const {
+    return pixelChroma_ == PixelChromaRead::kStrided ? FindGroups(r) : nullptr;
+  }
   // Takes such a row apart, into luma and pairs of chroma.
   PixelChroma ReadGroups(const uint8_t* groups, int32_t r, uint8_t* luma, uint8_t* pairs) const;
 
@@ -132,6 +134,7 @@ class Source {
   const uint8_t* ReadSamples(uint8_t* buffer, const uint8_t* row,
                              const SampleColumns& columns) const;
   void ReadPixels(uint8_t* const rgb[3], const uint8_t* row, const SampleColumns& columns);
+  const uint8_t* FindGroups(int32_t r) const;
   int32_t ChromaColumn(int32_t x) const;
   // Samples of chroma that a strip may have.
   int ChromaOf(int columns) const;
@@ -142,7 +145,6 @@ class Source {
   void FillRgbLine(Line* line, int32_t row);
   void FillPixelLine(Line* line, int32_t row);
   using Fill = void (Source::*)(Line*, int32_t);
-  Line* FetchLine(int32_t row, const Line* keep, Fill fill);
   // Both lines of a loop row, or the same one twice when only the first counts.
   void FetchLines(int32_t r, Fill fill, Line** first, Line** second, uint16_t* weight);
 

@@ -803,45 +803,53 @@ struct StageFor<YuvToRgbForm::kSixBits, false> {
   using Stage = SixBitStage;
 };
 
-// n pixels of each row, whole vectors of them.
+// n pixels of each row, whole vectors of them. Rows can be as short as a vector: what is done for
+// each is as little as possible.
 template <YuvToRgbForm kForm, ChromaLayout kLayout, int kPixel>
 void ConvertVectors(const void* colourStage, const PixelLines& lines, uint8_t alphaByte, int n) {
   constexpr int kChroma = ChromaBytes(kLayout, kBytes);
   using Stage = typename StageFor<kForm, IsHalf(kLayout)>::Stage;
   const Stage stage = *static_cast<const Stage*>(colourStage);
   const Bytes alpha = SetBytes(alphaByte);
-  const int share = 1 << lines.rowShift;
-  const bool isNarrow = lines.rows > share &&
-                        2 * n * kPixel < (lines.dstPitch < 0 ? -lines.dstPitch : lines.dstPitch);
+  const ptrdiff_t dstPitch = lines.dstPitch;
+  const ptrdiff_t yPitch = lines.yPitch;
+  const bool isNarrow = 2 * n * kPixel < (dstPitch < 0 ? -dstPitch : dstPitch);
+  const int share = IsHalf(kLayout) ? 1 << lines.rowShift : 1;
+  const int last = (1 << lines.rowShift) - 1;  // of rows that share chroma
+  uint8_t* dstRow = lines.dst;
+  const uint8_t* yRow = lines.y;
+  const uint8_t* aRow = lines.a;
+  const uint8_t* bRow = lines.b;
   for (int row = 0; row < lines.rows; row += share) {
     if (isNarrow && row + 2 * share <= lines.rows) {
-      PrefetchRows(lines.dst + (row + share) * lines.dstPitch, lines.dstPitch, share, n * kPixel);
+      PrefetchRows(dstRow + share * dstPitch, dstPitch, share, n * kPixel);
     }
-    const ptrdiff_t chromaRow = row >> lines.rowShift;
-    const bool two = share == 2 && row + 1 < lines.rows;
-    uint8_t* dst = lines.dst + row * lines.dstPitch;
-    const uint8_t* y = lines.y + row * lines.yPitch;
-    const uint8_t* a = lines.a + chromaRow * lines.aPitch;
-    const uint8_t* b = lines.b + chromaRow * lines.bPitch;
+    uint8_t* dst = dstRow;
+    const uint8_t* y = yRow;
+    const uint8_t* a = aRow;
+    const uint8_t* b = bRow;
+    [[maybe_unused]] const bool two = share == 2 && row + 1 < lines.rows;
     for (int i = 0; i < n; i += kBytes) {
       if constexpr (!IsHalf(kLayout)) {
         ConvertLine<kLayout, kPixel>(stage, dst, y, a, b, alpha);
-        if (two) {
-          ConvertLine<kLayout, kPixel>(stage, dst + lines.dstPitch, y + lines.yPitch, a, b, alpha);
-        }
       } else {
         ChromaTerms<kForm> low, high;
         LoadTerms<kForm, kLayout, kPixel>(stage, a, b, &low, &high);
         ConvertLine<kForm, kPixel>(stage, dst, y, low, high, alpha);
         if (two) {
-          ConvertLine<kForm, kPixel>(stage, dst + lines.dstPitch, y + lines.yPitch, low, high,
-                                     alpha);
+          ConvertLine<kForm, kPixel>(stage, dst + dstPitch, y + yPitch, low, high, alpha);
         }
       }
       dst += kBytes * kPixel;
       y += kBytes;
       a += kChroma;
       b += kChroma;
+    }
+    dstRow += share * dstPitch;
+    yRow += share * yPitch;
+    if (IsHalf(kLayout) || (row & last) == last) {
+      aRow += lines.aPitch;
+      bRow += lines.bPitch;
     }
   }
 }
