@@ -351,10 +351,21 @@ void Destination::PutLuma(int32_t r, const uint8_t* luma) {
     return;
   }
   if (exchange_ == LumaExchange::kColumns) {
-    for (int i = 0; i < n_; ++i) {
+    const auto put = [&](int i) {
       const int64_t column = int64_t((x_ + i) ^ 1) - job_.rect.left;
       if (plane.columns.Contains(column)) *plane.At(column, row) = luma[i];
+    };
+    int i = 0;
+    if (x_ % 2 != 0) put(i++);
+    const int pairs = (n_ - i) / 2;
+    const int64_t first = int64_t(x_) + i - job_.rect.left;
+    if (pairs > 0 && plane.columns.Contains(first) &&
+        plane.columns.Contains(first + 2 * pairs - 1)) {
+      rows_.swapPairs(buffer_, luma + i, pairs);
+      rows_.writeStrided(plane.At(first, row), plane.columnStep, buffer_, 2 * pairs);
+      i += 2 * pairs;
     }
+    for (; i < n_; ++i) put(i);
     return;
   }
   if (n <= 0) return;

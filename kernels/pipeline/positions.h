@@ -97,7 +97,7 @@ inline Taps RowPositions::Own(int32_t r, uint32_t factor) const {
   const int64_t sample = DivideByFactor(row, factor);
   if (row < 0 || sample >= last) {
     const int32_t clamped = ClampIndex(last, readable);
-    return {clamped, clamped, weight};
+    return {clamped, clamped, 0};
   }
   return {ClampIndex(sample, readable), ClampIndex(DivideByFactor(row + 1, factor), readable),
           weight};
@@ -106,7 +106,7 @@ inline Taps RowPositions::Own(int32_t r, uint32_t factor) const {
 inline Taps RowPositions::At(int32_t r, uint32_t factor) const {
   Taps taps = Own(r, factor);
   const bool secondOfPair = sharedLowerLine_ && ((r - top_) & 1) != 0;
-  if (secondOfPair && taps.second != taps.first) {
+  if (secondOfPair && taps.weight != 0) {
     // The line below the pair's first row serves both rows.
     const int64_t below = int64_t(Own(r - 1, factor).first) + 1;
     const int64_t last = int64_t(srcBottom_) - 1;

@@ -3,6 +3,7 @@
 
 #include <string.h>
 
+#include "kernels/rows/channels.h"
 #include "kernels/rows/transpose.h"
 
 static_assert(__BYTE_ORDER__ == __ORDER_LITTLE_ENDIAN__, "packed pixels are stored as words");
@@ -111,8 +112,10 @@ void BlendPairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan) {
 }
 
 // Pixels are little-endian words, as every CPU this library is built for is.
+// (Three bytes are not copied: a word that is stored in two pieces cannot be read at once.)
 template <int kBytes>
 uint32_t LoadPixel(const uint8_t* p) {
+  if (kBytes == 3) return p[0] | uint32_t(p[1]) << 8 | uint32_t(p[2]) << 16;
   uint32_t pixel = 0;
   memcpy(&pixel, p, kBytes);
   return pixel;
@@ -123,15 +126,36 @@ void StorePixel(uint8_t* p, uint32_t pixel) {
   memcpy(p, &pixel, kBytes);
 }
 
-static uint8_t TopBits(uint32_t pixel, uint32_t position, uint32_t size) {
-  return size == 0 ? uint8_t{0} : uint8_t(((pixel >> position) << (32 - size)) >> 24);
+// Some pixels as words, so that what is done to their fields can be done to several at once.
+constexpr int kWords = 64;
+template <int kBytes>
+void LoadWords(uint32_t* words, const uint8_t* src, int n) {
+  int i = 0;
+  if (kBytes == 3) {
+    // With the first byte of the next one.
+    for (; i + 1 < n; ++i) words[i] = LoadPixel<4>(src + i * kBytes) & 0xFFFFFF;
+  }
+  for (; i < n; ++i) words[i] = LoadPixel<kBytes>(src + i * kBytes);
 }
 
 template <int kBytes>
 void UnpackFields(uint8_t* const rgb[3], const uint8_t* src, const PixelFormat& format, int n) {
-  for (int i = 0; i < n; ++i) {
-    const uint32_t pixel = LoadPixel<kBytes>(src + i * kBytes);
-    for (int c = 0; c < 3; ++c) rgb[c][i] = TopBits(pixel, format.position[c], format.size[c]);
+  uint32_t words[kWords];
+  for (int x = 0; x < n; x += kWords) {
+    const int count = n - x < kWords ? n - x : kWords;
+    LoadWords<kBytes>(words, src + ptrdiff_t{x} * kBytes, count);
+    for (int c = 0; c < 3; ++c) {
+      const uint32_t position = format.position[c];
+      const uint32_t size = format.size[c];
+      uint8_t* const levels = rgb[c] + x;
+      if (size == 0) {
+        memset(levels, 0, size_t(count));
+        continue;
+      }
+      for (int i = 0; i < count; ++i) {
+        levels[i] = uint8_t(words[i] >> position << (32 - size) >> 24);
+      }
+    }
   }
 }
 
@@ -283,19 +307,6 @@ void MapLevels(uint8_t* dst, const uint8_t* src, const LevelMap& levels, int n) 
   for (int i = 0; i < n; ++i) dst[i] = levels.map[src[i]];
 }
 
-// Calls call(x, rgb, count) for pieces of the channels of n pixels.
-template <typename Call>
-void ForChannels(const uint8_t* src, const PixelFormat& format, int n, const Call& call) {
-  constexpr int kPiece = 128;
-  uint8_t channels[3][kPiece];
-  uint8_t* const rgb[3] = {channels[0], channels[1], channels[2]};
-  for (int x = 0; x < n; x += kPiece) {
-    const int count = n - x < kPiece ? n - x : kPiece;
-    UnpackRgb(rgb, src + ptrdiff_t{x} * format.bytes, format, count);
-    call(x, rgb, count);
-  }
-}
-
 // Of pixels of whole bytes, `pitch` bytes apart.
 void WholeBytesToYuv(uint8_t* dst, ptrdiff_t step, const uint8_t* src, ptrdiff_t pitch,
                      const PixelFormat& format, RgbToYuvTables tables, int n) {
@@ -312,7 +323,7 @@ void WholeBytesToYuv(uint8_t* dst, ptrdiff_t step, const uint8_t* src, ptrdiff_t
 void PixelsToYuv(uint8_t* dst, const uint8_t* src, const PixelFormat& format, RgbToYuvTables tables,
                  int n) {
   if (format.wholeBytes) return WholeBytesToYuv(dst, 1, src, format.bytes, format, tables, n);
-  ForChannels(src, format, n, [=](int x, uint8_t* const rgb[3], int count) {
+  ForChannels(UnpackRgb, src, format, n, [=](int x, uint8_t* const rgb[3], int count) {
     RgbToYuv(dst + x, rgb, tables, count);
   });
 }
@@ -326,29 +337,31 @@ void PixelPairsToChroma(uint8_t* u, uint8_t* v, int step, const uint8_t* src,
     WholeBytesToYuv(v, step, seconds, pitch, format, tables + 5, n);
     return;
   }
-  ForChannels(src, format, 2 * n, [=](int x, uint8_t* const rgb[3], int count) {
-    for (int i = 0; i < count / 2; ++i) {
-      for (int c = 0; c < 3; ++c) rgb[c][i] = rgb[c][2 * i + 1];
-    }
-    uint8_t samples[64];
-    RgbToYuv(samples, rgb, tables + 3, count / 2);
-    WriteStrided(u + ptrdiff_t{x} / 2 * step, step, samples, count / 2);
-    RgbToYuv(samples, rgb, tables + 5, count / 2);
-    WriteStrided(v + ptrdiff_t{x} / 2 * step, step, samples, count / 2);
-  });
+  ChromaOfFields(UnpackRgb, RgbToYuv, u, v, step, src, format, tables, n);
+}
+
+// A function by itself, or compilers would do all channels of a pixel at once, on scalars.
+__attribute__((noinline)) static void AddField(uint32_t* __restrict words,
+                                               const uint8_t* __restrict levels, int32_t right,
+                                               int32_t left, int n) {
+  for (int i = 0; i < n; ++i) words[i] |= uint32_t(levels[i]) >> right << left;
 }
 
 template <int kBytes>
 void PackFields(uint8_t* dst, const uint8_t* const rgb[3], const PixelFormat& format,
                 const FieldShifts& shifts, AlphaFill alpha, int n) {
-  for (int i = 0; i < n; ++i) {
-    uint32_t pixel = 0;
+  uint32_t words[kWords];
+  for (int x = 0; x < n; x += kWords) {
+    const int count = n - x < kWords ? n - x : kWords;
+    memset(words, 0, sizeof(words));
     for (int c = 0; c < 3; ++c) {
-      const uint32_t value = rgb[c][i];
-      const int32_t right = shifts.right[c];
-      pixel |= (right >= 0 ? value >> right : value << -right) << format.position[c];
+      const int32_t right = shifts.right[c] > 0 ? shifts.right[c] : 0;
+      AddField(words, rgb[c] + x, right, int32_t(format.position[c]) + right - shifts.right[c],
+               count);
     }
-    StorePixel<kBytes>(dst + i * kBytes, (pixel & alpha.keep) | alpha.bits);
+    for (int i = 0; i < count; ++i) {
+      StorePixel<kBytes>(dst + ptrdiff_t{x + i} * kBytes, (words[i] & alpha.keep) | alpha.bits);
+    }
   }
 }
 
@@ -416,11 +429,10 @@ static void YuvRowToPixels(uint8_t* dst, const uint8_t* y, const uint8_t* u, con
 
 void YuvToPixels(const PixelRows& rows, const ChromaRows& chroma, const YuvToRgb& colour,
                  const PixelFormat& format, AlphaFill alpha, int n) {
-  FieldShifts shifts;
+  FieldShifts shifts = ShiftsTo(format);
   for (int c = 0; c < 3; ++c) {
-    const int32_t drop = 8 - int32_t(format.size[c]);
     const bool narrowed = format.bytes == 2 && colour.form != YuvToRgbForm::kSixBits;
-    shifts.right[c] = narrowed && drop > 0 ? 0 : drop;
+    if (narrowed && shifts.right[c] > 0) shifts.right[c] = 0;
   }
   for (int row = 0; row < rows.rows; ++row) {
     const int chromaRow = row >> chroma.rowShift;
@@ -436,22 +448,7 @@ void PutAlpha(uint8_t* pixels, const uint8_t* alpha, const PixelFormat& format, 
 
 void RepackPixels(uint8_t* dst, const uint8_t* src, const PixelFormat& from, const PixelFormat& to,
                   int n) {
-  constexpr int kPiece = 64;
-  uint8_t channels[4][kPiece];
-  uint8_t* const rgb[3] = {channels[0], channels[1], channels[2]};
-  FieldShifts shifts;
-  for (int c = 0; c < 3; ++c) shifts.right[c] = 8 - int32_t(to.size[c]);
-  for (int x = 0; x < n; x += kPiece) {
-    const int count = n - x < kPiece ? n - x : kPiece;
-    const uint8_t* const in = src + ptrdiff_t{x} * from.bytes;
-    uint8_t* const out = dst + ptrdiff_t{x} * to.bytes;
-    UnpackRgb(rgb, in, from, count);
-    PackRgb(out, rgb, to, shifts, {~0u, 0}, count);
-    if (from.alphaByte >= 0 && to.alphaByte >= 0) {
-      UnpackAlpha(channels[3], in, from, count);
-      PutAlpha(out, channels[3], to, count);
-    }
-  }
+  RepackFields(UnpackRgb, PackRgb, dst, src, from, to, n);
 }
 
 template <ptrdiff_t kStep>

@@ -5,7 +5,7 @@
 
 #include <string.h>
 
-#include "kernels/rows/rows_scalar.h"
+#include "kernels/rows/channels.h"
 
 namespace kestrel {
 namespace {
@@ -484,6 +484,9 @@ void UnpackRgb(uint8_t* const rgb[3], const uint8_t* src, const PixelFormat& for
   });
 }
 
+constexpr auto TableUnpackRgb = ForLong<&RowOps::unpackRgb, UnpackRgb>::Run;
+constexpr auto TablePackRgb = ForLong<&RowOps::packRgb, PackRgb>::Run;
+
 template <int kIn, int kOut, bool kExchange>
 void RepackRun(uint8_t* dst, const uint8_t* src, int n) {
   uint8_t* const dsts[] = {dst};
@@ -501,7 +504,9 @@ void RepackPixels(uint8_t* dst, const uint8_t* src, const PixelFormat& from, con
                   int n) {
   const PixelShape in(from);
   const PixelShape out(to);
-  if (in.bytes == 0 || out.bytes == 0) return scalar::RepackPixels(dst, src, from, to, n);
+  if (in.bytes == 0 || out.bytes == 0) {
+    return RepackFields(TableUnpackRgb, TablePackRgb, dst, src, from, to, n);
+  }
   WithPixelSize(in, [&](auto inSize) {
     WithPixelSize(out, [&](auto outSize) {
       constexpr int kIn = decltype(inSize)::value;
@@ -963,11 +968,44 @@ void YuvToPixels(const PixelRows& rows, const ChromaRows& chroma, const YuvToRgb
 constexpr int kLeastPixels = kIsNarrowest ? 0 : kBytes;
 constexpr auto TableYuvToPixels = ForLong<&RowOps::yuvToPixels, YuvToPixels, kLeastPixels>::Run;
 
+// Pixels of another layout, by way of pixels of four bytes and their channels: levels of 8 bits are
+// narrowed as sums are, if the latter are no wider than they should be.
+void YuvToFields(const PixelRows& rows, const ChromaRows& chroma, const YuvToRgb& colour,
+                 const PixelFormat& format, AlphaFill alpha, int n) {
+  constexpr int kPiece = 256;
+  constexpr PixelFormat kQuad = {4, {8, 8, 8}, {16, 8, 0}, 3, true};
+  const FieldShifts shifts = ShiftsTo(format);
+  bool isKnown = true;
+  for (int c = 0; c < 3; ++c) {
+    const bool narrows = format.bytes == 2 && colour.form != YuvToRgbForm::kSixBits;
+    const int32_t narrowing = narrows ? int32_t(colour.wide.narrowing[c]) : shifts.right[c];
+    if (shifts.right[c] < 0 || narrowing != shifts.right[c]) isKnown = false;
+  }
+  if (!isKnown) return scalar::YuvToPixels(rows, chroma, colour, format, alpha, n);
+  uint8_t quads[4 * kPiece], channels[3][kPiece];
+  uint8_t* const rgb[3] = {channels[0], channels[1], channels[2]};
+  for (int row = 0; row < rows.rows; ++row) {
+    const int chromaRow = row >> chroma.rowShift;
+    for (int x = 0; x < n; x += kPiece) {
+      const int count = n - x < kPiece ? n - x : kPiece;
+      const ptrdiff_t sample = ptrdiff_t{x >> chroma.shift} * chroma.step;
+      ChromaRows part = chroma;
+      part.u += chromaRow * chroma.uPitch + sample;
+      part.v += chromaRow * chroma.vPitch + sample;
+      TableYuvToPixels({quads, 0, rows.y + row * rows.yPitch + x, 0, 1}, part, colour, kQuad,
+                       {~0u, 0}, count);
+      TableUnpackRgb(rgb, quads, kQuad, count);
+      scalar::PackRgb(rows.dst + row * rows.dstPitch + ptrdiff_t{x} * format.bytes, rgb, format,
+                      shifts, alpha, count);
+    }
+  }
+}
+
 void YuvToPixels(const PixelRows& rows, const ChromaRows& chroma, const YuvToRgb& colour,
                  const PixelFormat& format, AlphaFill alpha, int n) {
   const PixelShape shape(format);
   const uint8_t fill = AlphaOf(alpha);
-  if (shape.bytes == 0) return scalar::YuvToPixels(rows, chroma, colour, format, alpha, n);
+  if (shape.bytes == 0) return YuvToFields(rows, chroma, colour, format, alpha, n);
   if (n > kBytes && chroma.shift != 0 && n % 2 != 0) {
     // A vector that reached back to a pixel in the middle would tear those that share chroma.
     --n;
@@ -1120,10 +1158,17 @@ void RgbToYuv(uint8_t* dst, const uint8_t* const rgb[3], RgbToYuvTables tables, 
   });
 }
 
+constexpr auto TableRgbToYuv = ForLong<&RowOps::rgbToYuv, RgbToYuv>::Run;
+
 void PixelsToYuv(uint8_t* dst, const uint8_t* src, const PixelFormat& format, RgbToYuvTables tables,
                  int n) {
   const PixelShape shape(format);
-  if (shape.bytes == 0) return scalar::PixelsToYuv(dst, src, format, tables, n);
+  if (shape.bytes == 0) {
+    return ForChannels(scalar::UnpackRgb, src, format, n,
+                       [=](int x, uint8_t* const rgb[3], int count) {
+                         TableRgbToYuv(dst + x, rgb, tables, count);
+                       });
+  }
   uint8_t* const dsts[] = {dst};
   WithSum(Weights(tables, shape.blueFirst), [&](const auto& sum) {
     WithPixelSize(shape, [&](auto size) {
@@ -1175,8 +1220,12 @@ void PixelPairsToChroma(uint8_t* u, uint8_t* v, int step, const uint8_t* src,
   const PixelShape shape(format);
   const Weights weightsOfU(tables + 3, shape.blueFirst);
   const Weights weightsOfV(tables + 5, shape.blueFirst);
-  const bool known = shape.bytes != 0 && AreOpposite(weightsOfU.signs(), weightsOfV.signs());
-  if (!known) return scalar::PixelPairsToChroma(u, v, step, src, format, tables, n);
+  if (shape.bytes == 0) {
+    return ChromaOfFields(scalar::UnpackRgb, TableRgbToYuv, u, v, step, src, format, tables, n);
+  }
+  if (!AreOpposite(weightsOfU.signs(), weightsOfV.signs())) {
+    return scalar::PixelPairsToChroma(u, v, step, src, format, tables, n);
+  }
   // The component whose weights are like those of the pixel's low byte comes first.
   const bool uIsFirst = weightsOfU.signs() == Signs::kFirstPositive;
   const Weights& first = uIsFirst ? weightsOfU : weightsOfV;
@@ -1319,18 +1368,18 @@ constexpr RowOps VectorRows(const char* name) noexcept {
           ForLong<&RowOps::blendRows, BlendRows>::Run,
           BlendPixels,
           ForLong<&RowOps::blendPixelRows, BlendPixelRows, kQuads>::Run,
-          ForLong<&RowOps::unpackRgb, UnpackRgb>::Run,
+          TableUnpackRgb,
           ForLong<&RowOps::unpackAlpha, UnpackAlpha>::Run,
           scalar::UnpackIndexed,
           ForLong<&RowOps::yuvToRgbWide, YuvToRgbByWideSums>::Run,
           YuvToRgbCarry,
           TableYuvToPixels,
-          ForLong<&RowOps::rgbToYuv, RgbToYuv>::Run,
+          TableRgbToYuv,
           ForLong<&RowOps::pixelsToYuv, PixelsToYuv>::Run,
           ForLong<&RowOps::pixelPairsToChroma, PixelPairsToChroma>::Run,
           ForLong<&RowOps::mapLevels, MapLevels>::Run,
           NarrowWithCarry,
-          ForLong<&RowOps::packRgb, PackRgb>::Run,
+          TablePackRgb,
           ForLong<&RowOps::repackPixels, RepackPixels>::Run,
           scalar::PutAlpha,
           ForLong<&RowOps::interleave, Interleave>::Run,
