@@ -4,6 +4,7 @@
 #include "fuzz/jobs.h"
 #include "tests/kernels/kernel_case.h"
 #include "tests/reference/chooser.h"
+#include "tests/support/formats.h"
 #include "tests/support/instruction_sets.h"
 
 namespace {
@@ -39,7 +40,7 @@ uint32_t DrawCodeOf(Input* input, uint32_t layouts) {
     if ((candidate.layout & layouts) != 0) fitting[count++] = candidate.code;
   }
   const uint32_t code = fitting[input->Between(0, count - 1)];
-  return code >> 28 >= 5 ? code | uint32_t(input->Between(0, 3)) << 12 : code;
+  return testing_support::HasStandard(code) ? code | uint32_t(input->Between(0, 3)) << 12 : code;
 }
 
 // Pixels a side: few, or enough for what is done in strips and tiles.

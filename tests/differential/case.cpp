@@ -3,32 +3,19 @@
 #include <algorithm>
 #include <cstdio>
 
+#include "tests/support/formats.h"
+
 namespace differential {
 namespace {
 
 using testing_support::GuardedBuffer;
+using testing_support::PublicCodes;
 
-constexpr uint32_t kRgbCodes[] = {FORMAT_RGB565,   FORMAT_BGR565,  FORMAT_RGB666,   FORMAT_BGR666,
-                                  FORMAT_RGB888,   FORMAT_BGR888,  FORMAT_XRGB8888, FORMAT_XBGR8888,
-                                  FORMAT_RGBX8888, FORMAT_BGRX8888};
-constexpr uint32_t kIndexedCodes[] = {FORMAT_INDEX1, FORMAT_INDEX4, FORMAT_INDEX8};
-constexpr uint32_t kPackedCodes[] = {FORMAT_YUYV,
-                                     FORMAT_YVYU,
-                                     FORMAT_UYVY,
-                                     FORMAT_VYUY,
-                                     FORMAT_YUYV_SWAPPED_LUMA,
-                                     FORMAT_YVYU_SWAPPED_LUMA,
-                                     FORMAT_UYVY_SWAPPED_LUMA,
-                                     FORMAT_VYUY_SWAPPED_LUMA,
-                                     FORMAT_YUV444,
-                                     FORMAT_YVU444,
-                                     FORMAT_UVY444,
-                                     FORMAT_VUY444,
-                                     FORMAT_YUV_SPECIAL8,
-                                     FORMAT_YUV_SPECIAL9};
-constexpr uint32_t kPlanarCodes[] = {FORMAT_I420, FORMAT_I422, FORMAT_I440,  FORMAT_I444,
-                                     FORMAT_YV12, FORMAT_YV16, FORMAT_YV440, FORMAT_YV24};
-constexpr uint32_t kSemiPlanarCodes[] = {FORMAT_NV21, FORMAT_NV12, FORMAT_NV61, FORMAT_NV16};
+constexpr auto kRgbCodes = PublicCodes<testing_support::IsRgbCode>();
+constexpr auto kIndexedCodes = PublicCodes<testing_support::IsIndexedCode>();
+constexpr auto kPackedCodes = PublicCodes<testing_support::IsPackedYuvCode>();
+constexpr auto kPlanarCodes = PublicCodes<testing_support::IsPlanarCode>();
+constexpr auto kSemiPlanarCodes = PublicCodes<testing_support::IsSemiPlanarCode>();
 constexpr uint32_t kUnknownCodes[] = {0,          0x14000343, 0x42000000, 0x50000020, 0x50000d11,
                                       0x63000000, 0x70000001, 0x70000006, 0x80000000, 0xF5000454};
 
@@ -308,7 +295,7 @@ Case DrawCase(uint64_t seed, uint64_t number, Lengths lengths) {
   drawn.number = number;
   drawn.dst.record.format = DrawFormat(&random);
   drawn.src.record.format = random.Percent(12) ? drawn.dst.record.format : DrawFormat(&random);
-  if (drawn.src.record.format >> 28 == 4 && !random.Percent(5)) {
+  if (testing_support::IsIndexedCode(drawn.src.record.format) && !random.Percent(5)) {
     drawn.src.record.palette = kSomePalette;
   }
   DrawParams(&random, &drawn.params);

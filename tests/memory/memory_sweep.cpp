@@ -18,6 +18,7 @@
 #include "tests/kernels/kernel_case.h"
 #include "tests/memory/watch.h"
 #include "tests/reference/chooser.h"
+#include "tests/support/formats.h"
 #include "tests/support/instruction_sets.h"
 
 namespace {
@@ -35,49 +36,13 @@ using testing_support::InstructionSets;
 constexpr size_t kMostWatched = size_t{1} << 19;
 constexpr int kMostDraws = 100000;
 
-// Destinations whose bytes are all drawn, then those with bytes beside the pixels, then indexed
-// formats, which are sources only.
-constexpr uint32_t kCodes[] = {FORMAT_RGB565,
-                               FORMAT_BGR565,
-                               FORMAT_RGB666,
-                               FORMAT_BGR666,
-                               FORMAT_RGB888,
-                               FORMAT_BGR888,
-                               FORMAT_XRGB8888,
-                               FORMAT_XBGR8888,
-                               FORMAT_RGBX8888,
-                               FORMAT_BGRX8888,
-                               FORMAT_YUYV,
-                               FORMAT_YVYU,
-                               FORMAT_UYVY,
-                               FORMAT_VYUY,
-                               FORMAT_YUYV_SWAPPED_LUMA,
-                               FORMAT_YVYU_SWAPPED_LUMA,
-                               FORMAT_UYVY_SWAPPED_LUMA,
-                               FORMAT_VYUY_SWAPPED_LUMA,
-                               FORMAT_YUV444,
-                               FORMAT_YVU444,
-                               FORMAT_UVY444,
-                               FORMAT_VUY444,
-                               FORMAT_I420,
-                               FORMAT_I422,
-                               FORMAT_I440,
-                               FORMAT_I444,
-                               FORMAT_YV12,
-                               FORMAT_YV16,
-                               FORMAT_YV440,
-                               FORMAT_YV24,
-                               FORMAT_GRAY8,
-                               FORMAT_NV21,
-                               FORMAT_NV12,
-                               FORMAT_NV61,
-                               FORMAT_NV16,
-                               FORMAT_YUV_SPECIAL9,
-                               FORMAT_YUV_SPECIAL8,
-                               FORMAT_INDEX1,
-                               FORMAT_INDEX4,
-                               FORMAT_INDEX8};
-constexpr int kFullyDrawnCodes = int(std::size(kCodes)) - 5;
+// Not the formats with bytes beside the pixels, nor the indexed ones, which are sources only.
+constexpr bool IsFullyDrawn(uint32_t code) {
+  return !testing_support::IsSpecialCode(code) && !testing_support::IsIndexedCode(code);
+}
+
+constexpr auto kSources = testing_support::PublicCodes();
+constexpr auto kDestinations = testing_support::PublicCodes<IsFullyDrawn>();
 
 struct Options {
   int kernelJobs = 36;
@@ -330,7 +295,7 @@ Case DrawPicture(uint32_t dstCode, uint32_t srcCode, int number) {
     drawn.src.record.width = drawn.dst.record.width;
     drawn.src.record.height = drawn.dst.record.height;
   }
-  if (srcCode >> 28 == 4) {
+  if (testing_support::IsIndexedCode(srcCode)) {
     drawn.src.record.palette = kSomePalette;
   }
   constexpr uint32_t kPassModes[] = {MPP_PASS_TILED, MPP_PASS_TILED, 1, 2, 3, 4};
@@ -348,10 +313,10 @@ int RunPictures(const Options& options) {
   int runs = 0;
   int number = 0;
   for (int round = 0; round < options.pictures; ++round) {
-    for (int dst = 0; dst < kFullyDrawnCodes; ++dst) {
-      for (const uint32_t srcCode : kCodes) {
+    for (const uint32_t dstCode : kDestinations) {
+      for (const uint32_t srcCode : kSources) {
         if (++number % options.shares == options.share) {
-          runs += RunCase(DrawPicture(kCodes[dst], srcCode, number), true, "a whole picture");
+          runs += RunCase(DrawPicture(dstCode, srcCode, number), true, "a whole picture");
         }
       }
     }
@@ -427,10 +392,10 @@ bool RunOneShot(uint32_t dstCode, uint32_t srcCode, int number) {
 int RunOneShots(const Options& options) {
   int runs = 0;
   int number = 0;
-  for (int dst = 0; dst < kFullyDrawnCodes; ++dst) {
-    for (const uint32_t srcCode : kCodes) {
+  for (const uint32_t dstCode : kDestinations) {
+    for (const uint32_t srcCode : kSources) {
       if (++number % options.shares == options.share) {
-        runs += RunOneShot(kCodes[dst], srcCode, number) ? 1 : 0;
+        runs += RunOneShot(dstCode, srcCode, number) ? 1 : 0;
       }
     }
   }
