@@ -93,6 +93,11 @@ constexpr bool IsPackedYuvCode(uint32_t code) {
   return (code >> 28 == 5 && !IsPlanarCode(code)) || IsSpecialCode(code);
 }
 
+// Packed 4:2:2: pairs of pixels with one chroma sample of each kind.
+constexpr bool HasPackedPairs(uint32_t code) {
+  return code >> 28 == 5 && !IsPlanarCode(code) && (code & 0x10u) != 0;
+}
+
 constexpr bool IsAnyCode(uint32_t) {
   return true;
 }
