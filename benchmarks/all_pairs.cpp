@@ -13,57 +13,13 @@
 #include "benchmarks/common/machine.h"
 #include "benchmarks/common/picture.h"
 #include "benchmarks/common/stopwatch.h"
+#include "tests/support/formats.h"
 
 namespace bench {
 namespace {
 
-struct Named {
-  const char* name;
-  uint32_t value;
-};
-
-constexpr Named kFormats[] = {
-    {"RGB565", FORMAT_RGB565},
-    {"BGR565", FORMAT_BGR565},
-    {"RGB666", FORMAT_RGB666},
-    {"BGR666", FORMAT_BGR666},
-    {"RGB888", FORMAT_RGB888},
-    {"BGR888", FORMAT_BGR888},
-    {"XRGB8888", FORMAT_XRGB8888},
-    {"XBGR8888", FORMAT_XBGR8888},
-    {"RGBX8888", FORMAT_RGBX8888},
-    {"BGRX8888", FORMAT_BGRX8888},
-    {"INDEX1", FORMAT_INDEX1},
-    {"INDEX4", FORMAT_INDEX4},
-    {"INDEX8", FORMAT_INDEX8},
-    {"YUYV", FORMAT_YUYV},
-    {"YVYU", FORMAT_YVYU},
-    {"UYVY", FORMAT_UYVY},
-    {"VYUY", FORMAT_VYUY},
-    {"YUYV_SWAPPED_LUMA", FORMAT_YUYV_SWAPPED_LUMA},
-    {"YVYU_SWAPPED_LUMA", FORMAT_YVYU_SWAPPED_LUMA},
-    {"UYVY_SWAPPED_LUMA", FORMAT_UYVY_SWAPPED_LUMA},
-    {"VYUY_SWAPPED_LUMA", FORMAT_VYUY_SWAPPED_LUMA},
-    {"YUV444", FORMAT_YUV444},
-    {"YVU444", FORMAT_YVU444},
-    {"UVY444", FORMAT_UVY444},
-    {"VUY444", FORMAT_VUY444},
-    {"I420", FORMAT_I420},
-    {"I422", FORMAT_I422},
-    {"I440", FORMAT_I440},
-    {"I444", FORMAT_I444},
-    {"YV12", FORMAT_YV12},
-    {"YV16", FORMAT_YV16},
-    {"YV440", FORMAT_YV440},
-    {"YV24", FORMAT_YV24},
-    {"GRAY8", FORMAT_GRAY8},
-    {"NV21", FORMAT_NV21},
-    {"NV12", FORMAT_NV12},
-    {"NV61", FORMAT_NV61},
-    {"NV16", FORMAT_NV16},
-    {"YUV_SPECIAL8", FORMAT_YUV_SPECIAL8},
-    {"YUV_SPECIAL9", FORMAT_YUV_SPECIAL9},
-};
+using testing_support::kPublicFormats;
+using testing_support::PublicFormat;
 
 constexpr Size kSource = {640, 480};
 constexpr Size kReduced = {480, 360};
@@ -83,7 +39,12 @@ constexpr Scale kScales[] = {
     {"nearest down", kReduced, MPP_NEAREST},
 };
 
-constexpr Named kTurns[] = {
+struct Turn {
+  const char* name;
+  uint32_t transform;
+};
+
+constexpr Turn kTurns[] = {
     {"as is", 0},
     {"90 degrees", MPP_SWAP_XY | MPP_MIRROR_X},
     {"mirrored", MPP_MIRROR_X},
@@ -115,7 +76,7 @@ struct Class {
 };
 
 uint32_t InFullRange(uint32_t format) {
-  return format >> 28 >= 5 ? format | FORMAT_BT601_FULL : format;
+  return testing_support::HasStandard(format) ? format | FORMAT_BT601_FULL : format;
 }
 
 void FillWithNoise(uint8_t* bytes, size_t count) {
@@ -130,22 +91,23 @@ class Pairs {
  public:
   explicit Pairs(int rounds) : rounds_(rounds), palette_(kPaletteBytes) {
     FillWithNoise(palette_.data(), palette_.size());
-    for (const Named& format : kFormats) {
-      sources_.emplace_back(InFullRange(format.value), kSource);
+    for (const PublicFormat& format : kPublicFormats) {
+      sources_.emplace_back(InFullRange(format.code), kSource);
       FillWithNoise(sources_.back().block[0].start, sources_.back().ByteCount());
     }
   }
 
-  Class Measure(const Scale& scale, const Named& turn) const {
+  Class Measure(const Scale& scale, const Turn& turn) const {
     Class result = {scale.name, turn.name, {}};
-    const bool swap = (turn.value & MPP_SWAP_XY) != 0;
-    for (const Named& format : kFormats) {
-      const Picture dst(InFullRange(format.value), swap ? scale.dst.Turned() : scale.dst);
+    const bool swap = (turn.transform & MPP_SWAP_XY) != 0;
+    for (const PublicFormat& format : kPublicFormats) {
+      const Picture dst(InFullRange(format.code), swap ? scale.dst.Turned() : scale.dst);
       FillWithNoise(dst.block[0].start, dst.ByteCount());
       for (size_t i = 0; i < sources_.size(); ++i) {
-        const double time = Time(sources_[i], dst, scale, turn.value);
+        const double time = Time(sources_[i], dst, scale, turn.transform);
         if (time < 0) continue;
-        result.pairs.push_back({kFormats[i].name, format.name, time / double(dst.size.Pixels())});
+        result.pairs.push_back(
+            {kPublicFormats[i].name, format.name, time / double(dst.size.Pixels())});
       }
     }
     std::sort(result.pairs.begin(), result.pairs.end(),
@@ -207,7 +169,7 @@ bool WriteJson(const std::vector<Class>& classes, const Options& options) {
   DescribeMachine(&json);
   json.Entry("rounds", double(options.rounds));
   json.Close('}').Key("formats").Open('[');
-  for (const Named& format : kFormats) json.Value(format.name);
+  for (const PublicFormat& format : kPublicFormats) json.Value(format.name);
   json.Close(']').Key("classes").Open('[');
   for (const Class& c : classes) {
     json.Open('{');
@@ -272,7 +234,7 @@ int Main(int argc, char** argv) {
   const Pairs pairs(options.rounds);
   std::vector<Class> classes;
   for (const Scale& scale : kScales) {
-    for (const Named& turn : kTurns) classes.push_back(pairs.Measure(scale, turn));
+    for (const Turn& turn : kTurns) classes.push_back(pairs.Measure(scale, turn));
   }
   Print(classes);
   bool written = options.jsonPath.empty() || WriteJson(classes, options);

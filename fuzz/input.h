@@ -8,6 +8,7 @@
 #include <cstdint>
 #include <cstdio>
 #include <cstdlib>
+#include <iterator>
 #include <string>
 
 namespace fuzz {
@@ -38,9 +39,9 @@ class Input {
   // True once in n, never after the last byte.
   bool OneIn(int32_t n) { return Between(0, n - 1) == n - 1; }
 
-  template <typename T, size_t n>
-  const T& Pick(const T (&choices)[n]) {
-    return choices[Between(0, int32_t(n) - 1)];
+  template <typename Choices>
+  const auto& Pick(const Choices& choices) {
+    return choices[size_t(Between(0, int32_t(std::size(choices)) - 1))];
   }
 
   size_t size() const { return size_t(end_ - at_); }

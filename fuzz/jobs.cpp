@@ -3,6 +3,9 @@
 #include <climits>
 #include <cstdlib>
 #include <cstring>
+#include <iterator>
+
+#include "tests/support/formats.h"
 
 namespace fuzz {
 namespace {
@@ -19,46 +22,19 @@ constexpr size_t kCapacity = size_t{1} << 22;
 constexpr int64_t kMostPixels = int64_t{1200} * 300;
 constexpr int64_t kFarthest = 16777216;  // regions that start beyond are not drawn
 
-constexpr uint32_t kListed[] = {FORMAT_NV21,
-                                FORMAT_XBGR8888,
-                                FORMAT_I420,
-                                FORMAT_RGB565,
-                                FORMAT_BGR565,
-                                FORMAT_RGB666,
-                                FORMAT_BGR666,
-                                FORMAT_RGB888,
-                                FORMAT_BGR888,
-                                FORMAT_XRGB8888,
-                                FORMAT_RGBX8888,
-                                FORMAT_BGRX8888,
-                                FORMAT_INDEX1,
-                                FORMAT_INDEX4,
-                                FORMAT_INDEX8,
-                                FORMAT_YUYV,
-                                FORMAT_YVYU,
-                                FORMAT_UYVY,
-                                FORMAT_VYUY,
-                                FORMAT_YUYV_SWAPPED_LUMA,
-                                FORMAT_YVYU_SWAPPED_LUMA,
-                                FORMAT_UYVY_SWAPPED_LUMA,
-                                FORMAT_VYUY_SWAPPED_LUMA,
-                                FORMAT_YUV444,
-                                FORMAT_YVU444,
-                                FORMAT_UVY444,
-                                FORMAT_VUY444,
-                                FORMAT_I422,
-                                FORMAT_I440,
-                                FORMAT_I444,
-                                FORMAT_YV12,
-                                FORMAT_YV16,
-                                FORMAT_YV440,
-                                FORMAT_YV24,
-                                FORMAT_GRAY8,
-                                FORMAT_NV12,
-                                FORMAT_NV61,
-                                FORMAT_NV16,
-                                FORMAT_YUV_SPECIAL8,
-                                FORMAT_YUV_SPECIAL9};
+// The plainest first, of which zeros are made, then the others.
+constexpr uint32_t kPlainest[] = {FORMAT_NV21, FORMAT_XBGR8888, FORMAT_I420};
+
+constexpr bool IsNotPlainest(uint32_t code) {
+  return code != kPlainest[0] && code != kPlainest[1] && code != kPlainest[2];
+}
+
+uint32_t DrawListed(Input* input) {
+  constexpr auto kOthers = testing_support::PublicCodes<IsNotPlainest>();
+  constexpr size_t kPlain = std::size(kPlainest);
+  const auto place = size_t(input->Between(0, int32_t(kPlain + kOthers.size()) - 1));
+  return place < kPlain ? kPlainest[place] : kOthers[place - kPlain];
+}
 
 int32_t DrawAdjustment(Input* input) {
   switch (input->Between(0, 3)) {
@@ -163,7 +139,7 @@ uint32_t DrawFormat(Input* input) {
   const uint32_t standard = uint32_t(input->Between(0, 3)) << 12;
   const int32_t kind = input->Between(0, 31);
   if (kind == 31) return input->Word();
-  if (kind == 30) return input->Pick(kListed) ^ 1u << input->Between(0, 31);
+  if (kind == 30) return DrawListed(input) ^ 1u << input->Between(0, 31);
   if (kind >= 28) {
     return 0x50000800u | standard | (input->OneIn(2) ? 0x200u : 0u) |
            (uint32_t(input->Byte()) & 0x33u);
@@ -172,8 +148,8 @@ uint32_t DrawFormat(Input* input) {
     return (input->OneIn(2) ? 0x30000000u : 0x10000000u) | uint32_t(input->Between(5, 7)) << 24 |
            (input->Word() & 0x1FFFu);
   }
-  const uint32_t code = input->Pick(kListed);
-  return code >> 28 >= 5 ? code | standard : code;
+  const uint32_t code = DrawListed(input);
+  return testing_support::HasStandard(code) ? code | standard : code;
 }
 
 MPPPARAM DrawParams(Input* input) {
@@ -297,7 +273,7 @@ Job DrawJob(Input* input) {
   Case& drawn = job.drawn;
   drawn.dst.record.format = DrawFormat(input);
   drawn.src.record.format = input->OneIn(6) ? drawn.dst.record.format : DrawFormat(input);
-  if (drawn.src.record.format >> 28 == 4 && !input->OneIn(16)) {
+  if (testing_support::IsIndexedCode(drawn.src.record.format) && !input->OneIn(16)) {
     drawn.src.record.palette = kSomePalette;
   }
   drawn.params = DrawParams(input);

@@ -1,9 +1,11 @@
-// Every kernel of the tables through its exported entry, with engines that it may and may not
-// accept. What it accepts equals the model on every byte, what it refuses is not written.
+// Every kernel of the tables and the generic converter through its exported entry, with engines
+// that it may and may not accept. What it accepts equals the model on every byte, what it refuses
+// is not written.
 #include "fuzz/input.h"
 #include "fuzz/jobs.h"
 #include "tests/kernels/kernel_case.h"
 #include "tests/reference/chooser.h"
+#include "tests/support/formats.h"
 #include "tests/support/instruction_sets.h"
 
 namespace {
@@ -39,7 +41,7 @@ uint32_t DrawCodeOf(Input* input, uint32_t layouts) {
     if ((candidate.layout & layouts) != 0) fitting[count++] = candidate.code;
   }
   const uint32_t code = fitting[input->Between(0, count - 1)];
-  return code >> 28 >= 5 ? code | uint32_t(input->Between(0, 3)) << 12 : code;
+  return testing_support::HasStandard(code) ? code | uint32_t(input->Between(0, 3)) << 12 : code;
 }
 
 // Pixels a side: few, or enough for what is done in strips and tiles.
@@ -56,12 +58,23 @@ uint32_t DrawTransform(Input* input, kestrel::Transform wanted, uint32_t drawn) 
   return input->Pick(kCodesOf);
 }
 
+void DrawFormats(Input* input, const kestrel::KernelRow& row, Case* drawn) {
+  MPPFORMAT& src = drawn->src.record;
+  MPPFORMAT& dst = drawn->dst.record;
+  if (row.sources == kestrel::kAnyLayout) {
+    src.format = fuzz::DrawFormat(input);
+    dst.format = fuzz::DrawFormat(input);
+    return;
+  }
+  src.format = DrawCodeOf(input, row.sources);
+  dst.format = row.pairing == kestrel::Pairing::kSame && !input->OneIn(8)
+                   ? src.format
+                   : DrawCodeOf(input, row.destinations);
+}
+
 Case DrawCall(Input* input, const kestrel::KernelRow& row) {
   Case drawn = {};
-  drawn.src.record.format = DrawCodeOf(input, row.sources);
-  drawn.dst.record.format = row.pairing == kestrel::Pairing::kSame && !input->OneIn(8)
-                                ? drawn.src.record.format
-                                : DrawCodeOf(input, row.destinations);
+  DrawFormats(input, row, &drawn);
   MPPPARAM& params = drawn.params;
   params = fuzz::DrawParams(input);
   params.transformCode = DrawTransform(input, row.transform, params.transformCode);
@@ -110,13 +123,14 @@ bool IsNear(int32_t origin) {
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
   static kernel_tests::KernelBench bench;
   Input input(data, size);
-  const int id = input.Between(0, kestrel::kernel_id::kCount - 1);
-  const kestrel::KernelRow& row = kestrel::kKernels[id];
+  const int id = input.Between(0, kernel_tests::kCallableCount - 1);
+  const kestrel::KernelRow& row = kernel_tests::RowOf(id);
   // The engine of this kernel, or of another.
   const int other = input.OneIn(8) ? input.Between(0, kestrel::kernel_id::kCount - 1) : id;
   fuzz::Job job;
   Case& drawn = job.drawn;
-  drawn = DrawCall(&input, kestrel::kKernels[other]);
+  drawn = DrawCall(&input, kernel_tests::RowOf(other));
+  bench.SupplyPalette(&drawn.src.record);
   const MPPPARAM& params = drawn.params;
   if (!IsNear(params.srcOriginX) || !IsNear(params.srcOriginY) || !IsNear(params.dstOriginX) ||
       !IsNear(params.dstOriginY)) {
@@ -141,12 +155,12 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
   const testing_support::InstructionSet& set =
       sets[size_t(input.Between(0, int32_t(sets.size()) - 1))];
   ForceRows(handle.get(), set);
-  const bool takes = kestrel::Accepts(row, context);
+  const bool takes = kernel_tests::Takes(id, context);
   bool isKnown = false;
   const bool shouldTake = reference::Takes(row.name, model, &isKnown);
   const std::string where = std::string(row.name) + " with " + set.name + ": ";
   if (isKnown && takes != shouldTake) Fail(where + "the table and the model disagree");
-  const uint32_t answer = bench.Call(kestrel::kKernelEntries[id], &context);
+  const uint32_t answer = bench.Call(kernel_tests::EntryOf(id), &context);
   if (answer != (takes ? KESTREL_OK : KESTREL_UNSUPPORTED)) {
     Fail(where + "answers " + std::to_string(answer) + " to " + bench.Describe());
   }

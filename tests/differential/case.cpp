@@ -2,33 +2,21 @@
 
 #include <algorithm>
 #include <cstdio>
+#include <utility>
+
+#include "tests/support/formats.h"
 
 namespace differential {
 namespace {
 
 using testing_support::GuardedBuffer;
+using testing_support::PublicCodes;
 
-constexpr uint32_t kRgbCodes[] = {FORMAT_RGB565,   FORMAT_BGR565,  FORMAT_RGB666,   FORMAT_BGR666,
-                                  FORMAT_RGB888,   FORMAT_BGR888,  FORMAT_XRGB8888, FORMAT_XBGR8888,
-                                  FORMAT_RGBX8888, FORMAT_BGRX8888};
-constexpr uint32_t kIndexedCodes[] = {FORMAT_INDEX1, FORMAT_INDEX4, FORMAT_INDEX8};
-constexpr uint32_t kPackedCodes[] = {FORMAT_YUYV,
-                                     FORMAT_YVYU,
-                                     FORMAT_UYVY,
-                                     FORMAT_VYUY,
-                                     FORMAT_YUYV_SWAPPED_LUMA,
-                                     FORMAT_YVYU_SWAPPED_LUMA,
-                                     FORMAT_UYVY_SWAPPED_LUMA,
-                                     FORMAT_VYUY_SWAPPED_LUMA,
-                                     FORMAT_YUV444,
-                                     FORMAT_YVU444,
-                                     FORMAT_UVY444,
-                                     FORMAT_VUY444,
-                                     FORMAT_YUV_SPECIAL8,
-                                     FORMAT_YUV_SPECIAL9};
-constexpr uint32_t kPlanarCodes[] = {FORMAT_I420, FORMAT_I422, FORMAT_I440,  FORMAT_I444,
-                                     FORMAT_YV12, FORMAT_YV16, FORMAT_YV440, FORMAT_YV24};
-constexpr uint32_t kSemiPlanarCodes[] = {FORMAT_NV21, FORMAT_NV12, FORMAT_NV61, FORMAT_NV16};
+constexpr auto kRgbCodes = PublicCodes<testing_support::IsRgbCode>();
+constexpr auto kIndexedCodes = PublicCodes<testing_support::IsIndexedCode>();
+constexpr auto kPackedCodes = PublicCodes<testing_support::IsPackedYuvCode>();
+constexpr auto kPlanarCodes = PublicCodes<testing_support::IsPlanarCode>();
+constexpr auto kSemiPlanarCodes = PublicCodes<testing_support::IsSemiPlanarCode>();
 constexpr uint32_t kUnknownCodes[] = {0,          0x14000343, 0x42000000, 0x50000020, 0x50000d11,
                                       0x63000000, 0x70000001, 0x70000006, 0x80000000, 0xF5000454};
 
@@ -80,11 +68,11 @@ int32_t DrawLength(Random* random) {
   return random->Between(1, kind <= 45 ? 14 : kind <= 84 ? 34 : 70);
 }
 
-// About the lengths at which rows are cut, and between them.
+// About the lengths at which rows are cut, between them and up to two and a bit of the longest.
 int32_t DrawLongLength(Random* random) {
-  constexpr int32_t kCuts[] = {512, 1024};
-  return random->Percent(40) ? random->Pick(kCuts) + random->Between(-2, 3)
-                             : random->Between(500, 2200);
+  constexpr int32_t kCuts[] = {512, 1024, 2048, 2048};
+  return random->Percent(35) ? random->Pick(kCuts) + random->Between(-2, 3)
+                             : random->Between(500, 4700);
 }
 
 // A length along one axis of the walk.
@@ -106,7 +94,7 @@ void DrawSizes(Random* random, Lengths lengths, bool swapXY, MPPFORMAT* dst, MPP
   src->height = down(random);
   int32_t width = src->width;
   int32_t height = src->height;
-  const int32_t kind = random->Between(1, 100);
+  const int32_t kind = random->Between(lengths == Lengths::kLong ? 20 : 1, 100);
   if (kind <= 40) {
     // 1:1
   } else if (kind <= 48) {
@@ -122,6 +110,9 @@ void DrawSizes(Random* random, Lengths lengths, bool swapXY, MPPFORMAT* dst, MPP
   } else {
     width = across(random);
     height = down(random);
+    if (lengths == Lengths::kLong && width > src->width && random->Percent(60)) {
+      std::swap(width, src->width);  // reduced, and many columns left
+    }
   }
   dst->width = swapXY ? height : width;
   dst->height = swapXY ? width : height;
@@ -178,6 +169,19 @@ void DrawParams(Random* random, MPPPARAM* params) {
   params->alpha = random->Pick(kAlphas);
 }
 
+// Packed 4:2:2, whose columns come in pairs wherever rows are cut: on either side or on both.
+void MakePairs(Random* random, Case* drawn) {
+  constexpr auto kCodes = PublicCodes<testing_support::HasPackedPairs>();
+  const int32_t kind = random->Between(1, 5);
+  if (kind <= 3) {
+    drawn->dst.record.format = random->Pick(kCodes) | uint32_t(random->Between(0, 3)) << 12;
+  }
+  if (kind >= 3) {
+    drawn->src.record.format = random->Pick(kCodes) | uint32_t(random->Between(0, 3)) << 12;
+    drawn->src.record.palette = nullptr;
+  }
+}
+
 // The one pair that has a block mode of its own, too rare to be met by chance.
 void MakePlanarEnlargement(Random* random, Case* drawn) {
   constexpr uint32_t kTransforms[] = {0, 3, 5, 6, 11};
@@ -212,16 +216,32 @@ void DrawSourceRect(Random* random, const MPPFORMAT& src, MPPPARAM* params) {
   DrawInside(random, top, bottom, &params->srcRect.top, &params->srcRect.bottom);
 }
 
-void DrawDestinationRect(Random* random, Case* drawn) {
+// A bit off both ends of low..high; odd starts and odd lengths, which cut pairs, are met most.
+void DrawShortened(Random* random, int32_t low, int32_t high, int32_t* start, int32_t* end) {
+  *start = low + random->Between(0, std::min(9, high - low - 1));
+  if (*start % 2 == 0 && *start + 1 < high && random->Percent(60)) {
+    ++*start;
+  }
+  *end = high - random->Between(0, std::min(9, high - *start - 1));
+  if ((*end - *start) % 2 == 0 && random->Percent(60)) {
+    --*end;
+  }
+}
+
+void DrawDestinationRect(Random* random, Lengths lengths, Case* drawn) {
   const MPPPARAM& params = drawn->params;
   const int32_t left = params.dstOriginX;
   const int32_t top = params.dstOriginY;
   const int32_t right = left + std::max(drawn->dst.record.width, 1);
   const int32_t bottom = top + std::max(drawn->dst.record.height, 1);
   const int32_t kind = random->Between(1, 100);
-  drawn->hasRect = kind > 40;
+  const bool isLong = lengths == Lengths::kLong;
+  drawn->hasRect = kind > (isLong ? 25 : 40);
   MRECT& rect = drawn->rect;
-  if (kind <= 55) {
+  if (isLong && random->Percent(75)) {  // most columns are left
+    DrawShortened(random, left, right, &rect.left, &rect.right);
+    DrawShortened(random, top, bottom, &rect.top, &rect.bottom);
+  } else if (kind <= 55) {
     rect = {left, top, right, bottom};
   } else if (kind <= 80) {
     DrawInside(random, left, right, &rect.left, &rect.right);
@@ -308,10 +328,13 @@ Case DrawCase(uint64_t seed, uint64_t number, Lengths lengths) {
   drawn.number = number;
   drawn.dst.record.format = DrawFormat(&random);
   drawn.src.record.format = random.Percent(12) ? drawn.dst.record.format : DrawFormat(&random);
-  if (drawn.src.record.format >> 28 == 4 && !random.Percent(5)) {
+  if (testing_support::IsIndexedCode(drawn.src.record.format) && !random.Percent(5)) {
     drawn.src.record.palette = kSomePalette;
   }
   DrawParams(&random, &drawn.params);
+  if (lengths == Lengths::kLong && random.Percent(40)) {
+    MakePairs(&random, &drawn);
+  }
   if (random.Percent(1)) {
     MakePlanarEnlargement(&random, &drawn);
   }
@@ -321,7 +344,7 @@ Case DrawCase(uint64_t seed, uint64_t number, Lengths lengths) {
   DrawSizes(&random, lengths, (drawn.params.transformCode & 1) != 0, &drawn.dst.record,
             &drawn.src.record);
   DrawSourceRect(&random, drawn.src.record, &drawn.params);
-  DrawDestinationRect(&random, &drawn);
+  DrawDestinationRect(&random, lengths, &drawn);
   constexpr Content kContents[] = {Content::kNoise, Content::kNoise, Content::kExtremes,
                                    Content::kSmooth};
   drawn.content = random.Pick(kContents);

@@ -1,6 +1,7 @@
 // Checksums of a fixed list of conversions. The committed file was made by the plain model and must
 // hold for the library on every CPU, with every instruction set.
 #include <algorithm>
+#include <cctype>
 #include <cstdint>
 #include <cstdio>
 #include <cstring>
@@ -16,6 +17,7 @@
 #include "tests/differential/image.h"
 #include "tests/differential/random.h"
 #include "tests/reference/reference.h"
+#include "tests/support/formats.h"
 #include "tests/support/guarded_buffer.h"
 #include "tests/support/instruction_sets.h"
 
@@ -26,52 +28,28 @@ using testing_support::GuardedBuffer;
 using testing_support::InstructionSet;
 
 struct NamedCode {
-  const char* name;
+  std::string name;
   uint32_t code;
 };
 
-constexpr NamedCode kFormats[] = {{"rgb565", FORMAT_RGB565},
-                                  {"bgr565", FORMAT_BGR565},
-                                  {"rgb666", FORMAT_RGB666},
-                                  {"bgr666", FORMAT_BGR666},
-                                  {"rgb888", FORMAT_RGB888},
-                                  {"bgr888", FORMAT_BGR888},
-                                  {"xrgb8888", FORMAT_XRGB8888},
-                                  {"xbgr8888", FORMAT_XBGR8888},
-                                  {"rgbx8888", FORMAT_RGBX8888},
-                                  {"bgrx8888", FORMAT_BGRX8888},
-                                  {"index1", FORMAT_INDEX1},
-                                  {"index4", FORMAT_INDEX4},
-                                  {"index8", FORMAT_INDEX8},
-                                  {"yuyv", FORMAT_YUYV},
-                                  {"yvyu", FORMAT_YVYU},
-                                  {"uyvy", FORMAT_UYVY},
-                                  {"vyuy", FORMAT_VYUY},
-                                  {"yuyv_swapped", FORMAT_YUYV_SWAPPED_LUMA},
-                                  {"yvyu_swapped", FORMAT_YVYU_SWAPPED_LUMA},
-                                  {"uyvy_swapped", FORMAT_UYVY_SWAPPED_LUMA},
-                                  {"vyuy_swapped", FORMAT_VYUY_SWAPPED_LUMA},
-                                  {"yuv444", FORMAT_YUV444},
-                                  {"yvu444", FORMAT_YVU444},
-                                  {"uvy444", FORMAT_UVY444},
-                                  {"vuy444", FORMAT_VUY444},
-                                  {"i420", FORMAT_I420},
-                                  {"i422", FORMAT_I422},
-                                  {"i440", FORMAT_I440},
-                                  {"i444", FORMAT_I444},
-                                  {"yv12", FORMAT_YV12},
-                                  {"yv16", FORMAT_YV16},
-                                  {"yv440", FORMAT_YV440},
-                                  {"yv24", FORMAT_YV24},
-                                  {"planar_3x3", 0x50000822},
-                                  {"planar_4x1_v_first", 0x50000a30},
-                                  {"gray8", FORMAT_GRAY8},
-                                  {"nv21", FORMAT_NV21},
-                                  {"nv12", FORMAT_NV12},
-                                  {"nv61", FORMAT_NV61},
-                                  {"nv16", FORMAT_NV16},
-                                  {"special8", FORMAT_YUV_SPECIAL8},
-                                  {"special9", FORMAT_YUV_SPECIAL9}};
+// The public formats by their names in small letters, and planar ones with chroma that no named
+// format has.
+const std::vector<NamedCode>& Formats() {
+  static const auto* const formats = [] {
+    auto* const list = new std::vector<NamedCode>;
+    for (const testing_support::PublicFormat& format : testing_support::kPublicFormats) {
+      std::string name = format.name;
+      for (char& letter : name) {
+        letter = char(std::tolower(letter));
+      }
+      list->push_back({name, format.code});
+    }
+    list->push_back({"planar_3x3", 0x50000822});
+    list->push_back({"planar_4x1_v_first", 0x50000a30});
+    return list;
+  }();
+  return *formats;
+}
 
 // The pairs that transforms, scales and adjustments are crossed with.
 struct Pair {
@@ -89,7 +67,7 @@ struct GoldenJob {
 };
 
 uint32_t CodeOf(const std::string& name) {
-  for (const NamedCode& format : kFormats) {
+  for (const NamedCode& format : Formats()) {
     if (name == format.name) {
       return format.code;
     }
@@ -137,11 +115,12 @@ class List {
 };
 
 void AddFormats(List* list) {
-  for (const NamedCode& format : kFormats) {
-    list->Add({format.name, "xbgr8888"}, {33, 17}, {33, 17}, Params(MPP_NEAREST, 0), "");
-    list->Add({format.name, "nv21"}, {33, 17}, {40, 24}, Params(MPP_BILINEAR, 0), "");
-    list->Add({"xbgr8888", format.name}, {33, 17}, {33, 17}, Params(MPP_NEAREST, 2), "");
-    list->Add({"nv12", format.name}, {48, 32}, {33, 17}, Params(MPP_BILINEAR, 0), "");
+  for (const NamedCode& format : Formats()) {
+    const char* const name = format.name.c_str();
+    list->Add({name, "xbgr8888"}, {33, 17}, {33, 17}, Params(MPP_NEAREST, 0), "");
+    list->Add({name, "nv21"}, {33, 17}, {40, 24}, Params(MPP_BILINEAR, 0), "");
+    list->Add({"xbgr8888", name}, {33, 17}, {33, 17}, Params(MPP_NEAREST, 2), "");
+    list->Add({"nv12", name}, {48, 32}, {33, 17}, Params(MPP_BILINEAR, 0), "");
   }
 }
 
@@ -240,7 +219,7 @@ void AddFrequent(List* list) {
       list->Add(pair, size[0], size[1], params, what);
       GoldenJob& job = list->Last();
       for (MPPFORMAT* const side : {&job.src, &job.dst}) {
-        side->format |= side->format >> 28 >= 5 ? FORMAT_BT601_FULL : 0;
+        side->format |= testing_support::HasStandard(side->format) ? FORMAT_BT601_FULL : 0;
       }
     }
   };
@@ -361,7 +340,7 @@ std::string LineOf(const GoldenJob& golden, const InstructionSet* set) {
   reference::Job job{};
   job.dst = golden.dst;
   job.src = golden.src;
-  if (golden.src.format >> 28 == 4) {
+  if (testing_support::IsIndexedCode(golden.src.format)) {
     job.src.palette = palette;
   }
   job.params = params;

@@ -5,6 +5,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
+#include <iterator>
 
 namespace differential {
 
@@ -30,9 +31,9 @@ class Random {
 
   bool Percent(int32_t chance) { return Between(1, 100) <= chance; }
 
-  template <typename T, size_t n>
-  const T& Pick(const T (&choices)[n]) {
-    return choices[Between(0, int32_t(n) - 1)];
+  template <typename Choices>
+  const auto& Pick(const Choices& choices) {
+    return choices[size_t(Between(0, int32_t(std::size(choices)) - 1))];
   }
 
   void Fill(uint8_t* bytes, size_t count) {

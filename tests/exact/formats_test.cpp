@@ -4,6 +4,7 @@
 #include <vector>
 
 #include "exact_support.h"
+#include "tests/support/formats.h"
 
 namespace kestrel::test {
 namespace {
@@ -461,47 +462,10 @@ TEST(PlaneLayouts, OfUnknownCodesHaveNoBits) {
 }
 
 TEST(PlaneLayouts, OfEveryPublicCodeExist) {
-  for (uint32_t code : {FORMAT_RGB565,
-                        FORMAT_BGR565,
-                        FORMAT_RGB666,
-                        FORMAT_BGR666,
-                        FORMAT_RGB888,
-                        FORMAT_BGR888,
-                        FORMAT_XRGB8888,
-                        FORMAT_XBGR8888,
-                        FORMAT_RGBX8888,
-                        FORMAT_BGRX8888,
-                        FORMAT_INDEX1,
-                        FORMAT_INDEX4,
-                        FORMAT_INDEX8,
-                        FORMAT_YUYV,
-                        FORMAT_YVYU,
-                        FORMAT_UYVY,
-                        FORMAT_VYUY,
-                        FORMAT_YUYV_SWAPPED_LUMA,
-                        FORMAT_YVYU_SWAPPED_LUMA,
-                        FORMAT_UYVY_SWAPPED_LUMA,
-                        FORMAT_VYUY_SWAPPED_LUMA,
-                        FORMAT_YUV444,
-                        FORMAT_YVU444,
-                        FORMAT_UVY444,
-                        FORMAT_VUY444,
-                        FORMAT_I420,
-                        FORMAT_I422,
-                        FORMAT_I440,
-                        FORMAT_I444,
-                        FORMAT_YV12,
-                        FORMAT_YV16,
-                        FORMAT_YV440,
-                        FORMAT_YV24,
-                        FORMAT_GRAY8,
-                        FORMAT_NV21,
-                        FORMAT_NV12,
-                        FORMAT_NV61,
-                        FORMAT_NV16,
-                        FORMAT_YUV_SPECIAL8,
-                        FORMAT_YUV_SPECIAL9,
-                        0x50000822u}) {
+  constexpr auto kListed = testing_support::PublicCodes();
+  std::vector<uint32_t> codes(kListed.begin(), kListed.end());
+  codes.push_back(0x50000822u);
+  for (const uint32_t code : codes) {
     SCOPED_TRACE(code);
     const Decoded decoded = Decode(code);
     ASSERT_EQ(decoded.result, KESTREL_OK);

@@ -4,6 +4,7 @@
 #include <utility>
 
 #include "exact_support.h"
+#include "tests/support/formats.h"
 
 namespace kestrel::test {
 namespace {
@@ -694,6 +695,29 @@ TEST(MirroredChroma, ThatWouldLandAboveRowZeroIsDropped) {
 }
 
 // ---- pitches ----
+
+// A mirrored region that begins above the plane ends there, in the middle of the walk.
+TEST(NegativeOrigins, LeaveWhatLiesAbovePackedPlanesAlone) {
+  constexpr int32_t kSide = 32;
+  constexpr int32_t kPitch = 2 * kSide;
+  constexpr size_t kAbove = size_t{kPitch} * kSide;
+  Bytes source(size_t{kSide} * kSide * 4, 0x11);
+  for (const uint32_t dst : testing_support::PublicCodes<testing_support::HasPackedPairs>()) {
+    for (const uint32_t src : {FORMAT_RGB565, FORMAT_RGB888, FORMAT_XBGR8888, FORMAT_YUYV,
+                               FORMAT_UYVY, FORMAT_YUV444, FORMAT_GRAY8}) {
+      SCOPED_TRACE(testing::Message() << std::hex << src << " to " << dst);
+      Bytes bytes(kAbove + size_t{kPitch} * (kSide - 2), 0xEE);
+      const Planes plane = {{bytes.data() + kAbove, nullptr, nullptr}, {kPitch, 0, 0}};
+      const Engine engine({dst, kSide, kSide}, {src, kSide, kSide},
+                          Param().Transform(MPP_MIRROR_Y).DstOrigin(0, -2));
+      ASSERT_EQ(Process(engine, plane, OnePlane(source, 4 * kSide)), KESTREL_OK);
+      const auto isUntouched = [](uint8_t byte) { return byte == 0xEE; };
+      const auto top = bytes.begin() + kAbove;
+      EXPECT_TRUE(std::all_of(bytes.begin(), top, isUntouched));
+      EXPECT_TRUE(std::none_of(top, bytes.end(), isUntouched));
+    }
+  }
+}
 
 TEST(NegativePitches, WalkTheImageUpward) {
   Bytes source = {1, 2, 3, 4, 5, 6}, out(6);

@@ -14,59 +14,25 @@
 #include "engine/postprocess.h"
 #include "tests/kernels/observer.h"
 #include "tests/reference/chooser.h"
+#include "tests/support/formats.h"
 
 namespace kernel_tests {
 namespace {
 
-struct NamedFormat {
-  const char* name;
-  uint32_t code;
-};
+using testing_support::HasStandard;
+using testing_support::PublicFormat;
 
-constexpr NamedFormat kFormats[] = {
-    {"RGB565", FORMAT_RGB565},
-    {"BGR565", FORMAT_BGR565},
-    {"RGB666", FORMAT_RGB666},
-    {"BGR666", FORMAT_BGR666},
-    {"RGB888", FORMAT_RGB888},
-    {"BGR888", FORMAT_BGR888},
-    {"XRGB8888", FORMAT_XRGB8888},
-    {"XBGR8888", FORMAT_XBGR8888},
-    {"RGBX8888", FORMAT_RGBX8888},
-    {"BGRX8888", FORMAT_BGRX8888},
-    {"INDEX1", FORMAT_INDEX1},
-    {"INDEX4", FORMAT_INDEX4},
-    {"INDEX8", FORMAT_INDEX8},
-    {"YUYV", FORMAT_YUYV},
-    {"YVYU", FORMAT_YVYU},
-    {"UYVY", FORMAT_UYVY},
-    {"VYUY", FORMAT_VYUY},
-    {"YUYV_SWAPPED_LUMA", FORMAT_YUYV_SWAPPED_LUMA},
-    {"YVYU_SWAPPED_LUMA", FORMAT_YVYU_SWAPPED_LUMA},
-    {"UYVY_SWAPPED_LUMA", FORMAT_UYVY_SWAPPED_LUMA},
-    {"VYUY_SWAPPED_LUMA", FORMAT_VYUY_SWAPPED_LUMA},
-    {"YUV444", FORMAT_YUV444},
-    {"YVU444", FORMAT_YVU444},
-    {"UVY444", FORMAT_UVY444},
-    {"VUY444", FORMAT_VUY444},
-    {"I420", FORMAT_I420},
-    {"I422", FORMAT_I422},
-    {"I440", FORMAT_I440},
-    {"I444", FORMAT_I444},
-    {"YV12", FORMAT_YV12},
-    {"YV16", FORMAT_YV16},
-    {"YV440", FORMAT_YV440},
-    {"YV24", FORMAT_YV24},
-    {"I_ANY", 0x50000822},
-    {"YV_ANY", 0x50000a22},
-    {"GRAY8", FORMAT_GRAY8},
-    {"NV21", FORMAT_NV21},
-    {"NV12", FORMAT_NV12},
-    {"NV61", FORMAT_NV61},
-    {"NV16", FORMAT_NV16},
-    {"SPECIAL8", FORMAT_YUV_SPECIAL8},
-    {"SPECIAL9", FORMAT_YUV_SPECIAL9},
-};
+// The public formats, and planar ones with chroma that no named format has.
+const std::vector<PublicFormat>& Formats() {
+  static const auto* const formats = [] {
+    auto* const list = new std::vector<PublicFormat>(std::begin(testing_support::kPublicFormats),
+                                                     std::end(testing_support::kPublicFormats));
+    list->push_back({"I_ANY", 0x50000822});
+    list->push_back({"YV_ANY", 0x50000a22});
+    return list;
+  }();
+  return *formats;
+}
 
 struct Scale {
   const char* name;
@@ -95,10 +61,6 @@ constexpr Standards kStandards[] = {
     {'r', FORMAT_BT601_FULL, FORMAT_BT601_VIDEO},
 };
 
-bool HasStandard(uint32_t code) {
-  return code >> 28 >= 5;
-}
-
 struct FreeEngine {
   void operator()(MPPHandle* handle) const { MPPDestroy(handle); }
 };
@@ -108,9 +70,9 @@ class Grid {
   // The list as text; empty when the chain and the model disagree.
   std::string Write() {
     Groups sources;
-    for (const NamedFormat& src : kFormats) {
+    for (const PublicFormat& src : Formats()) {
       Groups destinations;
-      for (const NamedFormat& dst : kFormats) {
+      for (const PublicFormat& dst : Formats()) {
         Add(LinesOf(src, dst), dst.name, &destinations);
       }
       std::string lines;
@@ -166,7 +128,7 @@ class Grid {
     return text;
   }
 
-  std::string LinesOf(const NamedFormat& src, const NamedFormat& dst) {
+  std::string LinesOf(const PublicFormat& src, const PublicFormat& dst) {
     const bool hasLevels = HasStandard(src.code) && HasStandard(dst.code);
     const bool hasStandard = HasStandard(src.code) || HasStandard(dst.code);
     const bool mayDither = dst.code >> 24 == 0x15;
@@ -202,7 +164,7 @@ class Grid {
     return touched ? lines : "always 0\n";
   }
 
-  Cells CellsOf(const NamedFormat& src, const NamedFormat& dst, const Scale& scale,
+  Cells CellsOf(const PublicFormat& src, const PublicFormat& dst, const Scale& scale,
                 const Standards& standards, bool adjusted, bool dithered) {
     std::vector<std::string> codes;
     for (uint32_t transform = 0; transform < 8; ++transform) {
@@ -218,7 +180,7 @@ class Grid {
                                      nullptr};
         const MPPFORMAT srcRecord = {src.code | (HasStandard(src.code) ? standards.src : 0),
                                      scale.width, scale.height,
-                                     src.code >> 28 == 4 ? palette_ : nullptr};
+                                     testing_support::IsIndexedCode(src.code) ? palette_ : nullptr};
         modes[mode - 1] = AnswerOf(dstRecord, srcRecord, params);
       }
       const bool same = modes[0] == modes[1] && modes[1] == modes[2] && modes[2] == modes[3];

@@ -3,6 +3,8 @@
 #include <algorithm>
 #include <cstring>
 
+#include "tests/support/formats.h"
+
 namespace kernel_tests {
 namespace {
 
@@ -155,7 +157,23 @@ void DrawInside(Random* random, int32_t low, int32_t high, int32_t* start, int32
   *end = random->Between(*start + 1, high);
 }
 
+constexpr kestrel::KernelRow kAnything = {
+    "ANY_ANY_C_SLOW",     kestrel::kAnyLayout,      kestrel::kAnyLayout,  kestrel::Pairing::kAny,
+    kestrel::Scale::kAny, kestrel::Transform::kAny, kestrel::Block::kAny, 0};
+
 }  // namespace
+
+const kestrel::KernelRow& RowOf(int id) {
+  return id == kGenericConverter ? kAnything : kestrel::kKernels[id];
+}
+
+KernelFn* EntryOf(int id) {
+  return id == kGenericConverter ? ANY_ANY_C_SLOW : kestrel::kKernelEntries[id];
+}
+
+bool Takes(int id, const EngineContext& engine) {
+  return id == kGenericConverter || kestrel::Accepts(kestrel::kKernels[id], engine);
+}
 
 EngineHandle CreateEngine(const MPPFORMAT& dst, const MPPFORMAT& src, const MPPPARAM& params) {
   MPPFORMAT dstRecord = dst;
@@ -238,6 +256,16 @@ KernelBench::KernelBench() {
     source_[i] = std::make_unique<GuardedBuffer>(kCapacity);
     got_[i] = std::make_unique<GuardedBuffer>(kCapacity);
     expected_[i] = std::make_unique<GuardedBuffer>(kCapacity);
+  }
+}
+
+void KernelBench::SupplyPalette(MPPFORMAT* src) {
+  reference::Format format;
+  if (testing_support::IsIndexedCode(src->format) && DecodeFormat(*src, &format) == KESTREL_OK) {
+    const size_t size = size_t{4} << format.bitsPerPixel;
+    uint8_t* const entries = palette_.Place(size, GuardedBuffer::Edge::kEnd);
+    Random(src->format).Fill(entries, size);
+    src->palette = entries;
   }
 }
 

@@ -14,6 +14,14 @@
 
 namespace kernel_tests {
 
+// What can be called by its name: the kernels of the table, and after them the generic converter,
+// whose row stands for everything.
+constexpr int kGenericConverter = kestrel::kernel_id::kCount;
+constexpr int kCallableCount = kGenericConverter + 1;
+const kestrel::KernelRow& RowOf(int id);
+KernelFn* EntryOf(int id);
+bool Takes(int id, const EngineContext& engine);
+
 struct FreeEngine {
   void operator()(MPPHandle* handle) const { MPPDestroy(handle); }
 };
@@ -34,6 +42,9 @@ void DrawBand(differential::Random* random, const reference::Engine& engine,
 class KernelBench {
  public:
   KernelBench();
+
+  // Gives a source with a palette its entries, which stay until the next ones.
+  void SupplyPalette(MPPFORMAT* src);
 
   // Fills the images. False when the band of the case is nothing that a kernel is called for.
   bool Prepare(const differential::Case& drawn, const reference::Engine& engine);
@@ -79,6 +90,7 @@ class KernelBench {
   bool Bind(const differential::PlacedBlock* dst, reference::KernelCall* call) const;
 
   Buffer source_[3], got_[3], expected_[3];
+  testing_support::GuardedBuffer palette_{1024};
   differential::PlacedBlock sourceBlocks_[3] = {}, gotBlocks_[3] = {}, expectedBlocks_[3] = {};
   std::vector<uint8_t> before_[3];
   differential::Case case_{};

@@ -1,16 +1,19 @@
 // Every kernel of the table over all lengths of both directions and some that are cut into strips,
-// with every instruction set. The planes are tight, and lie flush against the page before them,
-// flush against the page after them, and at odd addresses. All bytes must be those of the model.
-// Random jobs of kernels are elsewhere; this walk leaves no length, edge or set to chance.
+// and the generic converter over all pairs of formats, with every instruction set. The planes are
+// tight, and lie flush against the page before them, flush against the page after them, and at odd
+// addresses. All bytes must be those of the model. Random jobs of kernels are elsewhere; this walk
+// leaves no length, edge, pair or set to chance.
 #include <algorithm>
 #include <csignal>
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <iterator>
 #include <string>
 
 #include "tests/kernels/kernel_case.h"
 #include "tests/reference/chooser.h"
+#include "tests/support/formats.h"
 #include "tests/support/instruction_sets.h"
 
 namespace kernel_tests {
@@ -25,6 +28,11 @@ using testing_support::InstructionSet;
 constexpr int kLongest = 70;
 constexpr int kStripLengths[] = {130, 514};  // more than a strip, upright or turned by a quarter
 constexpr int kMostDraws = 100000;           // until an engine suits a kernel
+
+// Of the generic converter: a pair of formats meets every so many lengths, the next pair those
+// beside, and one of these.
+constexpr int kPairStride = 24;
+constexpr int kPairLongLengths[] = {130, 514, 1030, 2060};
 
 enum class Place { kStart, kEnd, kOdd, kCount };
 
@@ -91,9 +99,14 @@ void PlaceAt(Place place, Random* random, Side* side) {
   }
 }
 
+struct Pair {
+  uint32_t src;
+  uint32_t dst;
+};
+
 class Walk {
  public:
-  explicit Walk(int id) : id_(id), row_(kestrel::kKernels[id]) {}
+  Walk(int id, KernelBench* bench) : id_(id), row_(RowOf(id)), bench_(*bench) {}
 
   // False when something is wrong, which is then reported.
   bool Run(int crossings) {
@@ -114,10 +127,42 @@ class Walk {
     return true;
   }
 
+  // The same of the generic converter for all pairs of formats.
+  bool RunPairs(int crossings) {
+    constexpr auto kCodes = testing_support::PublicCodes();
+    for (const uint32_t src : kCodes) {
+      for (const uint32_t dst : kCodes) {
+        pair_ = {src, dst};
+        if (!RunPair(crossings)) {
+          return false;
+        }
+        ++pairs_;
+      }
+    }
+    return true;
+  }
+
+  int pairs() const { return pairs_; }
   uint64_t calls() const { return calls_; }
   uint64_t pictures() const { return pictures_; }
 
  private:
+  bool RunPair(int crossings) {
+    for (int crossing = 0; crossing < crossings; ++crossing) {
+      for (int length = 1 + pairs_ % kPairStride; length <= kLongest; length += kPairStride) {
+        if (!RunCrossing(length, Other(crossing, crossings))) {
+          return false;
+        }
+      }
+      const int turn = pairs_ + crossing;
+      const int length = kPairLongLengths[size_t(turn) % std::size(kPairLongLengths)];
+      if (!RunSize(length, random_.Between(1, 9), turn % 8 < 4)) {
+        return false;
+      }
+    }
+    return true;
+  }
+
   // A short one first, which is quick; all of them when there are as many crossings.
   int Other(int crossing, int crossings) {
     if (crossings == kLongest) {
@@ -158,13 +203,18 @@ class Walk {
             EngineHandle* handle) {
     for (int draw = 0; draw < kMostDraws; ++draw) {
       *drawn = DrawForKernel(&random_, row_);
+      if (id_ == kGenericConverter) {
+        drawn->src.record.format = WithStandard(pair_.src);
+        drawn->dst.record.format = WithStandard(pair_.dst);
+        bench_.SupplyPalette(&drawn->src.record);
+      }
       MPPPARAM& params = drawn->params;
       params.srcRect = {};
       params.srcOriginX = params.srcOriginY = params.dstOriginX = params.dstOriginY = 0;
       params.aspectMode = 0;
       Resize(width, height, ofSource, drawn);
       *handle = CreateEngine(drawn->dst.record, drawn->src.record, params);
-      if (!*handle || !Accepts(row_, *(*handle)->pass[0]->context)) {
+      if (!*handle || !Takes(id_, *(*handle)->pass[0]->context)) {
         continue;
       }
       *model = {};
@@ -180,6 +230,10 @@ class Walk {
     return false;
   }
 
+  uint32_t WithStandard(uint32_t code) {
+    return testing_support::HasStandard(code) ? code | uint32_t(random_.Between(0, 3)) << 12 : code;
+  }
+
   bool RunPicture(const Case& drawn, const reference::Engine& model, MPPHandle* handle) {
     current = {row_.name, "the model", &drawn};
     if (!bench_.Prepare(drawn, model)) {
@@ -192,7 +246,7 @@ class Walk {
       current.set = set.name.c_str();
       bench_.Restore();
       ForceRows(handle, set);
-      const uint32_t code = bench_.Call(kestrel::kKernelEntries[id_], handle->pass[0]->context);
+      const uint32_t code = bench_.Call(EntryOf(id_), handle->pass[0]->context);
       const std::string difference =
           code == KESTREL_OK ? bench_.Difference() : "the kernel answers " + std::to_string(code);
       if (!difference.empty()) {
@@ -207,8 +261,10 @@ class Walk {
 
   const int id_;
   const kestrel::KernelRow& row_;
-  KernelBench bench_;
+  KernelBench& bench_;
   Random random_{uint64_t(id_), 4000};
+  Pair pair_ = {};
+  int pairs_ = 0;
   uint64_t number_ = 0;
   uint64_t calls_ = 0;
   uint64_t pictures_ = 0;
@@ -235,28 +291,33 @@ int RunAll(const Options& options) {
   for (const int signalNumber : {SIGSEGV, SIGBUS, SIGFPE, SIGILL, SIGABRT}) {
     std::signal(signalNumber, ReportCrash);
   }
+  KernelBench bench;
   int kernels = 0;
+  int pairs = 0;
   uint64_t pictures = 0;
   uint64_t calls = 0;
-  for (int id = 0; id < kestrel::kernel_id::kCount; ++id) {
-    if (!options.kernel.empty() && options.kernel != kestrel::kKernels[id].name) {
+  for (int id = 0; id < kCallableCount; ++id) {
+    if (!options.kernel.empty() && options.kernel != RowOf(id).name) {
       continue;
     }
-    current.kernel = kestrel::kKernels[id].name;
-    Walk walk(id);
-    if (!walk.Run(options.crossings)) {
+    current.kernel = RowOf(id).name;
+    Walk walk(id, &bench);
+    const bool isGeneric = id == kGenericConverter;
+    if (!(isGeneric ? walk.RunPairs(options.crossings) : walk.Run(options.crossings))) {
       return 1;
     }
-    ++kernels;
+    kernels += isGeneric ? 0 : 1;
+    pairs += walk.pairs();
     pictures += walk.pictures();
     calls += walk.calls();
   }
   std::printf(
-      "%d kernels, all lengths from 1 to %d with %d others each: %llu pictures, %llu calls, all "
-      "bytes equal with each of: %s\n",
-      kernels, kLongest, options.crossings, static_cast<unsigned long long>(pictures),
+      "%d kernels, all lengths from 1 to %d with %d others each, %d pairs of formats of the "
+      "generic "
+      "converter: %llu pictures, %llu calls, all bytes equal with each of: %s\n",
+      kernels, kLongest, options.crossings, pairs, static_cast<unsigned long long>(pictures),
       static_cast<unsigned long long>(calls), NamesOf(testing_support::InstructionSets()).c_str());
-  return kernels > 0 ? 0 : 1;
+  return pictures > 0 ? 0 : 1;
 }
 
 }  // namespace

@@ -18,6 +18,7 @@
 #include "tests/kernels/kernel_case.h"
 #include "tests/memory/watch.h"
 #include "tests/reference/chooser.h"
+#include "tests/support/formats.h"
 #include "tests/support/instruction_sets.h"
 
 namespace {
@@ -35,54 +36,19 @@ using testing_support::InstructionSets;
 constexpr size_t kMostWatched = size_t{1} << 19;
 constexpr int kMostDraws = 100000;
 
-// Destinations whose bytes are all drawn, then those with bytes beside the pixels, then indexed
-// formats, which are sources only.
-constexpr uint32_t kCodes[] = {FORMAT_RGB565,
-                               FORMAT_BGR565,
-                               FORMAT_RGB666,
-                               FORMAT_BGR666,
-                               FORMAT_RGB888,
-                               FORMAT_BGR888,
-                               FORMAT_XRGB8888,
-                               FORMAT_XBGR8888,
-                               FORMAT_RGBX8888,
-                               FORMAT_BGRX8888,
-                               FORMAT_YUYV,
-                               FORMAT_YVYU,
-                               FORMAT_UYVY,
-                               FORMAT_VYUY,
-                               FORMAT_YUYV_SWAPPED_LUMA,
-                               FORMAT_YVYU_SWAPPED_LUMA,
-                               FORMAT_UYVY_SWAPPED_LUMA,
-                               FORMAT_VYUY_SWAPPED_LUMA,
-                               FORMAT_YUV444,
-                               FORMAT_YVU444,
-                               FORMAT_UVY444,
-                               FORMAT_VUY444,
-                               FORMAT_I420,
-                               FORMAT_I422,
-                               FORMAT_I440,
-                               FORMAT_I444,
-                               FORMAT_YV12,
-                               FORMAT_YV16,
-                               FORMAT_YV440,
-                               FORMAT_YV24,
-                               FORMAT_GRAY8,
-                               FORMAT_NV21,
-                               FORMAT_NV12,
-                               FORMAT_NV61,
-                               FORMAT_NV16,
-                               FORMAT_YUV_SPECIAL9,
-                               FORMAT_YUV_SPECIAL8,
-                               FORMAT_INDEX1,
-                               FORMAT_INDEX4,
-                               FORMAT_INDEX8};
-constexpr int kFullyDrawnCodes = int(std::size(kCodes)) - 5;
+// Not the formats with bytes beside the pixels, nor the indexed ones, which are sources only.
+constexpr bool IsFullyDrawn(uint32_t code) {
+  return !testing_support::IsSpecialCode(code) && !testing_support::IsIndexedCode(code);
+}
+
+constexpr auto kSources = testing_support::PublicCodes();
+constexpr auto kDestinations = testing_support::PublicCodes<IsFullyDrawn>();
 
 struct Options {
   int kernelJobs = 36;
   int cases = 12000;
   int pictures = 3;  // of every pair of formats
+  int wide = 8;      // of every pair of some formats
   int share = 0;
   int shares = 1;
 };
@@ -185,19 +151,19 @@ bool IsComplete(const Side& side, const uint8_t* const* tops, const int32_t* pit
   return true;
 }
 
-// ---- Kernels of the tables ----
+// ---- Kernels of the tables, and the generic converter ----
 
 // The next job that a kernel accepts, from `*draw` on. False after too many that it does not.
 bool DrawAccepted(int id, int* draw, kernel_tests::KernelBench* bench, Case* drawn,
                   reference::Engine* model, EngineHandle* handle) {
-  const kestrel::KernelRow& row = kestrel::kKernels[id];
+  const kestrel::KernelRow& row = kernel_tests::RowOf(id);
   for (const int end = *draw + kMostDraws; *draw < end;) {
     Random random{uint64_t(id), uint64_t(*draw)};
     *drawn = kernel_tests::DrawForKernel(&random, row);
     drawn->seed = uint64_t(id);
     drawn->number = uint64_t((*draw)++);
     *handle = CreateEngine(drawn->dst.record, drawn->src.record, drawn->params);
-    if (!*handle || !Accepts(row, *(*handle)->pass[0]->context)) {
+    if (!*handle || !kernel_tests::Takes(id, *(*handle)->pass[0]->context)) {
       continue;
     }
     BuildEngine(drawn->dst.record, drawn->src.record, drawn->params, drawn->params.passMode, model);
@@ -212,8 +178,8 @@ bool DrawAccepted(int id, int* draw, kernel_tests::KernelBench* bench, Case* dra
 int RunKernels(const Options& options) {
   static kernel_tests::KernelBench bench;
   int calls = 0;
-  for (int id = options.share; id < kestrel::kernel_id::kCount; id += options.shares) {
-    const kestrel::KernelRow& row = kestrel::kKernels[id];
+  for (int id = options.share; id < kernel_tests::kCallableCount; id += options.shares) {
+    const kestrel::KernelRow& row = kernel_tests::RowOf(id);
     int draw = 0;
     for (int job = 0; job < options.kernelJobs; ++job) {
       Case drawn{};
@@ -229,7 +195,7 @@ int RunKernels(const Options& options) {
         const Where where = {row.name, set.name.c_str(), drawn};
         UndefineBlocks(drawn.dst, bench.gotBlocks());
         ForceRows(handle.get(), set);
-        if (bench.Call(kestrel::kKernelEntries[id], handle->pass[0]->context) != KESTREL_OK) {
+        if (bench.Call(kernel_tests::EntryOf(id), handle->pass[0]->context) != KESTREL_OK) {
           Fail(where, "the job is refused");
         }
         const char* const fault = Compare(drawn.dst, bench.gotBlocks(), bench.expectedBlocks());
@@ -330,7 +296,7 @@ Case DrawPicture(uint32_t dstCode, uint32_t srcCode, int number) {
     drawn.src.record.width = drawn.dst.record.width;
     drawn.src.record.height = drawn.dst.record.height;
   }
-  if (srcCode >> 28 == 4) {
+  if (testing_support::IsIndexedCode(srcCode)) {
     drawn.src.record.palette = kSomePalette;
   }
   constexpr uint32_t kPassModes[] = {MPP_PASS_TILED, MPP_PASS_TILED, 1, 2, 3, 4};
@@ -348,10 +314,96 @@ int RunPictures(const Options& options) {
   int runs = 0;
   int number = 0;
   for (int round = 0; round < options.pictures; ++round) {
-    for (int dst = 0; dst < kFullyDrawnCodes; ++dst) {
-      for (const uint32_t srcCode : kCodes) {
+    for (const uint32_t dstCode : kDestinations) {
+      for (const uint32_t srcCode : kSources) {
         if (++number % options.shares == options.share) {
-          runs += RunCase(DrawPicture(kCodes[dst], srcCode, number), true, "a whole picture");
+          runs += RunCase(DrawPicture(dstCode, srcCode, number), true, "a whole picture");
+        }
+      }
+    }
+  }
+  return runs;
+}
+
+// ---- Wide pictures ----
+
+// One format of every way of reading and writing rows.
+constexpr uint32_t kWideFormats[] = {FORMAT_RGB565, FORMAT_RGB888, FORMAT_XBGR8888,
+                                     FORMAT_INDEX8, FORMAT_YUYV,   FORMAT_UYVY_SWAPPED_LUMA,
+                                     FORMAT_YUV444, FORMAT_I420,   FORMAT_I422,
+                                     FORMAT_GRAY8,  FORMAT_NV21};
+
+// Rows farther apart than they are long, half of them upside down.
+void SpreadRows(Random* random, Side* side) {
+  for (int i = 0; i < side->blocks.count; ++i) {
+    const int32_t pitch = side->blocks.block[i].rowBytes + random->Between(1, 90);
+    side->pitches[i] = random->Percent(50) ? pitch : -pitch;
+  }
+  if (side->blocks.count == 2) {
+    side->pitches[2] = side->pitches[1];
+  }
+}
+
+// Pictures that are wider, or after a turn taller, than any buffer of a row, most of them enlarged.
+// The rounds of a pair are the ways of scaling and the widths.
+Case DrawWide(uint32_t dstCode, uint32_t srcCode, int round, int number) {
+  static const uint8_t kSomePalette[4] = {0, 0, 0, 0};
+  Random random(10, uint64_t(number));
+  Case drawn{};
+  drawn.seed = 10;
+  drawn.number = uint64_t(number);
+  MPPPARAM& params = drawn.params;
+  params.passMode = random.Percent(50) ? MPP_PASS_TILED : uint32_t(random.Between(1, 4));
+  params.resampleFlags = round % 2 == 0 ? MPP_BILINEAR : MPP_NEAREST;
+  params.transformCode = random.Percent(50) ? 0 : uint32_t(random.Between(0, 7));
+  params.dither = random.Percent(30);
+  const int32_t width = (round / 2 % 2 == 0 ? 2100 : 4200) + random.Between(0, 3);
+  const int32_t height = random.Between(2, 5);
+  const int32_t kind = random.Between(1, 10);
+  int32_t srcWidth = random.Between(width / 8, width - 1);
+  int32_t srcHeight = random.Between(1, height);
+  if (kind <= 2) {  // doubled
+    srcWidth = (width + 1) / 2;
+    srcHeight = (height + 1) / 2;
+  } else if (kind == 3) {  // reduced
+    srcWidth = random.Between(width, width + 500);
+    srcHeight = height + 2;
+  }
+  const bool swaps = (params.transformCode & MPP_SWAP_XY) != 0;
+  drawn.dst.record = {dstCode, swaps ? height : width, swaps ? width : height, nullptr};
+  drawn.src.record = {srcCode, srcWidth, srcHeight, nullptr};
+  if (testing_support::IsIndexedCode(srcCode)) {
+    drawn.src.record.palette = kSomePalette;
+  }
+  drawn.hasRect = random.Percent(30);
+  if (drawn.hasRect) {
+    const int32_t left = swaps ? 0 : random.Between(1, 9);
+    const int32_t top = swaps ? random.Between(1, 9) : 0;
+    drawn.rect = {left, top, drawn.dst.record.width, drawn.dst.record.height};
+  }
+  for (Side* const side : {&drawn.dst, &drawn.src}) {
+    DrawSide(&random, side->record.width, side->record.height, side);
+    side->nullSlot = -1;
+    if (random.Percent(75)) {
+      SpreadRows(&random, side);
+    }
+  }
+  return drawn;
+}
+
+int RunWide(const Options& options) {
+  int runs = 0;
+  int number = 0;
+  for (int round = 0; round < options.wide; ++round) {
+    for (const uint32_t dstCode : kWideFormats) {
+      for (const uint32_t srcCode : kWideFormats) {
+        // Pairs begin with different rounds: few rounds have them all as well.
+        const int turn = round + number;
+        if (IsFullyDrawn(dstCode) && ++number % options.shares == options.share) {
+          const Case drawn = DrawWide(dstCode, srcCode, turn, number);
+          // A mirrored walk meets blocks of pixels out of phase, and leaves parts of them out.
+          const bool isWhole = !drawn.hasRect && drawn.params.transformCode == 0;
+          runs += RunCase(drawn, isWhole, "a wide picture");
         }
       }
     }
@@ -427,10 +479,10 @@ bool RunOneShot(uint32_t dstCode, uint32_t srcCode, int number) {
 int RunOneShots(const Options& options) {
   int runs = 0;
   int number = 0;
-  for (int dst = 0; dst < kFullyDrawnCodes; ++dst) {
-    for (const uint32_t srcCode : kCodes) {
+  for (const uint32_t dstCode : kDestinations) {
+    for (const uint32_t srcCode : kSources) {
       if (++number % options.shares == options.share) {
-        runs += RunOneShot(kCodes[dst], srcCode, number) ? 1 : 0;
+        runs += RunOneShot(dstCode, srcCode, number) ? 1 : 0;
       }
     }
   }
@@ -478,6 +530,7 @@ bool ParseOptions(int argc, char** argv, Options* options) {
     int* const target = std::strcmp(argv[i], "--kernel-jobs") == 0 ? &options->kernelJobs
                         : std::strcmp(argv[i], "--cases") == 0     ? &options->cases
                         : std::strcmp(argv[i], "--pictures") == 0  ? &options->pictures
+                        : std::strcmp(argv[i], "--wide") == 0      ? &options->wide
                         : std::strcmp(argv[i], "--share") == 0     ? &options->share
                         : std::strcmp(argv[i], "--shares") == 0    ? &options->shares
                                                                    : nullptr;
@@ -494,10 +547,11 @@ int main(int argc, char** argv) {
   Options options;
   if (!ParseOptions(argc, argv, &options)) {
     std::fprintf(stderr,
-                 "usage: memory_sweep [--kernel-jobs N] [--cases N] [--pictures N] "
+                 "usage: memory_sweep [--kernel-jobs N] [--cases N] [--pictures N] [--wide N] "
                  "[--share I --shares N]\n"
-                 "N jobs of every kernel, N random cases, N pictures of every pair of formats; of\n"
-                 "all these the I-th (from 0) of N shares.\n");
+                 "N jobs of every kernel, N random cases, N pictures of every pair of formats, N\n"
+                 "wide ones of every pair of some formats; of all these the I-th (from 0) of N\n"
+                 "shares.\n");
     return 2;
   }
   if (!watch::Watcher()) {
@@ -510,11 +564,12 @@ int main(int argc, char** argv) {
   const int kernels = RunKernels(options);
   const int cases = RunCases(options);
   const int pictures = RunPictures(options);
+  const int wide = RunWide(options);
   const int oneShots = RunOneShots(options);
   std::printf(
       "%s, share %d of %d, %zu instruction sets: %d calls of kernels, %d random cases, "
-      "%d whole pictures, %d one-shot conversions\n",
+      "%d whole pictures, %d wide ones, %d one-shot conversions\n",
       watch::Watcher(), options.share, options.shares, InstructionSets().size(), kernels, cases,
-      pictures, oneShots);
+      pictures, wide, oneShots);
   return 0;
 }

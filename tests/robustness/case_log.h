@@ -5,6 +5,7 @@
 
 #include <cstdint>
 #include <functional>
+#include <iterator>
 #include <random>
 #include <string>
 
@@ -28,9 +29,9 @@ class Random {
     return static_cast<int32_t>(low + static_cast<int64_t>(engine_() % range));
   }
   bool OneIn(int32_t n) { return Between(1, n) == 1; }
-  template <typename T, size_t N>
-  T Pick(const T (&values)[N]) {
-    return values[engine_() % N];
+  template <typename Values>
+  auto Pick(const Values& values) {
+    return values[size_t(Between(0, int32_t(std::size(values)) - 1))];
   }
 
  private:

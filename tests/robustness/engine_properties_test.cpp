@@ -13,7 +13,9 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <array>
 #include <cstdio>
+#include <iterator>
 #include <string>
 #include <thread>
 #include <vector>
@@ -26,14 +28,25 @@ namespace robustness {
 namespace {
 
 // Destination layouts whose blocks divide the tiling grids (2 x 2 and 16 x 8): every listed one.
-// Left out: indexed destinations, which are not drawn, and 0x70000008, whose chroma overwrites
-// lumas.
-constexpr uint32_t kDestinations[] = {
-    0x15000454, 0x15001454, 0x16000555, 0x16001555, 0x16000777, 0x16001777, 0x17000777, 0x17001777,
-    0x37000777, 0x37001777, 0x50000010, 0x50000210, 0x50000410, 0x50000610, 0x50000110, 0x50000310,
-    0x50000510, 0x50000710, 0x50000000, 0x50000200, 0x50000400, 0x50000600, 0x50000811, 0x50000810,
-    0x50000801, 0x50000800, 0x50000a11, 0x50000a10, 0x50000a01, 0x50000a00, 0x64000000, 0x70000002,
-    0x70000003, 0x70000004, 0x70000005, 0x70000009, 0x50001811, 0x64001000, 0x70003002};
+// Left out: indexed destinations, which are not drawn, and one whose chroma overwrites lumas.
+constexpr bool HasWholeBlocks(uint32_t code) {
+  return !testing_support::IsIndexedCode(code) && code != FORMAT_YUV_SPECIAL8;
+}
+
+constexpr auto kDestinations = [] {
+  constexpr auto kListed = testing_support::PublicCodes<HasWholeBlocks>();
+  constexpr uint32_t kOthers[] = {FORMAT_I420 | FORMAT_BT601_FULL, FORMAT_GRAY8 | FORMAT_BT601_FULL,
+                                  FORMAT_NV21 | FORMAT_BT709_FULL};
+  std::array<uint32_t, kListed.size() + std::size(kOthers)> codes{};
+  size_t at = 0;
+  for (const uint32_t code : kListed) {
+    codes[at++] = code;
+  }
+  for (const uint32_t code : kOthers) {
+    codes[at++] = code;
+  }
+  return codes;
+}();
 
 ImageShape Shape(uint32_t code) {
   ImageShape shape;

@@ -10,6 +10,7 @@
 #include <string>
 #include <vector>
 
+#include "tests/support/formats.h"
 #include "tests/support/guarded_buffer.h"
 
 namespace robustness {
@@ -37,12 +38,7 @@ struct ImageShape {
 // False for a code that no engine accepts.
 bool ShapeOf(uint32_t code, ImageShape* shape);
 
-constexpr uint32_t kListedCodes[] = {
-    0x15000454, 0x15001454, 0x16000555, 0x16001555, 0x16000777, 0x16001777, 0x17000777, 0x17001777,
-    0x37000777, 0x37001777, 0x41000000, 0x43000000, 0x44000000, 0x50000010, 0x50000210, 0x50000410,
-    0x50000610, 0x50000110, 0x50000310, 0x50000510, 0x50000710, 0x50000000, 0x50000200, 0x50000400,
-    0x50000600, 0x50000811, 0x50000810, 0x50000801, 0x50000800, 0x50000a11, 0x50000a10, 0x50000a01,
-    0x50000a00, 0x64000000, 0x70000002, 0x70000003, 0x70000004, 0x70000005, 0x70000008, 0x70000009};
+inline constexpr auto kListedCodes = testing_support::PublicCodes();
 
 // A block of its own guarded memory, flush with the page before or after it.
 class GuardedBlock {

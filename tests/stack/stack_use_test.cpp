@@ -58,7 +58,7 @@ constexpr Kind kKinds[] = {{1100, 12, 0, MPP_BILINEAR, 1, 40, FORMAT_BT601_VIDEO
                            {kWidth, kHeight, 3, MPP_NEAREST, 0, 0, FORMAT_BT601_FULL}};
 
 uint32_t WithStandard(uint32_t code, uint32_t standard) {
-  return code >> 28 >= 5 ? code | standard : code;
+  return testing_support::HasStandard(code) ? code | standard : code;
 }
 
 // A job of one kind with its images.

@@ -59,7 +59,7 @@ class Job {
   explicit Job(uint64_t number) {
     Random random(number);
     dst_.format = random.Pick(kListedCodes);
-    while (dst_.format >> 28 == 4) dst_.format = random.Pick(kListedCodes);
+    while (testing_support::IsIndexedCode(dst_.format)) dst_.format = random.Pick(kListedCodes);
     src_.format = random.Pick(kListedCodes);
     dst_.width = random.Between(1, 200);
     dst_.height = random.Between(1, 100);
