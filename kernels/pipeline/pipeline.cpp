@@ -872,6 +872,7 @@ class Pipeline {
     const uint8_t* const lumaPixels = source_.LumaAt(luma.firstX, 0);
     const uint8_t* const chromaPixels =
         chroma.n > 0 ? source_.LumaAt(chroma.firstX, 0) : lumaPixels;
+    int32_t nextLuma = job_.rect.top;
     for (int32_t r = job_.rect.top; r < job_.rect.bottom; ++r) {
       const int32_t row = source_.SourceRow(r, 1);
       if (groups) {
@@ -880,16 +881,34 @@ class Pipeline {
                         luma.n);
         continue;
       }
-      if (destination_.ContainsLumaRow(r)) {
-        uint8_t* const samples = destination_.writer(0).At(luma.column, int64_t(r) - job_.rect.top);
-        rows_.pixelsToYuv(samples, lumaPixels + source_.pitch(0) * row, source_.pixelFormat(),
-                          yuvTables(), luma.n);
+      if (r == nextLuma) {
+        nextLuma += ConvertLumaInPlace(r, lumaPixels + source_.pitch(0) * row, luma);
       }
       if (chroma.n > 0 && destination_.WritesU(r)) {
         ConvertChromaInPlace(r, chromaPixels + source_.pitch(0) * row, chroma, step);
       }
     }
     return true;
+  }
+
+  // The number of rows done: short ones without gaps between them are one.
+  int ConvertLumaInPlace(int32_t r, const uint8_t* pixels, const PlaneRun& run) {
+    constexpr int kShort = 1024;
+    if (!destination_.ContainsLumaRow(r)) return 1;
+    PlaneWriter& writer = destination_.writer(0);
+    int rows = 1;
+    if (run.n < kShort && source_.pitch(0) == ptrdiff_t{run.n} * source_.pixelFormat().bytes &&
+        writer.rowStep() == run.n) {
+      const int32_t rest = job_.rect.bottom - r;
+      const int most = rest < 2 * kShort / run.n ? rest : 2 * kShort / run.n;
+      const int32_t last = r + most - 1;
+      const bool inTurn = destination_.ContainsLumaRow(last) &&
+                          source_.SourceRow(last, 1) - source_.SourceRow(r, 1) == most - 1;
+      if (inTurn) rows = most;
+    }
+    rows_.pixelsToYuv(writer.At(run.column, int64_t(r) - job_.rect.top), pixels,
+                      source_.pixelFormat(), yuvTables(), run.n * rows);
+    return rows;
   }
 
   // An even number of pixels.

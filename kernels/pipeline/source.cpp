@@ -57,7 +57,7 @@ Source::Source(const Job& job)
   first_.step = second_.step = palette_ != nullptr ? 1 : isRgb ? pixels_.bytes : layout.step[0];
   chromaU_.step = chromaV_.step = layout.step[1];
   first_.plan = &firstPlan_;
-  chromaU_.plan = &chromaPlan_;
+  chromaU_.plan = second_.plan = &chromaPlan_;
 }
 
 int Source::ChromaOf(int columns) const {
@@ -94,7 +94,9 @@ void Source::TakeMemory(StripMemory* memory, int columns) {
       takePieces(scratch_, n);
       takePieces(blended_, n);
     }
-    if (pixels_.bytes == 2) firstPlan_.prepared = memory->Take<uint8_t>(3 * blocks(columns));
+    if (pixels_.bytes != 2) return;
+    firstPlan_.prepared = memory->Take<uint8_t>(3 * blocks(columns));
+    if (blends) chromaPlan_.prepared = memory->Take<uint8_t>(3 * blocks(columns));
     return;
   }
   firstPlan_.prepared = memory->Take<uint8_t>(3 * blocks(blends ? columns : columns / 2));
@@ -143,7 +145,9 @@ void Source::SelectColumns(int32_t x, int n) {
   if (interpolates_) second_.Finish(n);
   if (job_.engine.srcLayout.code == CODE_RGB) {
     // Pixels are gathered whole; those of two bytes are pairs of them.
-    if (pixels_.bytes == 2 && !interpolates_ && palette_ == nullptr) first_.PlanApart(1, rows_);
+    if (pixels_.bytes != 2 || palette_ != nullptr) return;
+    if (!first_.contiguous) first_.PlanApart(1, rows_);
+    if (interpolates_ && !second_.contiguous) second_.PlanApart(1, rows_);
     return;
   }
   if (!interpolates_) {
@@ -186,6 +190,7 @@ void Source::SelectPixelChroma(int32_t x, int n) {
   const uint32_t factor = job_.engine.srcSubsample[1];
   phase_ = shift_ = 0;
   chromaCount_ = n;
+  lastChroma_.row = -1;
   if (layout.code == CODE_GRAY8) return;
   const ptrdiff_t vFromU = job_.srcPlanes[2] - job_.srcPlanes[1];
   if (factor <= 2 && columnPositions_.Advance(x, n)) {
@@ -215,9 +220,8 @@ void Source::SelectPixelChroma(int32_t x, int n) {
   }
 }
 
-PixelChroma Source::ChromaOfPixels(int32_t r, uint8_t* into) {
+PixelChroma Source::ReadChroma(int32_t row, uint8_t* into) {
   if (pixelChroma_ == PixelChromaRead::kGrey) return {{u_, v_, 0, 1, 0, 0, 0}};
-  const int32_t row = rowPositions_.At(r, job_.engine.srcSubsample[4]).first;
   const uint8_t* const u = RowStart(1, row);
   const uint8_t* const v = RowStart(2, row);
   const int32_t start = chromaU_.offset[0];
@@ -356,8 +360,16 @@ void Source::ReadPixels(uint8_t* const rgb[3], const uint8_t* row, const SampleC
   } else if (columns.contiguous) {
     rows_.unpackRgb(rgb, row + columns.offset[0], pixels_, columns.n);
   } else {
-    rows_.gatherPixels(packed_, row, columns.offset, pixels_.bytes, columns.n);
+    Gather(packed_, row, columns);
     rows_.unpackRgb(rgb, packed_, pixels_, columns.n);
+  }
+}
+
+void Source::Gather(uint8_t* into, const uint8_t* row, const SampleColumns& columns) const {
+  if (pixels_.bytes == 2) {
+    rows_.readPairs(into, row, *columns.plan);
+  } else {
+    rows_.gatherPixels(into, row, columns.offset, pixels_.bytes, columns.n);
   }
 }
 
@@ -381,7 +393,7 @@ void Source::FillRgbLine(Line* line, int32_t row) {
     // Alpha is never interpolated.
     const uint8_t* pixels = start + first_.offset[0];
     if (!first_.contiguous) {
-      rows_.gatherPixels(packed_, start, first_.offset, pixels_.bytes, first_.n);
+      Gather(packed_, start, first_);
       pixels = packed_;
     }
     rows_.unpackAlpha(line->samples[3], pixels, pixels_, first_.n);
@@ -457,7 +469,7 @@ void Source::FillPixelLine(Line* line, int32_t row) {
   } else if (first_.contiguous) {
     line->channel[0] = start + first_.offset[0];
   } else {
-    rows_.gatherPixels(pixels, start, first_.offset, pixels_.bytes, first_.n);
+    Gather(pixels, start, first_);
   }
 }
 
@@ -486,11 +498,7 @@ const uint8_t* Source::Pixels(int32_t r, uint8_t* into) {
   const uint8_t* const row = RowStart(0, SourceRow(r, 1));
   if (first_.contiguous) return row + first_.offset[0];
   uint8_t* const gathered = into != nullptr ? into : packed_;
-  if (pixels_.bytes == 2) {
-    rows_.readPairs(gathered, row, firstPlan_);
-  } else {
-    rows_.gatherPixels(gathered, row, first_.offset, pixels_.bytes, first_.n);
-  }
+  Gather(gathered, row, first_);
   return gathered;
 }
 

@@ -97,9 +97,16 @@ class Source {
   // How many of `most` rows from r on read what this one reads, if it blends nothing.
   int RowsAlike(int32_t r, int most) const;
   const PixelFormat& pixelFormat() const { return pixels_; }
-  PixelChroma ChromaOfPixels(int32_t r) { return ChromaOfPixels(r, packed_); }
+  // Valid until the next call; an enlarged picture uses what was read for several rows.
+  PixelChroma ChromaOfPixels(int32_t r) {
+    const int32_t row = rowPositions_.At(r, job_.engine.srcSubsample[4]).first;
+    if (row != lastChroma_.row) lastChroma_ = {row, ReadChroma(row, packed_)};
+    return lastChroma_.chroma;
+  }
   // What is not in place is made in `into`, two bytes for each of chromaCount().
-  PixelChroma ChromaOfPixels(int32_t r, uint8_t* into);
+  PixelChroma ChromaOfPixels(int32_t r, uint8_t* into) {
+    return ReadChroma(rowPositions_.At(r, job_.engine.srcSubsample[4]).first, into);
+  }
   int chromaCount() const { return chromaCount_; }
   bool ChromaIsGrey() const { return pixelChroma_ == PixelChromaRead::kGrey; }
   // Where the luma of the strip lies in the source as it is wanted; null when it does not.
@@ -135,6 +142,9 @@ class Source {
                              const SampleColumns& columns) const;
   void ReadPixels(uint8_t* const rgb[3], const uint8_t* row, const SampleColumns& columns);
   const uint8_t* FindGroups(int32_t r) const;
+  PixelChroma ReadChroma(int32_t row, uint8_t* into);
+  // The strip's pixels of a row, side by side.
+  void Gather(uint8_t* into, const uint8_t* row, const SampleColumns& columns) const;
   int32_t ChromaColumn(int32_t x) const;
   // Samples of chroma that a strip may have.
   int ChromaOf(int columns) const;
@@ -163,11 +173,15 @@ class Source {
   enum class PixelChromaRead { kGrey, kInPlace, kStrided, kPairs, kGathered };
 
   SampleColumns first_, second_, chromaU_, chromaV_;
-  PairPlan firstPlan_, chromaPlan_;
-  bool sharesColumns_ = false;  // U and V
+  PairPlan firstPlan_, chromaPlan_;  // pixels of two bytes: of both taps
+  bool sharesColumns_ = false;       // U and V
   uint16_t* weights_ = nullptr;
   PixelChromaRead pixelChroma_ = PixelChromaRead::kGrey;
   int chromaCount_ = 0, phase_ = 0, shift_ = 0;
+  struct {
+    int32_t row;
+    PixelChroma chroma;
+  } lastChroma_ = {-1, {}};
   Line lines_[2];
   uint8_t* scratch_[3] = {};   // second taps
   uint8_t* packed_ = nullptr;  // gathered pixels, or pairs of chroma samples

@@ -893,32 +893,55 @@ struct PixelConversion {
     return at;
   }
 
+  // Up to 64 bytes; a library's copy would take longer to decide how.
+  static void CopyFew(uint8_t* to, const uint8_t* from, int n) {
+    if (n >= 32) {
+      CopyEnds<32>(to, from, n);
+    } else if (n >= 16) {
+      CopyEnds<16>(to, from, n);
+    } else if (n >= 8) {
+      CopyEnds<8>(to, from, n);
+    } else if (n >= 4) {
+      CopyEnds<4>(to, from, n);
+    } else {
+      for (int i = 0; i < n; ++i) to[i] = from[i];
+    }
+  }
+  template <int kSize>
+  static void CopyEnds(uint8_t* to, const uint8_t* from, int n) {
+    uint8_t first[kSize], last[kSize];
+    memcpy(first, from, kSize);
+    memcpy(last, from + n - kSize, kSize);
+    memcpy(to, first, kSize);
+    memcpy(to + n - kSize, last, kSize);
+  }
+
   // Fewer pixels of each row than a vector has, some rows at once.
   void ConvertCopies(const PixelLines& lines, int n) const {
     constexpr int kRows = 16;
     uint8_t y[kRows][kBytes], a[kRows][2 * kBytes], b[kRows][kBytes];
     uint8_t pixels[kRows][4 * kBytes];
-    const size_t chroma = size_t(ChromaBytes(layout, IsHalf(layout) ? n + 1 : n));
+    const int chroma = ChromaBytes(layout, IsHalf(layout) ? n + 1 : n);
     for (int top = 0; top < lines.rows; top += kRows) {
       const int rows = lines.rows - top < kRows ? lines.rows - top : kRows;
       for (int row = 0; row < rows; ++row) {
         memset(y[row], 0, sizeof(y[row]));
-        memcpy(y[row], lines.y + (top + row) * lines.yPitch, size_t(n));
+        CopyFew(y[row], lines.y + (top + row) * lines.yPitch, n);
       }
       const int first = top >> lines.rowShift;
       for (int row = 0; row << lines.rowShift < rows; ++row) {
         memset(a[row], 0, sizeof(a[row]));
-        memcpy(a[row], lines.a + (first + row) * lines.aPitch, chroma);
+        CopyFew(a[row], lines.a + (first + row) * lines.aPitch, chroma);
         if (IsPairs(layout)) continue;
         memset(b[row], 0, sizeof(b[row]));
-        memcpy(b[row], lines.b + (first + row) * lines.bPitch, chroma);
+        CopyFew(b[row], lines.b + (first + row) * lines.bPitch, chroma);
       }
       vectors(stage,
               {pixels[0], 4 * kBytes, y[0], kBytes, a[0], b[0], 2 * kBytes, kBytes, rows,
                lines.rowShift},
               alpha, kBytes);
       for (int row = 0; row < rows; ++row) {
-        memcpy(lines.dst + (top + row) * lines.dstPitch, pixels[row], size_t(n) * size_t(pixel));
+        CopyFew(lines.dst + (top + row) * lines.dstPitch, pixels[row], n * pixel);
       }
     }
   }
