@@ -168,8 +168,8 @@ void Destination::TakeMemory(StripMemory* memory, int columns) {
   buffer_ = memory->Take<uint8_t>(size_t(BufferSize(columns)));
   if (buffer_ == nullptr) return;
   // A plane of YUV takes a quarter of what pixels may take, chroma pairs two quarters.
-  for (int i = 0; i < 3; ++i)
-    writers_[i].SetBuffer(buffer_ + (AllInPlace() ? 0 : ptrdiff_t{i} * PlaneWriter::kTileSize));
+  const ptrdiff_t apart = AllInPlace() ? 0 : PlaneWriter::kTileSize;
+  for (int i = 0; i < 3; ++i) writers_[i].SetBuffer(buffer_ + i * apart);
 }
 
 // The kernel contract gives start addresses only; where they lie in the plane follows from the job
@@ -357,13 +357,13 @@ void Destination::PutLuma(int32_t r, const uint8_t* luma) {
     };
     int i = 0;
     if (x_ % 2 != 0) put(i++);
-    const int pairs = (n_ - i) / 2;
+    const int exchanged = (n_ - i) & ~1;
     const int64_t first = int64_t(x_) + i - job_.rect.left;
-    if (pairs > 0 && plane.columns.Contains(first) &&
-        plane.columns.Contains(first + 2 * pairs - 1)) {
-      rows_.swapPairs(buffer_, luma + i, pairs);
-      rows_.writeStrided(plane.At(first, row), plane.columnStep, buffer_, 2 * pairs);
-      i += 2 * pairs;
+    if (exchanged > 0 && plane.columns.Contains(first) &&
+        plane.columns.Contains(first + exchanged - 1)) {
+      rows_.swapPairs(buffer_, luma + i, exchanged / 2);
+      rows_.writeStrided(plane.At(first, row), plane.columnStep, buffer_, exchanged);
+      i += exchanged;
     }
     for (; i < n_; ++i) put(i);
     return;

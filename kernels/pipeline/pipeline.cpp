@@ -96,13 +96,14 @@ class Pipeline {
         engine_.pathKind == PATH_RGB_TO_YUV || engine_.pathKind == PATH_YUV_TO_YUV;
     const ptrdiff_t run = columns > kStrip ? columns : kStrip;
     const ptrdiff_t runs = makesChroma ? 6 : 3;
-    constexpr ptrdiff_t least = ptrdiff_t{3} * kCollected;
+    constexpr ptrdiff_t kLeast = ptrdiff_t{3} * kCollected;
+    constexpr size_t kNarrow = kStrip;
+    constexpr size_t kTurned = ArrangedSamples::kTurnedColumns;
     // For a column no job takes more than 44 bytes besides, and none that turns YUV more than 32.
-    static_assert(StripMemory::kSize >= ArrangedSamples::kTurnedSize + least +
-                                            32 * ArrangedSamples::kTurnedColumns &&
-                      StripMemory::kSize >= ArrangedSamples::kMirroredSize + least + 44 * kStrip,
+    static_assert(StripMemory::kSize >= ArrangedSamples::kTurnedSize + kLeast + 32 * kTurned &&
+                      StripMemory::kSize >= ArrangedSamples::kMirroredSize + kLeast + 44 * kNarrow,
                   "there is room for the narrowest strips");
-    memory_ = memory->Take<uint8_t>(size_t(runs * run > least ? runs * run : least));
+    memory_ = memory->Take<uint8_t>(size_t(runs * run > kLeast ? runs * run : kLeast));
     if (memory_ == nullptr) return;
     for (int c = 0; c < 3; ++c) channels_[c] = memory_ + c * run;
     luma_ = memory_ + 3 * run;

@@ -17,7 +17,7 @@ void SampleColumns::Finish(int count) {
   for (int i = 1; i < n && contiguous; ++i) contiguous = offset[i] - offset[i - 1] == step;
 }
 
-void SampleColumns::Plan(const RowOps& rows) {
+void SampleColumns::Plan(const RowOps& rows) const {
   if (contiguous || plan == nullptr) return;
   plan->n = n / 2;
   plan->first = offset;
@@ -27,12 +27,13 @@ void SampleColumns::Plan(const RowOps& rows) {
   rows.planPairs(plan);
 }
 
-void SampleColumns::PlanApart(int32_t apart, const RowOps& rows) {
+void SampleColumns::PlanApart(int32_t apart, const RowOps& rows) const {
   plan->apart = apart;
   PlanWith(nullptr, nullptr, rows);
 }
 
-void SampleColumns::PlanWith(const int32_t* second, const uint16_t* weights, const RowOps& rows) {
+void SampleColumns::PlanWith(const int32_t* second, const uint16_t* weights,
+                             const RowOps& rows) const {
   plan->n = n;
   plan->first = offset;
   plan->second = second;
@@ -70,7 +71,8 @@ int Source::ChromaOf(int columns) const {
 
 void Source::TakeMemory(StripMemory* memory, int columns) {
   const auto blocks = [](int n) {
-    return size_t((n + PairPlan::kBlock - 1) / PairPlan::kBlock * PairPlan::kBlock);
+    constexpr size_t kBlock = PairPlan::kBlock;
+    return (size_t(n) + kBlock - 1) / kBlock * kBlock;
   };
   // n columns in each of some pieces, which follow each other.
   const auto takePieces = [=](auto& pieces, size_t n) {

@@ -17,13 +17,13 @@ struct SampleColumns {
   int32_t* offset = nullptr;  // bytes from the start of the row
   PairPlan* plan = nullptr;   // unless contiguous: how they are read, if there is room for that
 
-  void Set(int i, int64_t sample) { offset[i] = int32_t(sample * step); }
+  void Set(int i, int64_t sample) const { offset[i] = int32_t(sample * step); }
   void Finish(int count);
-  void Plan(const RowOps& rows);
+  void Plan(const RowOps& rows) const;
   // Pairs of each column's sample and another, with weights or null.
-  void PlanWith(const int32_t* second, const uint16_t* weights, const RowOps& rows);
+  void PlanWith(const int32_t* second, const uint16_t* weights, const RowOps& rows) const;
   // Pairs of each column's sample and the one so many bytes after it.
-  void PlanApart(int32_t apart, const RowOps& rows);
+  void PlanApart(int32_t apart, const RowOps& rows) const;
 };
 
 // A run of channel values; points into the strip's buffers or straight into the source.

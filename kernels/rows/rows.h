@@ -109,8 +109,10 @@ struct PairPlan {
   uint8_t* prepared = nullptr;
   uint8_t* blends = nullptr;
 
-  int32_t First(int i) const { return first[i * stride]; }
-  int32_t Second(int i) const { return second != nullptr ? second[i * stride] : First(i) + apart; }
+  int32_t First(int i) const { return first[ptrdiff_t{i} * stride]; }
+  int32_t Second(int i) const {
+    return second != nullptr ? second[ptrdiff_t{i} * stride] : First(i) + apart;
+  }
 
   // Of each eight pairs: one or two windows of 16 bytes, for all or for half of them, or -1 where
   // there is none, and where in the windows their bytes are; by blocks as vectors take them.
