@@ -793,7 +793,8 @@ class Pipeline {
   }
 
   void RgbToYuv(int32_t r) {
-    const bool fromPixels = chromaOfSeconds_ && !destination_.exchangesLuma();
+    const bool fromPixels =
+        chromaOfSeconds_ && !destination_.exchangesLuma() && !source_.hasFields();
     const uint8_t* const pixels = fromPixels ? source_.Pixels(r) : nullptr;
     if (pixels != nullptr) return PixelsToYuv(r, pixels);
     const RgbRun run = source_.Rgb(r);
@@ -851,7 +852,7 @@ class Pipeline {
   bool ConvertRgbInPlace() {
     const bool unit = engine_.stepX == 0x10000 && engine_.stepY == 0x10000;
     if (!unit || engine_.pathKind != PATH_RGB_TO_YUV || job_.has(kPairChroma) ||
-        destination_.exchangesLuma() || job_.rect.left < 0) {
+        destination_.exchangesLuma() || job_.rect.left < 0 || source_.hasFields()) {
       return false;
     }
     const PlaneRun luma = destination_.LumaRun();

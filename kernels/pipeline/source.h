@@ -97,6 +97,9 @@ class Source {
   // How many of `most` rows from r on read what this one reads, if it blends nothing.
   int RowsAlike(int32_t r, int most) const;
   const PixelFormat& pixelFormat() const { return pixels_; }
+  // Whether taking channels out of pixels costs so much that it is better done once for all three
+  // components of YUV.
+  bool hasFields() const { return !pixels_.wholeBytes && pixels_.bytes != 2; }
   // Valid until the next call; an enlarged picture uses what was read for several rows.
   PixelChroma ChromaOfPixels(int32_t r) {
     const int32_t row = rowPositions_.At(r, job_.engine.srcSubsample[4]).first;

@@ -193,15 +193,35 @@ void UnpackAlpha(uint8_t* alpha, const uint8_t* src, const PixelFormat& format, 
   for (int i = 0; i < n; ++i) alpha[i] = src[i * format.bytes + format.alphaByte];
 }
 
-void UnpackIndexed(uint8_t* const rgb[3], const uint8_t* row, const int32_t* columns, uint32_t bits,
+template <uint32_t kBits>
+void UnpackEntries(uint8_t* const rgb[3], const uint8_t* row, const int32_t* columns,
                    const uint8_t* palette, int n) {
-  const uint32_t perByte = 8 / bits;
-  const uint32_t mask = (1u << bits) - 1;
+  constexpr uint32_t kPerByte = 8 / kBits;
+  uint8_t* const red = rgb[0];
+  uint8_t* const green = rgb[1];
+  uint8_t* const blue = rgb[2];
   for (int i = 0; i < n; ++i) {
     const uint32_t column = uint32_t(columns[i]);
-    const uint32_t shift = bits * (perByte - 1 - column % perByte);
-    const uint8_t* entry = palette + 4 * ((uint32_t(row[column / perByte]) >> shift) & mask);
-    for (int c = 0; c < 3; ++c) rgb[c][i] = entry[2 - c];
+    const uint32_t shift = kBits * (kPerByte - 1 - column % kPerByte);
+    const uint32_t entry = (uint32_t(row[column / kPerByte]) >> shift) & ((1u << kBits) - 1);
+    const uint32_t colour = LoadPixel<4>(palette + size_t{4} * entry);
+    red[i] = uint8_t(colour >> 16);
+    green[i] = uint8_t(colour >> 8);
+    blue[i] = uint8_t(colour);
+  }
+}
+
+void UnpackIndexed(uint8_t* const rgb[3], const uint8_t* row, const int32_t* columns, uint32_t bits,
+                   const uint8_t* palette, int n) {
+  switch (bits) {
+    case 1:
+      return UnpackEntries<1>(rgb, row, columns, palette, n);
+    case 2:
+      return UnpackEntries<2>(rgb, row, columns, palette, n);
+    case 4:
+      return UnpackEntries<4>(rgb, row, columns, palette, n);
+    default:
+      return UnpackEntries<8>(rgb, row, columns, palette, n);
   }
 }
 
@@ -463,6 +483,12 @@ void WriteStrided(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int n) {
       return;
     case -1:
       return WriteEvery<-1>(dst, src, n);
+    case 2:
+      return WriteEvery<2>(dst, src, n);
+    case 3:
+      return WriteEvery<3>(dst, src, n);
+    case 4:
+      return WriteEvery<4>(dst, src, n);
     default:
       for (int i = 0; i < n; ++i) dst[i * step] = src[i];
       return;

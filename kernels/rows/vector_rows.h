@@ -1376,7 +1376,8 @@ void WritePixels(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int bytes, in
 }
 
 void WriteStrided(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int n) {
-  WritePixels(dst, step, src, 1, n);
+  if (step == -1) return WritePixels(dst, step, src, 1, n);
+  scalar::WriteStrided(dst, step, src, n);
 }
 
 constexpr RowOps VectorRows(const char* name) noexcept {
