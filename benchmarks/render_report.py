@@ -95,7 +95,8 @@ def method(results):
         "",
         "- One process, one thread, CPU time of the whole process. Each round gives every contender",
         f"  a slice of at least {context['slice_ns'] / 1e6:g} ms, one after the other; the median of"
-        f" {context['rounds']:g} rounds counts.",
+        f" {context['rounds']:g} rounds counts. Turns change from round to round, and each slice",
+        "  begins with an untimed call, so that all find the caches as they leave them.",
         "- Engines, contexts and intermediate pictures are made outside the timed region, except",
         "  for small pictures, where engines (and swscale's contexts) are created and destroyed",
         "  inside it.",
