@@ -246,6 +246,23 @@ TEST(GreyEdgeCases, TheSecondRowOfAPairBlendsTowardTheLineBelowTheFirst) {
   EXPECT_EQ(EnlargedLines(1), (Bytes{0, 25, 75, 125, 175, 160, 80, 40})) << "row by row";
 }
 
+TEST(GreyEdgeCases, TheSecondRowOfAPairDoesSoWhereItsOwnLineCannotBeRead) {
+  const Engine engine({FORMAT_GRAY8, 8, 4}, {FORMAT_GRAY8, 8, 10}, Param().Bilinear().Pass(2));
+  ASSERT_STREQ(AskChain(&engine.context()).kernel, "Gray2Gray_C_RESAMPLE_BILINEAR_NOROTATE_FAST");
+  // Positions 0.75 and 3.25, of which the latter reads line 2 instead: the last one that it may.
+  EngineContext context = engine.context();
+  context.srcReadBottom = 3;
+  Bytes src(24), dst(16);
+  for (size_t i = 0; i < src.size(); ++i) src[i] = uint8_t(100 * (i / 8));
+  const MRECT rows = {0, 0, 8, 2};
+  const Planes to = OnePlane(dst, 8), from = OnePlane(src, 8);
+  ASSERT_EQ(Gray2Gray_C_RESAMPLE_BILINEAR_NOROTATE_FAST(&rows, to.pitch, from.pitch, to.plane,
+                                                        from.plane, &context),
+            KESTREL_OK);
+  EXPECT_EQ(dst[0], 75);
+  EXPECT_EQ(dst[8], 175) << "three quarters of line 2, one of line 1";
+}
+
 TEST(GreyEdgeCases, BilinearRowsPastTheBottomRepeatTheLastLine) {
   for (const uint32_t mode : {1u, 2u, 3u}) {
     const Engine engine({FORMAT_GRAY8, 8, 8}, {FORMAT_GRAY8, 4, 4},
