@@ -57,7 +57,7 @@ class Pipeline {
   using PlaneRun = Destination::PlaneRun;
   using PixelOrder = Destination::Order;
 
-  // Samples of short rows that are converted at once,.
+  // Samples of short rows that are converted at once, or of groups that are taken apart.
   static constexpr int kCollected = 2048;
 
   // Where a loop row of a plane is on both sides.
@@ -204,9 +204,12 @@ class Pipeline {
     return true;
   }
 
-  // Whether all strips are of whole groups of packed 4:2:2, if they are of an even width.
+  // Whether all rows of all strips are of whole groups of packed 4:2:2, if strips are of an even
+  // width. (Nothing is read but groups then, and strips may be wider than their memory.)
   bool HasGroups() {
-    if (Width() % 2 != 0) return false;
+    const bool oneImage =
+        source_.pitch(1) == source_.pitch(0) && source_.pitch(2) == source_.pitch(0);
+    if (Width() % 2 != 0 || !oneImage) return false;
     SelectColumns(job_.rect.left);
     return source_.Groups(job_.rect.top) != nullptr;
   }

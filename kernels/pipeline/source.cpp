@@ -280,7 +280,8 @@ bool Source::PixelsLieInPlace(int32_t x, int32_t n) const {
 
 const uint8_t* Source::FindGroups(int32_t r) const {
   if (chromaU_.step != 4 || first_.step != 2 || !first_.contiguous || phase_ != 0 ||
-      first_.n != 2 * chromaCount_ || job_.engine.stepY != 0x10000) {
+      first_.n != 2 * chromaCount_ || job_.engine.stepY != 0x10000 ||
+      job_.engine.srcSubsample[4] != 1) {
     return nullptr;
   }
   const int32_t row = SourceRow(r, 1);
