@@ -197,6 +197,29 @@ TEST(YuyvEdgeCases, RedInTheLowestByteIsDeclined) {
   }
 }
 
+// Strips of packed 4:2:2 are wide where rows are groups of luma and chroma. Whoever calls kernels
+// can give each of the planes that point into them a pitch of its own, and rows are not groups
+// then.
+TEST(PackedEdgeCases, PlanesWithPitchesOfTheirOwnGiveThePixelsOfNarrowPieces) {
+  constexpr int32_t kWidth = 3000, kHeight = 4, kPiece = 500;
+  const Engine engine({FORMAT_XBGR8888, kWidth, kHeight}, {FORMAT_YUYV, kWidth, kHeight});
+  const PlaneLayout& layout = engine.context().srcLayout;
+  Bytes src = Counting(size_t{kHeight} * (2 * kWidth + 16));
+  const uint8_t* const from[3] = {src.data() + layout.yOffset, src.data() + layout.uOffset,
+                                  src.data() + layout.vOffset};
+  const int32_t fromPitch[3] = {2 * kWidth, 2 * kWidth + 8, 2 * kWidth + 16};
+  const int32_t toPitch[3] = {4 * kWidth, 0, 0};
+  Bytes whole(size_t{4} * kWidth * kHeight), pieces(whole.size());
+  const auto convert = [&](Bytes* dst, int32_t left, int32_t right) {
+    uint8_t* const to[3] = {dst->data() + ptrdiff_t{4} * left, nullptr, nullptr};
+    const MRECT rect = {left, 0, right, kHeight};
+    EXPECT_EQ(ANY_ANY_C_SLOW(&rect, toPitch, fromPitch, to, from, &engine.context()), KESTREL_OK);
+  };
+  convert(&whole, 0, kWidth);
+  for (int32_t x = 0; x < kWidth; x += kPiece) convert(&pieces, x, x + kPiece);
+  EXPECT_EQ(whole, pieces);
+}
+
 TEST(GreyEdgeCases, SwappedCopiesComeOutTransposed) {
   for (const uint32_t mode : {1u, 2u, 3u}) {
     const Engine engine({FORMAT_GRAY8, 4, 6}, {FORMAT_GRAY8, 6, 4},
