@@ -990,7 +990,7 @@ class Pipeline {
   alignas(64) uint8_t stripMemory_[StripMemory::kSize];
 };
 
-static_assert(sizeof(Pipeline) < size_t{54} * 1024, "camera threads have small stacks");
+static_assert(sizeof(Pipeline) < size_t{53} * 1024, "camera threads have small stacks");
 
 }  // namespace
 

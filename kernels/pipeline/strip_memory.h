@@ -10,7 +10,7 @@ namespace kestrel {
 
 class StripMemory {
  public:
-  static constexpr size_t kSize = size_t{52} * 1024;
+  static constexpr size_t kSize = size_t{51} * 1024;
 
   // Without memory takings are only added up.
   explicit StripMemory(uint8_t* memory) : memory_(memory) {}

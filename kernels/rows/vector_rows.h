@@ -957,9 +957,11 @@ constexpr decltype(PixelConversion::vectors) kConverters[] = {
     ConvertVectors<kForm, ChromaLayout::kPairsOfBA, kPixel>,
 };
 
+// (A function by itself: what three forms prepare would take thrice the stack.)
 template <YuvToRgbForm kForm>
-void ConvertYuv(const PixelRows& rows, const ChromaRows& chroma, const YuvToRgbWide& s,
-                const PixelShape& shape, uint8_t alpha, int n) {
+__attribute__((noinline)) void ConvertYuv(const PixelRows& rows, const ChromaRows& chroma,
+                                          const YuvToRgbWide& s, const PixelShape& shape,
+                                          uint8_t alpha, int n) {
   const ChromaShares shares(s);
   const bool aIsU = shape.blueFirst;
   const ChromaShare& ofA = aIsU ? shares.ofU : shares.ofV;
