@@ -724,7 +724,7 @@ class Pipeline {
     return rows;
   }
 
-  uint8_t* CollectedChroma(int i) { return memory_ + kCollected + ptrdiff_t{i} * 2 * n_; }
+  uint8_t* CollectedChroma(int i) { return &memory_[kCollected + ptrdiff_t{i} * 2 * n_]; }
 
   // Chroma of a row as row i of those collected.
   PixelChroma CollectChroma(int32_t r, int i) {

@@ -49,14 +49,12 @@ template <typename Unpack, typename Pack>
 void RepackFields(Unpack unpack, Pack pack, uint8_t* dst, const uint8_t* src,
                   const PixelFormat& from, const PixelFormat& to, int n) {
   const FieldShifts shifts = ShiftsTo(to);
+  const bool keepsAlpha = from.alphaByte >= 0 && to.alphaByte >= 0;
   ForChannels(unpack, src, from, n, [&](int x, uint8_t* const rgb[3], int count) {
-    uint8_t* const out = dst + ptrdiff_t{x} * to.bytes;
-    pack(out, rgb, to, shifts, {~0u, 0}, count);
-    if (from.alphaByte >= 0 && to.alphaByte >= 0) {
-      uint8_t* const alpha = rgb[0];
-      scalar::UnpackAlpha(alpha, src + ptrdiff_t{x} * from.bytes, from, count);
-      scalar::PutAlpha(out, alpha, to, count);
-    }
+    pack(dst + ptrdiff_t{x} * to.bytes, rgb, to, shifts, {~0u, 0}, count);
+    if (!keepsAlpha) return;
+    scalar::UnpackAlpha(rgb[0], src + ptrdiff_t{x} * from.bytes, from, count);
+    scalar::PutAlpha(dst + ptrdiff_t{x} * to.bytes, rgb[0], to, count);
   });
 }
 

@@ -140,7 +140,7 @@ void LoadWords(uint32_t* words, const uint8_t* src, int n) {
 
 template <int kBytes>
 void UnpackFields(uint8_t* const rgb[3], const uint8_t* src, const PixelFormat& format, int n) {
-  uint32_t words[kWords];
+  uint32_t words[kWords] = {};
   for (int x = 0; x < n; x += kWords) {
     const int count = n - x < kWords ? n - x : kWords;
     LoadWords<kBytes>(words, src + ptrdiff_t{x} * kBytes, count);
