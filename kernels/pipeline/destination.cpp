@@ -145,8 +145,11 @@ Destination::Destination(const Job& job)
 }
 
 int Destination::BufferSize(int columns) const {
-  // Dithered pixels are gathered in tiles in any order.
+  // Of up to four bytes. Those that are dithered are gathered in tiles whatever their order.
   constexpr int kPixels = 4 * PlaneWriter::kTileSize;
+  static_assert(
+      ArrangedSamples::kTurnedSize >= kPixels && ArrangedSamples::kMirroredSize >= kPixels,
+      "arranged samples leave room for tiles");
   switch (order_) {
     case Order::kTurned:
     case Order::kTurnedBackwards:
