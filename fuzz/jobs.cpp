@@ -19,7 +19,8 @@ using differential::Side;
 using testing_support::GuardedBuffer;
 
 constexpr size_t kCapacity = size_t{1} << 22;
-constexpr int64_t kMostPixels = int64_t{1200} * 300;
+constexpr int32_t kLongest = 4800;
+constexpr int64_t kMostPixels = int64_t{kLongest} * 75;
 constexpr int64_t kFarthest = 16777216;  // regions that start beyond are not drawn
 
 // The plainest first, of which zeros are made, then the others.
@@ -178,6 +179,7 @@ int32_t DrawLength(Input* input) {
   const int32_t kind = input->Between(0, 63);
   if (kind == 63) return int32_t(input->Word());
   if (kind == 62) return input->Between(301, 1200);  // more than a strip of a row
+  if (kind == 61) return input->Between(1201, kLongest);  // more than the widest strip
   if (kind >= 60) return input->Between(1, 300);
   return input->Between(1, kind < 40 ? 20 : 70);
 }
