@@ -129,7 +129,7 @@ struct Runs {
   std::vector<int32_t> scaled, scaledPixels, nextPixels, neighbours;
   std::vector<uint16_t> weights;
   std::vector<uint8_t> prepared = std::vector<uint8_t>(3 * kPairs);
-  std::vector<uint8_t> blends = std::vector<uint8_t>(4 * kPairs);
+  std::vector<uint16_t> blends = std::vector<uint16_t>(kPairs);
   kestrel::PairPlan plan = {};
   kestrel::Carry carry = {{7, 3, 7}, {0, 0, 0}};
   const uint8_t* inChannels[3];

@@ -104,7 +104,7 @@ void Source::TakeMemory(StripMemory* memory, int columns) {
   firstPlan_.prepared = memory->Take<uint8_t>(3 * blocks(blends ? columns : columns / 2));
   for (Line& line : lines_) line.samples[0] = memory->Take<uint8_t>(n);
   if (blends) {
-    firstPlan_.blends = memory->Take<uint8_t>(4 * blocks(columns));
+    firstPlan_.blends = memory->Take<uint16_t>(blocks(columns));
     blended_[0] = memory->Take<uint8_t>(n);
   }
   const int chroma = ChromaOf(columns);

@@ -104,10 +104,10 @@ struct PairPlan {
   int32_t apart = 0;  // without `second`: from each first byte to the second
   int stride = 1;
   const uint16_t* weights = nullptr;  // for blendPairs: a weight for each pair
-  // Memory for what is prepared, in whole blocks: 3 bytes for each pair, and 4 for each that has a
-  // weight.
+  // Memory for what is prepared, in whole blocks: 3 bytes for each pair, and a word for each that
+  // has a weight.
   uint8_t* prepared = nullptr;
-  uint8_t* blends = nullptr;
+  uint16_t* blends = nullptr;
 
   int32_t First(int i) const { return first[ptrdiff_t{i} * stride]; }
   int32_t Second(int i) const {

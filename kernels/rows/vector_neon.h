@@ -272,10 +272,10 @@ inline Bytes SwapNeighbours(Bytes b) {
   return {vrev16q_u8(b.v)};
 }
 
-// A sum that products are added to. Compilers would rather add it last, which takes copies of what
-// they begin with instead.
+// A sum that products are added to, or taken from. Compilers would rather add up the products
+// first, and all channels at once, which takes copies and more registers than there are.
 inline Words Fixed(Words sum) {
-  __asm__("" : "+w"(sum.v));
+  __asm__ volatile("" : "+w"(sum.v));
   return sum;
 }
 
@@ -337,22 +337,12 @@ inline void SetShuffle(uint8_t* shuffle, const uint8_t (&at)[16]) {
     window[kShared] = at[2 * k + 1];
   }
 }
-// All bits where a blend begins with the second byte, and the weights.
-inline void SetBlends(uint8_t* blends, const uint16_t* weights) {
-  const Words low = LoadWords(weights);
-  const Words high = LoadWords(weights + 8);
-  vst1q_u8(blends,
-           vcombine_u8(vmovn_u16(ShiftRight<15>(low).v), vmovn_u16(ShiftRight<15>(high).v)));
-  StoreWords(blends + 16, low);
-  StoreWords(blends + 32, high);
-}
-inline void StoreBlended(uint8_t* p, const Pairs& pairs, const uint8_t* blends) {
-  const uint8x16_t base = vbslq_u8(vld1q_u8(blends), pairs.second, pairs.first);
+inline void StoreBlended(uint8_t* p, const Pairs& pairs, const uint16_t* negativeWeights) {
   const uint8x8_t low =
-      Share(vget_low_u8(pairs.first), vget_low_u8(pairs.second), LoadWords(blends + 16));
+      Share(vget_low_u8(pairs.second), vget_low_u8(pairs.first), LoadWords(negativeWeights));
   const uint8x8_t high =
-      Share(vget_high_u8(pairs.first), vget_high_u8(pairs.second), LoadWords(blends + 32));
-  vst1q_u8(p, vaddq_u8(base, vcombine_u8(low, high)));
+      Share(vget_high_u8(pairs.second), vget_high_u8(pairs.first), LoadWords(negativeWeights + 8));
+  vst1q_u8(p, vaddq_u8(pairs.first, vcombine_u8(low, high)));
 }
 inline uint8x8_t Pick(uint8x16_t window, uint8x8_t shuffle) {
 #ifdef __aarch64__
@@ -537,6 +527,18 @@ inline void Turn32(uint8x16_t* a, uint8x16_t* b) {
   *b = vreinterpretq_u8_u32(turned.val[1]);
 }
 
+inline void Turn64(uint8x16_t* a, uint8x16_t* b) {
+#ifdef __aarch64__
+  const uint64x2_t first = vreinterpretq_u64_u8(*a);
+  const uint64x2_t second = vreinterpretq_u64_u8(*b);
+  *a = vreinterpretq_u8_u64(vtrn1q_u64(first, second));
+  *b = vreinterpretq_u8_u64(vtrn2q_u64(first, second));
+#else
+  // Compilers would move all four halves, through further registers.
+  __asm__("vswp %f0, %e1" : "+w"(*a), "+w"(*b));
+#endif
+}
+
 // Eight rows of 16 bytes. (One pointer that moves on costs no instruction; eight pointers do.)
 struct Rows8 {
   uint8x16_t r0, r1, r2, r3, r4, r5, r6, r7;
@@ -561,15 +563,14 @@ class Columns {
     vst1_u8(dst_, column);
     dst_ += pitch_;
   }
-  // A column's first half and second half.
-  void Put(uint8x8_t first, uint8x8_t second) {
-    vst1q_u8(dst_, vcombine_u8(first, second));
+  void Put(uint8x16_t column) {
+    vst1q_u8(dst_, column);
     dst_ += pitch_;
   }
-  // A column of four quarters.
-  void Put(uint8x8_t first, uint8x8_t second, uint8x8_t third, uint8x8_t fourth) {
-    vst1q_u8(dst_, vcombine_u8(first, second));
-    vst1q_u8(dst_ + 16, vcombine_u8(third, fourth));
+  // A column's first half and second half.
+  void Put(uint8x16_t first, uint8x16_t second) {
+    vst1q_u8(dst_, first);
+    vst1q_u8(dst_ + 16, second);
     dst_ += pitch_;
   }
 
@@ -630,15 +631,19 @@ struct Block16 {
     Turn32(&r.r1, &r.r3);
     Turn32(&r.r4, &r.r6);
     Turn32(&r.r5, &r.r7);
+    Turn64(&r.r0, &r.r4);
+    Turn64(&r.r1, &r.r5);
+    Turn64(&r.r2, &r.r6);
+    Turn64(&r.r3, &r.r7);
     Columns columns(dst, dstPitch);
-    columns.Put(vget_low_u8(r.r0), vget_low_u8(r.r4));
-    columns.Put(vget_low_u8(r.r1), vget_low_u8(r.r5));
-    columns.Put(vget_low_u8(r.r2), vget_low_u8(r.r6));
-    columns.Put(vget_low_u8(r.r3), vget_low_u8(r.r7));
-    columns.Put(vget_high_u8(r.r0), vget_high_u8(r.r4));
-    columns.Put(vget_high_u8(r.r1), vget_high_u8(r.r5));
-    columns.Put(vget_high_u8(r.r2), vget_high_u8(r.r6));
-    columns.Put(vget_high_u8(r.r3), vget_high_u8(r.r7));
+    columns.Put(r.r0);
+    columns.Put(r.r1);
+    columns.Put(r.r2);
+    columns.Put(r.r3);
+    columns.Put(r.r4);
+    columns.Put(r.r5);
+    columns.Put(r.r6);
+    columns.Put(r.r7);
   }
 };
 
@@ -652,11 +657,15 @@ struct Block32 {
     Turn32(&r.r2, &r.r3);
     Turn32(&r.r4, &r.r5);
     Turn32(&r.r6, &r.r7);
+    Turn64(&r.r0, &r.r2);
+    Turn64(&r.r1, &r.r3);
+    Turn64(&r.r4, &r.r6);
+    Turn64(&r.r5, &r.r7);
     Columns columns(dst, dstPitch);
-    columns.Put(vget_low_u8(r.r0), vget_low_u8(r.r2), vget_low_u8(r.r4), vget_low_u8(r.r6));
-    columns.Put(vget_low_u8(r.r1), vget_low_u8(r.r3), vget_low_u8(r.r5), vget_low_u8(r.r7));
-    columns.Put(vget_high_u8(r.r0), vget_high_u8(r.r2), vget_high_u8(r.r4), vget_high_u8(r.r6));
-    columns.Put(vget_high_u8(r.r1), vget_high_u8(r.r3), vget_high_u8(r.r5), vget_high_u8(r.r7));
+    columns.Put(r.r0, r.r4);
+    columns.Put(r.r1, r.r5);
+    columns.Put(r.r2, r.r6);
+    columns.Put(r.r3, r.r7);
   }
 };
 

@@ -226,6 +226,16 @@ inline bool IsForNarrower(const PairPlan& plan) {
   return !kIsNarrowest && plan.n < kPairs;
 }
 
+// Weights are unsigned. A blend whose weight is 0.5 or more begins with the second byte: its pair
+// is planned the other way around, and the rest of the weight counts. For all, what is kept is the
+// negative of the weight, down to -0.5, by which the first byte less the second is multiplied.
+inline bool BeginsWithSecond(const PairPlan& plan, int pair) {
+  return plan.weights != nullptr && plan.weights[pair] >= 32768;
+}
+inline uint16_t NegativeWeight(uint16_t weight) {
+  return weight >= 32768 ? weight : uint16_t(-weight);
+}
+
 // Whether all pairs have windows. One for each eight pairs is given up with the first that has
 // none.
 template <int kWindows>
@@ -238,8 +248,9 @@ bool PlanWindows(PairPlan* plan, int32_t lowest, int32_t end) {
     const int first = FirstPairOf(*plan, i / kPairs) + 8 * eight;
     for (int k = 0; k < 8; ++k) {
       const int pair = first + k < plan->n ? first + k : plan->n - 1;
-      offsets[2 * k] = plan->First(pair);
-      offsets[2 * k + 1] = plan->Second(pair);
+      const bool swap = BeginsWithSecond(*plan, pair);
+      offsets[2 * k] = swap ? plan->Second(pair) : plan->First(pair);
+      offsets[2 * k + 1] = swap ? plan->First(pair) : plan->Second(pair);
     }
     uint8_t* const block = plan->prepared + 3 * (i - i % kPairs);
     uint8_t at[16];
@@ -273,9 +284,10 @@ void PlanPairs(PairPlan* plan) {
   for (int block = 0; block < BlocksOf(*plan); ++block) {
     const int first = FirstPairOf(*plan, block);
     const int n = plan->n - first < kPairs ? plan->n - first : kPairs;
-    uint16_t weights[kPairs] = {};
-    memcpy(weights, plan->weights + first, size_t(n) * sizeof(uint16_t));
-    SetBlends(plan->blends + 4 * kPairs * block, weights);
+    uint16_t* const blends = plan->blends + kPairs * block;
+    for (int i = 0; i < kPairs; ++i) {
+      blends[i] = i < n ? NegativeWeight(plan->weights[first + i]) : uint16_t{0};
+    }
   }
 }
 
@@ -338,11 +350,11 @@ void ReadPairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan) {
 
 void BlendPairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan) {
   if (IsForNarrower(plan)) return kNarrower.blendPairs(dst, src, plan);
-  const uint8_t* const blends = plan.blends;
+  const uint16_t* const blends = plan.blends;
   ForPairs<1>(
       dst, src, plan,
       [=](uint8_t* out, const Pairs& pairs, int block) {
-        StoreBlended(out, pairs, blends + 4 * kPairs * block);
+        StoreBlended(out, pairs, blends + kPairs * block);
       },
       [=, &plan](int i, int end) { scalar::BlendSomePairs(dst, src, plan, i, end); });
 }
@@ -663,9 +675,10 @@ class SixBitStage {
     const auto plus = [&](Words offset) {
       return WordsPair{Fixed(luma.low + offset), Fixed(luma.high + offset)};
     };
+    const auto fixed = [](WordsPair sum) { return WordsPair{Fixed(sum.low), Fixed(sum.high)}; };
     const auto narrow = [](WordsPair sum) { return NarrowShifted<6>(sum.low, sum.high); };
-    return {narrow(MultiplyAdd(plus(offsetA_), a, a_)),
-            narrow(MultiplySubtract(MultiplySubtract(plus(greenOffset_), a, greenA_), b, greenB_)),
+    const WordsPair green = fixed(MultiplySubtract(plus(greenOffset_), a, greenA_));
+    return {narrow(MultiplyAdd(plus(offsetA_), a, a_)), narrow(MultiplySubtract(green, b, greenB_)),
             narrow(MultiplyAdd(plus(offsetB_), b, b_))};
   }
 

@@ -72,9 +72,9 @@ inline Pairs GatherPairs(const uint8_t* src, const uint8_t* block) {
   return {{GatherWords<kWindows>(src, window, block + kPairs),
            GatherWords<kWindows>(src, window + kHalf, block + kPairs + kBytes)}};
 }
-inline void StoreBlended(uint8_t* p, const Pairs& pairs, const uint8_t* blends) {
-  StoreBytes(p, InOrder(Narrow(Blended(pairs.words[0], blends, blends + 2 * kBytes),
-                               Blended(pairs.words[1], blends + kBytes, blends + 3 * kBytes))));
+inline void StoreBlended(uint8_t* p, const Pairs& pairs, const uint16_t* negativeWeights) {
+  StoreBytes(p, InOrder(Narrow(Blended(pairs.words[0], negativeWeights),
+                               Blended(pairs.words[1], negativeWeights + kWords))));
 }
 inline Bytes SwapNeighbours(Bytes b) {
   const Words w = {b.v};

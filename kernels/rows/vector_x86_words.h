@@ -264,20 +264,10 @@ template <int kShared>
 inline void SetShuffle(uint8_t* shuffle, const uint8_t (&at)[16]) {
   Store16(shuffle, Load16(at));
 }
-// What each byte of a pair counts in the byte that its blend begins with, and the weights.
-inline void SetBlends(uint8_t* blends, const uint16_t* weights) {
-  for (int half = 0; half < 2; ++half) {
-    const Words w = LoadWords(weights + half * kWords);
-    const Words isSecond = ShiftRightUnsigned<15>(w);
-    StoreWords(blends + half * kBytes, ShiftLeft<8>(isSecond) | (isSecond ^ SetWords(1)));
-    StoreWords(blends + (2 + half) * kBytes, w);
-  }
-}
-inline Words Blended(Words pairs, const uint8_t* base, const uint8_t* weights) {
-  const Register minusFirst = KESTREL_SIMD(set1_epi16)(0x01FF);
-  const Words difference = {KESTREL_SIMD(maddubs_epi16)(pairs.v, minusFirst)};
-  const Words start = {KESTREL_SIMD(maddubs_epi16)(pairs.v, Load(base))};
-  return AddHighProduct(start, difference, LoadWords(weights));
+inline Words Blended(Words pairs, const uint16_t* negativeWeights) {
+  const Register lessSecond = KESTREL_SIMD(set1_epi16)(int16_t(0xFF01));
+  const Words difference = {KESTREL_SIMD(maddubs_epi16)(pairs.v, lessSecond)};
+  return AddHighProduct(pairs & SetWords(0xFF), difference, LoadWords(negativeWeights));
 }
 
 // ---- Between bytes and words

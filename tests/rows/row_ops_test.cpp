@@ -364,7 +364,7 @@ void BlendPairs(Trial* trial, const RowOps& ops, int n, int variant) {
   std::vector<uint16_t> drawn(size_t(pairs.plan.n), 0);
   std::generate(drawn.begin(), drawn.end(), [trial] { return uint16_t(DrawWeight(trial)); });
   pairs.plan.weights = trial->Source(drawn);
-  std::vector<uint8_t> blends(4 * ((drawn.size() + 63) / 64 * 64));
+  std::vector<uint16_t> blends(Pairs::WholeBlocks(pairs.plan.n));
   pairs.plan.blends = blends.data();
   const auto dst = trial->Written(size_t(pairs.plan.n));
   for (ptrdiff_t i = 0; i < pairs.plan.n; ++i) {
