@@ -144,8 +144,8 @@ MBITMAP Describe(const MPPFORMAT& record, const uint8_t* const* planes, const in
   return bitmap;
 }
 
-// A dump reads all rows, and those of pairs whole: not where the pitch is not that of the plane, nor
-// where U and V have memory of their own.
+// A dump reads all rows, and those of pairs whole: not where the pitch is not that of the plane,
+// nor where U and V have memory of their own.
 bool CanBeDumped(const fuzz::Job& job) {
   const differential::Side& side = job.drawn.dst;
   const bool isSplit =
