@@ -658,6 +658,10 @@ class Pipeline {
       } else {
         const uint8_t* const luma = source_.Luma(r + i, into);
         if (luma != into) memcpy(into, luma, size_t(n_));
+        if (i > 0 && source_.MakesChromaPairs()) {
+          source_.MakeChromaPairs(r + i, CollectedChroma(i));
+          continue;
+        }
         row = CollectChroma(r + i, i);
       }
       if (i == 0) collected.chroma = row;

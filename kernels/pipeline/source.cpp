@@ -13,8 +13,23 @@ bool HasSwappedLuma(uint32_t code) {
 
 void SampleColumns::Finish(int count) {
   n = count;
+  const int32_t first = offset[0];
+  const int32_t last = offset[n - 1];
+  AskFor(first < last ? first : last, (first < last ? last : first) + step);
   contiguous = true;
   for (int i = 1; i < n && contiguous; ++i) contiguous = offset[i] - offset[i - 1] == step;
+}
+
+void SampleColumns::SetAll(int64_t sample, int count) {
+  n = count;
+  contiguous = true;
+  Set(0, sample);
+  AskFor(offset[0], offset[0] + n * int64_t{step});
+}
+
+void SampleColumns::AskFor(int32_t from, int64_t to) {
+  askFrom = from;
+  askTo = to - from < wide ? int32_t(to) + kCacheLine - 1 : from;
 }
 
 void SampleColumns::Plan(const RowOps& rows) const {
@@ -59,6 +74,20 @@ Source::Source(const Job& job)
   chromaU_.step = chromaV_.step = layout.step[1];
   first_.plan = &firstPlan_;
   chromaU_.plan = second_.plan = &chromaPlan_;
+  constexpr int64_t kAhead = 6;  // rows of the destination
+  const auto halfRow = [&job](int plane) {
+    const int64_t pitch = job.srcPitches[plane];
+    return int32_t((pitch < 0 ? -pitch : pitch) / 2);
+  };
+  first_.wide = second_.wide = halfRow(0);
+  chromaU_.wide = halfRow(1);
+  chromaV_.wide = halfRow(2);
+  for (int chroma = 0; chroma < 2; ++chroma) {
+    const int64_t factor = chroma != 0 ? job.engine.srcSubsample[4] : 1;
+    const int64_t ahead = kAhead * job.engine.stepY / (factor * 65536);
+    rowsAhead_[chroma] = ahead < 2 ? 2 : int32_t(ahead);
+    endOfAsking_[chroma] = int32_t(job.engine.srcReadBottom / factor) - rowsAhead_[chroma];
+  }
 }
 
 int Source::ChromaOf(int columns) const {
@@ -129,9 +158,7 @@ void Source::SelectColumns(int32_t x, int n) {
   lines_[0].row = lines_[1].row = -1;
   // Side by side: the first column says it all, and the strip may be of any width.
   if (palette_ == nullptr && !swappedLuma_ && columnPositions_.Advance(x, n)) {
-    first_.n = n;
-    first_.contiguous = true;
-    first_.Set(0, columnPositions_.At(x).first);
+    first_.SetAll(columnPositions_.At(x).first, n);
     return;
   }
   const int32_t exchange = swappedLuma_ ? 1 : 0;
@@ -181,7 +208,7 @@ void Source::SelectChromaPairs(int32_t x, const int32_t* columns, int n) {
 
 const uint8_t* Source::ChromaPairs(int32_t r, uint8_t* into) {
   const int32_t row = rowPositions_.At(r, job_.engine.srcSubsample[4]).first;
-  const uint8_t* const pairs = RowStart(chromaPairs(), row);
+  const uint8_t* const pairs = RowToRead(chromaPairs(), row, chromaU_);
   if (chromaU_.contiguous) return pairs + chromaU_.offset[0];
   rows_.readPairs(into, pairs, chromaPlan_);
   return into;
@@ -213,7 +240,7 @@ void Source::SelectPixelChroma(int32_t x, int n) {
       vFromU < chromaU_.step && -vFromU < chromaU_.step && job_.srcPitches[1] == job_.srcPitches[2];
   if (grouped) {
     pixelChroma_ = PixelChromaRead::kPairs;
-    chromaU_.n = n;
+    chromaU_.Finish(n);
     chromaU_.PlanApart(int32_t(vFromU), rows_);
   } else {
     pixelChroma_ = PixelChromaRead::kGathered;
@@ -243,10 +270,11 @@ PixelChroma Source::ReadChroma(int32_t row, uint8_t* into) {
       rows_.readStrided(second, v + start, chromaU_.step, chromaCount_);
       return {{into, second, shift_, 1, 0, 0, 0}, phase_};
     case PixelChromaRead::kPairs:
-      rows_.readPairs(into, u, chromaPlan_);
+      rows_.readPairs(into, RowToRead(1, row, chromaU_), chromaPlan_);
       return {{into, into + 1, 0, 2, 0, 0, 0}};
     default:
-      return {{ReadSamples(into, u, chromaU_), ReadSamples(second, v, chromaU_), 0, 1, 0, 0, 0}};
+      return {{ReadSamples(into, RowToRead(1, row, chromaU_), chromaU_),
+               ReadSamples(second, RowToRead(2, row, chromaU_), chromaU_), 0, 1, 0, 0, 0}};
   }
 }
 
@@ -377,7 +405,7 @@ void Source::Gather(uint8_t* into, const uint8_t* row, const SampleColumns& colu
 }
 
 void Source::FillLumaLine(Line* line, int32_t row) {
-  const uint8_t* start = RowStart(0, row);
+  const uint8_t* start = RowToRead(0, row, first_);
   if (interpolates_) {
     rows_.blendPairs(line->samples[0], start, firstPlan_);
     line->channel[0] = line->samples[0];
@@ -387,7 +415,7 @@ void Source::FillLumaLine(Line* line, int32_t row) {
 }
 
 void Source::FillRgbLine(Line* line, int32_t row) {
-  const uint8_t* start = RowStart(0, row);
+  const uint8_t* start = RowToRead(0, row, first_);
   uint8_t* const rgb[3] = {line->samples[0], line->samples[1], line->samples[2]};
   ReadPixels(rgb, start, first_);
   for (int c = 0; c < 3; ++c) line->channel[c] = rgb[c];
@@ -408,10 +436,11 @@ void Source::FillRgbLine(Line* line, int32_t row) {
   for (int c = 0; c < 3; ++c) rows_.blendColumns(rgb[c], rgb[c], second[c], weights_, first_.n);
 }
 
-void Source::FetchLines(int32_t r, Fill fill, Line** first, Line** second, uint16_t* weight) {
+template <void (Source::*kFill)(Source::Line*, int32_t)>
+Source::Lines Source::FetchLines(int32_t r) {
   const Taps taps = rowPositions_.At(r, 1);
-  const auto refill = [=](Line* line, int32_t row) {
-    (this->*fill)(line, row);
+  const auto refill = [this](Line* line, int32_t row) {
+    (this->*kFill)(line, row);
     line->row = row;
   };
   Line* a = &lines_[0];
@@ -428,30 +457,28 @@ void Source::FetchLines(int32_t r, Fill fill, Line** first, Line** second, uint1
       refill(a, taps.first);
     }
   }
-  *first = *second = a;
-  *weight = taps.first == taps.second ? uint16_t{0} : taps.weight;
-  if (*weight == 0) return;
+  if (taps.weight == 0 || taps.first == taps.second) return {a, a, 0};
   if (b->row != taps.second) refill(b, taps.second);
-  *second = b;
+  return {a, b, taps.weight};
 }
 
 const uint8_t* Source::Luma(int32_t r, uint8_t* into) {
   // Rows that are neither blended nor used again.
   const bool once = into != nullptr && job_.engine.stepY >= 0x10000 && !interpolates_;
-  if (once && !BlendsRows(r)) return ReadSamples(into, RowStart(0, SourceRow(r, 1)), first_);
-  Line *first, *second;
-  uint16_t weight;
-  FetchLines(r, &Source::FillLumaLine, &first, &second, &weight);
-  if (weight == 0) return first->channel[0];
+  if (once && !BlendsRows(r))
+    return ReadSamples(into, RowToRead(0, SourceRow(r, 1), first_), first_);
+  const Lines lines = FetchLines<&Source::FillLumaLine>(r);
+  if (lines.weight == 0) return lines.first->channel[0];
   uint8_t* const blended = into != nullptr ? into : blended_[0];
-  rows_.blendRows(blended, first->channel[0], second->channel[0], weight, first_.n);
+  rows_.blendRows(blended, lines.first->channel[0], lines.second->channel[0], lines.weight,
+                  first_.n);
   return blended;
 }
 
 const uint8_t* Source::Chroma(int plane, int32_t r, const SampleColumns& columns, uint8_t* buffer) {
   if (job_.engine.srcLayout.code == CODE_GRAY8) return buffer;
   const int32_t row = rowPositions_.At(r, job_.engine.srcSubsample[4]).first;
-  return ReadSamples(buffer, RowStart(plane, row), columns);
+  return ReadSamples(buffer, RowToRead(plane, row, columns), columns);
 }
 
 const uint8_t* Source::U(int32_t r) {
@@ -463,7 +490,7 @@ const uint8_t* Source::V(int32_t r) {
 }
 
 void Source::FillPixelLine(Line* line, int32_t row) {
-  const uint8_t* const start = RowStart(0, row);
+  const uint8_t* const start = RowToRead(0, row, first_);
   uint8_t* const pixels = line->samples[0];
   line->channel[0] = pixels;
   if (interpolates_) {
@@ -489,16 +516,14 @@ bool Source::BlendsRows(int32_t r) const {
 const uint8_t* Source::Pixels(int32_t r, uint8_t* into) {
   if (!HasPixels(r)) return nullptr;
   if (interpolates_ || BlendsRows(r)) {
-    Line *first, *second;
-    uint16_t weight;
-    FetchLines(r, &Source::FillPixelLine, &first, &second, &weight);
-    if (weight == 0) return first->channel[0];
+    const Lines lines = FetchLines<&Source::FillPixelLine>(r);
+    if (lines.weight == 0) return lines.first->channel[0];
     uint8_t* const blended = into != nullptr ? into : blended_[0];
-    rows_.blendPixelRows(blended, first->channel[0], second->channel[0], weight, pixels_.alphaByte,
-                         first_.n);
+    rows_.blendPixelRows(blended, lines.first->channel[0], lines.second->channel[0], lines.weight,
+                         pixels_.alphaByte, first_.n);
     return blended;
   }
-  const uint8_t* const row = RowStart(0, SourceRow(r, 1));
+  const uint8_t* const row = RowToRead(0, SourceRow(r, 1), first_);
   if (first_.contiguous) return row + first_.offset[0];
   uint8_t* const gathered = into != nullptr ? into : packed_;
   Gather(gathered, row, first_);
@@ -520,13 +545,13 @@ int Source::RowsAlike(int32_t r, int most) const {
 }
 
 RgbRun Source::Rgb(int32_t r) {
-  Line *first, *second;
-  uint16_t weight;
-  FetchLines(r, &Source::FillRgbLine, &first, &second, &weight);
-  RgbRun run = {{first->channel[0], first->channel[1], first->channel[2]}, first->alpha};
-  if (weight == 0) return run;
+  const Lines lines = FetchLines<&Source::FillRgbLine>(r);
+  const uint8_t* const* const first = lines.first->channel;
+  const uint8_t* const* const second = lines.second->channel;
+  RgbRun run = {{first[0], first[1], first[2]}, lines.first->alpha};
+  if (lines.weight == 0) return run;
   for (int c = 0; c < 3; ++c) {
-    rows_.blendRows(blended_[c], first->channel[c], second->channel[c], weight, first_.n);
+    rows_.blendRows(blended_[c], first[c], second[c], lines.weight, first_.n);
     run.channel[c] = blended_[c];
   }
   return run;

@@ -8,6 +8,8 @@
 
 namespace kestrel {
 
+constexpr int kCacheLine = 64;
+
 // Where one component of each strip column lies in a source row. Computed once per strip, used for
 // all its rows.
 struct SampleColumns {
@@ -15,10 +17,17 @@ struct SampleColumns {
   ptrdiff_t step = 1;         // bytes between neighbouring samples of the row
   bool contiguous = false;    // offsets rise by exactly `step`
   int32_t* offset = nullptr;  // bytes from the start of the row
-  PairPlan* plan = nullptr;   // unless contiguous: how they are read, if there is room for that
+  // The bytes of a row that are asked for before it is read. A strip much narrower than the picture
+  // is read in short pieces that lie far apart, which no CPU foresees; in others it is none.
+  int32_t askFrom = 0, askTo = 0;
+  int32_t wide = 0;          // bytes of a row that the CPU finds by itself
+  PairPlan* plan = nullptr;  // unless contiguous: how they are read, if there is room for that
 
   void Set(int i, int64_t sample) const { offset[i] = int32_t(sample * step); }
   void Finish(int count);
+  // All of n samples, side by side from one on.
+  void SetAll(int64_t sample, int count);
+  void AskFor(int32_t from, int64_t to);
   void Plan(const RowOps& rows) const;
   // Pairs of each column's sample and another, with weights or null.
   void PlanWith(const int32_t* second, const uint16_t* weights, const RowOps& rows) const;
@@ -110,6 +119,12 @@ class Source {
   PixelChroma ChromaOfPixels(int32_t r, uint8_t* into) {
     return ReadChroma(rowPositions_.At(r, job_.engine.srcSubsample[4]).first, into);
   }
+  // Whether chroma is made as pairs, and how, when nothing else about it is wanted.
+  bool MakesChromaPairs() const { return pixelChroma_ == PixelChromaRead::kPairs; }
+  void MakeChromaPairs(int32_t r, uint8_t* into) {
+    const int32_t row = rowPositions_.At(r, job_.engine.srcSubsample[4]).first;
+    rows_.readPairs(into, RowToRead(1, row, chromaU_), chromaPlan_);
+  }
   int chromaCount() const { return chromaCount_; }
   bool ChromaIsGrey() const { return pixelChroma_ == PixelChromaRead::kGrey; }
   // Where the luma of the strip lies in the source as it is wanted; null when it does not.
@@ -141,6 +156,19 @@ class Source {
   const uint8_t* RowStart(int plane, int32_t row) const {
     return job_.srcPlanes[plane] + ptrdiff_t(job_.srcPitches[plane]) * row;
   }
+  // The same for a row whose samples are about to be read; asks for those of a later one.
+  const uint8_t* RowToRead(int plane, int32_t row, const SampleColumns& columns) const {
+    const uint8_t* const start = RowStart(plane, row);
+    const int chroma = plane != 0 ? 1 : 0;
+    if (columns.askFrom < columns.askTo && row < endOfAsking_[chroma]) {
+      const uint8_t* const later = start + ptrdiff_t{job_.srcPitches[plane]} * rowsAhead_[chroma];
+      for (int32_t i = columns.askFrom; i < columns.askTo; i += 2 * kCacheLine) {
+        __builtin_prefetch(later + i);
+        __builtin_prefetch(later + i + kCacheLine);
+      }
+    }
+    return start;
+  }
   const uint8_t* ReadSamples(uint8_t* buffer, const uint8_t* row,
                              const SampleColumns& columns) const;
   void ReadPixels(uint8_t* const rgb[3], const uint8_t* row, const SampleColumns& columns);
@@ -157,9 +185,14 @@ class Source {
   void FillLumaLine(Line* line, int32_t row);
   void FillRgbLine(Line* line, int32_t row);
   void FillPixelLine(Line* line, int32_t row);
-  using Fill = void (Source::*)(Line*, int32_t);
   // Both lines of a loop row, or the same one twice when only the first counts.
-  void FetchLines(int32_t r, Fill fill, Line** first, Line** second, uint16_t* weight);
+  struct Lines {
+    const Line* first;
+    const Line* second;
+    uint32_t weight;  // of the second
+  };
+  template <void (Source::*kFill)(Line*, int32_t)>
+  Lines FetchLines(int32_t r);
 
   const Job& job_;
   const RowOps& rows_;
@@ -170,6 +203,8 @@ class Source {
   bool swappedLuma_;
   bool wantsAlpha_;            // it is copied to the destination
   bool interpolates_ = false;  // some column of the strip has a weight
+  // For luma or pixels, and for chroma.
+  int32_t rowsAhead_[2], endOfAsking_[2];
 
   // How chroma of pixels is had: the same for every pixel, or lying in the source side by side, or
   // in both components' samples with a step, or with both in one plan of pairs, or one by one.

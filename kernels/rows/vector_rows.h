@@ -298,32 +298,41 @@ bool HasWindows(const uint8_t* block) {
   return windows >= 0;
 }
 
+template <typename Store>
+inline void StoreBlock(uint8_t* out, const uint8_t* src, const PairPlan& plan, int block,
+                       const Store& store) {
+  const uint8_t* const prepared = plan.prepared + 3 * kPairs * block;
+  if (plan.windows == 1) {
+    store(out, GatherPairs<1>(src, prepared), block);
+  } else {
+    store(out, GatherPairs<2>(src, prepared), block);
+  }
+}
+
+// ForPairs where some have no windows. (Apart, because it would cost the others registers.)
+template <int kDstUnit, typename Store, typename Other>
+__attribute__((noinline)) void ForSomePairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan,
+                                            const Store& store, const Other& other) {
+  const int whole = plan.n / kPairs;
+  for (int block = 0; block < whole; ++block) {
+    if (HasWindows(plan.prepared + 3 * kPairs * block)) {
+      StoreBlock(dst + block * kPairs * kDstUnit, src, plan, block, store);
+    } else {
+      other(block * kPairs, (block + 1) * kPairs);
+    }
+  }
+  other(whole * kPairs, plan.n);
+}
+
 // Calls store(dst, pairs, block) for each block of a plan whose pairs have windows, other(i, end)
 // for the pairs of any other.
 template <int kDstUnit, typename Store, typename Other>
 inline void ForPairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan, const Store& store,
                      const Other& other) {
+  if (!plan.hasWindows) return ForSomePairs<kDstUnit>(dst, src, plan, store, other);
   const int n = plan.n;
   const int whole = n / kPairs;
   const uint8_t* prepared = plan.prepared;
-  const auto storeOne = [&](uint8_t* out, int block) {
-    if (plan.windows == 1) {
-      store(out, GatherPairs<1>(src, prepared), block);
-    } else {
-      store(out, GatherPairs<2>(src, prepared), block);
-    }
-  };
-  if (!plan.hasWindows) {
-    for (int block = 0; block < whole; ++block, prepared += 3 * kPairs) {
-      if (HasWindows(prepared)) {
-        storeOne(dst + block * kPairs * kDstUnit, block);
-      } else {
-        other(block * kPairs, (block + 1) * kPairs);
-      }
-    }
-    other(whole * kPairs, n);
-    return;
-  }
   uint8_t* out = dst;
   if (plan.windows == 1) {
     for (int block = 0; block < whole; ++block, prepared += 3 * kPairs, out += kPairs * kDstUnit) {
@@ -335,9 +344,11 @@ inline void ForPairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan, con
     }
   }
   if (whole * kPairs == n) return;
-  if (whole > 0) return storeOne(dst + (n - kPairs) * kDstUnit, whole);
+  if (whole > 0) {
+    return StoreBlock(dst + (n - kPairs) * kDstUnit, src, plan, whole, store);
+  }
   uint8_t rest[kPairs * kDstUnit];
-  storeOne(rest, 0);
+  StoreBlock(rest, src, plan, 0, store);
   memcpy(dst, rest, size_t(n) * kDstUnit);
 }
 
