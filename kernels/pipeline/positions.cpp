@@ -47,6 +47,47 @@ bool ColumnPositions::Advance(int32_t x, int32_t n) const {
   return true;
 }
 
+bool ColumnPositions::ArePlain(int32_t x, int32_t n) const {
+  const int64_t left = (start_ + step_ * x) >> 16;
+  const int64_t right = (start_ + step_ * (int64_t{x} + n - 1)) >> 16;
+  const bool inside = noEdges_ ? left >= srcLeft_ && right <= srcLast_
+                               : x >= coveredLeft_ && int64_t{x} + n <= coveredLast_;
+  return !pairEdges_ && inside && left >= 0 && right < readableLast_;
+}
+
+void ColumnPositions::Read(int32_t x, int32_t n, int32_t* first, int32_t* second,
+                           uint16_t* weights) const {
+  constexpr int32_t kRun = 64;
+  constexpr int64_t kLargestStep = INT32_MAX / (kRun + 1);
+  for (int32_t from = 0; from < n; from += kRun) {
+    const int32_t count = n - from < kRun ? n - from : kRun;
+    if (step_ > kLargestStep || !ArePlain(x + from, count)) {
+      for (int32_t i = from; i < from + count; ++i) {
+        const Taps taps = At(x + i);
+        first[i] = taps.first;
+        if (second != nullptr) second[i] = taps.second;
+        if (weights != nullptr) weights[i] = taps.weight;
+      }
+      continue;
+    }
+    // Positions from the run's first column on, which vectors have room for.
+    const int64_t position = start_ + step_ * (x + from);
+    const int32_t column = int32_t(position >> 16);
+    const uint32_t fraction = uint32_t(position) & 0xFFFF;
+    const uint32_t step = uint32_t(step_);
+    for (int32_t i = 0; i < count; ++i) {
+      first[from + i] = column + int32_t((fraction + uint32_t(i) * step) >> 16);
+    }
+    if (second != nullptr) {
+      for (int32_t i = from; i < from + count; ++i) second[i] = first[i] + 1;
+    }
+    if (weights == nullptr) continue;
+    for (int32_t i = 0; i < count; ++i) {
+      weights[from + i] = bilinear_ ? uint16_t(fraction + uint32_t(i) * step) : uint16_t{0};
+    }
+  }
+}
+
 RowPositions::RowPositions(const Job& job)
     : start_(Start(job.engine.srcOriginY, job.engine.dstOriginY, job.engine.stepY,
                    job.engine.bilinear != 0)),

@@ -18,10 +18,15 @@ class ColumnPositions {
  public:
   explicit ColumnPositions(const Job& job);
   Taps At(int32_t x) const;
+  // What At says of n columns; the last two only where they are given.
+  void Read(int32_t x, int32_t n, int32_t* first, int32_t* second, uint16_t* weights) const;
   // Whether each of the n columns from x reads the source column after its predecessor's.
   bool Advance(int32_t x, int32_t n) const;
 
  private:
+  // Whether nothing about the n columns from x is clamped.
+  bool ArePlain(int32_t x, int32_t n) const;
+
   int64_t start_, step_;
   int32_t coveredLeft_, coveredLast_;  // destination columns whose sources are inside srcRect
   int32_t srcLeft_, srcLast_;

@@ -20,6 +20,14 @@ void SampleColumns::Finish(int count) {
   for (int i = 1; i < n && contiguous; ++i) contiguous = offset[i] - offset[i - 1] == step;
 }
 
+void SampleColumns::FinishSamples(int count) {
+  const int32_t bytes = int32_t(step);
+  if (bytes != 1) {
+    for (int i = 0; i < count; ++i) offset[i] *= bytes;
+  }
+  Finish(count);
+}
+
 void SampleColumns::SetAll(int64_t sample, int count) {
   n = count;
   contiguous = true;
@@ -161,17 +169,18 @@ void Source::SelectColumns(int32_t x, int n) {
     first_.SetAll(columnPositions_.At(x).first, n);
     return;
   }
-  const int32_t exchange = swappedLuma_ ? 1 : 0;
-  for (int i = 0; i < n; ++i) {
-    const Taps taps = columnPositions_.At(x + i);
-    first_.Set(i, taps.first ^ exchange);
-    if (weights_ == nullptr) continue;
-    second_.Set(i, taps.second ^ exchange);
-    weights_[i] = taps.weight;
-    if (taps.weight != 0) interpolates_ = true;
+  columnPositions_.Read(x, n, first_.offset, second_.offset, weights_);
+  if (swappedLuma_) {
+    for (int i = 0; i < n; ++i) first_.offset[i] ^= 1;
+    for (int i = 0; second_.offset != nullptr && i < n; ++i) second_.offset[i] ^= 1;
   }
-  first_.Finish(n);
-  if (interpolates_) second_.Finish(n);
+  if (weights_ != nullptr) {
+    uint16_t any = 0;
+    for (int i = 0; i < n; ++i) any |= weights_[i];
+    interpolates_ = any != 0;
+  }
+  first_.FinishSamples(n);
+  if (interpolates_) second_.FinishSamples(n);
   if (job_.engine.srcLayout.code == CODE_RGB) {
     // Pixels are gathered whole; those of two bytes are pairs of them.
     if (pixels_.bytes != 2 || palette_ != nullptr) return;
@@ -232,19 +241,22 @@ void Source::SelectPixelChroma(int32_t x, int n) {
     pixelChroma_ = inPlace ? PixelChromaRead::kInPlace : PixelChromaRead::kStrided;
     return;
   }
-  for (int i = 0; i < n; ++i) {
-    chromaU_.Set(i, columnPositions_.At(x + i).first / int32_t(factor));
+  columnPositions_.Read(x, n, chromaU_.offset, nullptr, nullptr);
+  if (factor == 2) {
+    for (int i = 0; i < n; ++i) chromaU_.offset[i] >>= 1;
+  } else if (factor > 2) {
+    for (int i = 0; i < n; ++i) chromaU_.offset[i] /= int32_t(factor);
   }
   // Samples of both components in one group of bytes: one plan reads them in turn.
   const bool grouped =
       vFromU < chromaU_.step && -vFromU < chromaU_.step && job_.srcPitches[1] == job_.srcPitches[2];
   if (grouped) {
     pixelChroma_ = PixelChromaRead::kPairs;
-    chromaU_.Finish(n);
+    chromaU_.FinishSamples(n);
     chromaU_.PlanApart(int32_t(vFromU), rows_);
   } else {
     pixelChroma_ = PixelChromaRead::kGathered;
-    chromaU_.Finish(n);
+    chromaU_.FinishSamples(n);
     chromaU_.Plan(rows_);
   }
 }

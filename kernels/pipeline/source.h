@@ -25,6 +25,8 @@ struct SampleColumns {
 
   void Set(int i, int64_t sample) const { offset[i] = int32_t(sample * step); }
   void Finish(int count);
+  // The same for samples that `offset` has the numbers of.
+  void FinishSamples(int count);
   // All of n samples, side by side from one on.
   void SetAll(int64_t sample, int count);
   void AskFor(int32_t from, int64_t to);

@@ -186,18 +186,42 @@ void BlendPixelRows(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t w
       Units{a, 1}, Units{b, 1});
 }
 
+// The bytes that a plan reads.
+struct Extent {
+  int32_t lowest, end;
+};
+inline Extent ExtentOf(const int32_t* offsets, int n, int stride) {
+  int32_t lowest = INT32_MAX;
+  int32_t highest = INT32_MIN;
+  for (int i = 0; i < n; ++i) {
+    const int32_t offset = offsets[ptrdiff_t{i} * stride];
+    lowest = offset < lowest ? offset : lowest;
+    highest = offset > highest ? offset : highest;
+  }
+  return {lowest, highest + 1};
+}
+inline Extent ExtentOf(const PairPlan& plan) {
+  const int32_t* const offsets = plan.first;
+  const Extent a =
+      plan.stride == 1 ? ExtentOf(offsets, plan.n, 1) : ExtentOf(offsets, plan.n, plan.stride);
+  const Extent b = plan.second == nullptr ? Extent{a.lowest + plan.apart, a.end + plan.apart}
+                   : plan.stride == 1     ? ExtentOf(plan.second, plan.n, 1)
+                                          : ExtentOf(plan.second, plan.n, plan.stride);
+  return {a.lowest < b.lowest ? a.lowest : b.lowest, a.end > b.end ? a.end : b.end};
+}
+
 // Pairs that share a window: where it begins, and where in it their bytes are. No window reaches
 // beyond the bytes that the run reads anyway, [lowest, end). False when there is none.
 template <int kPairs>
-bool PlanWindow(const int32_t* offsets, int32_t lowest, int32_t end, int32_t* window, uint8_t* at) {
+bool PlanWindow(const int32_t* offsets, const Extent& extent, int32_t* window, uint8_t* at) {
   int32_t first = offsets[0];
   int32_t last = offsets[0];
-  for (int k = 1; k < 2 * kPairs; ++k) {
-    if (offsets[k] < first) first = offsets[k];
-    if (offsets[k] > last) last = offsets[k];
+  for (int k = 0; k < 2 * kPairs; ++k) {
+    first = offsets[k] < first ? offsets[k] : first;
+    last = offsets[k] > last ? offsets[k] : last;
   }
-  if (first > end - 16) first = end - 16;
-  const bool fits = first >= lowest && last - first < 16;
+  if (first > extent.end - 16) first = extent.end - 16;
+  const bool fits = first >= extent.lowest && last - first < 16;
   *window = fits ? first : -1;
   for (int k = 0; k < 2 * kPairs; ++k) at[k] = uint8_t(fits ? offsets[k] - first : 0);
   return fits;
@@ -236,29 +260,51 @@ inline uint16_t NegativeWeight(uint16_t weight) {
   return weight >= 32768 ? weight : uint16_t(-weight);
 }
 
+// Offsets of eight pairs from one on, in turn. Beyond the last pair that one again.
+inline void OffsetsOfEight(const PairPlan& plan, int first, int32_t (&offsets)[16]) {
+  const bool isWhole = first + 8 <= plan.n;
+  const int32_t* const from = plan.first + ptrdiff_t{first} * plan.stride;
+  if (isWhole && plan.stride == 2 && plan.second == plan.first + 1 && plan.weights == nullptr) {
+    memcpy(offsets, from, sizeof(offsets));
+  } else if (isWhole && plan.stride == 1 && plan.second == nullptr && plan.weights == nullptr) {
+    for (int k = 0; k < 8; ++k) {
+      offsets[2 * k] = from[k];
+      offsets[2 * k + 1] = from[k] + plan.apart;
+    }
+  } else if (isWhole && plan.stride == 1 && plan.second != nullptr && plan.weights != nullptr) {
+    const int32_t* const other = plan.second + first;
+    for (int k = 0; k < 8; ++k) {
+      const bool swap = BeginsWithSecond(plan, first + k);
+      offsets[2 * k] = swap ? other[k] : from[k];
+      offsets[2 * k + 1] = swap ? from[k] : other[k];
+    }
+  } else {
+    for (int k = 0; k < 8; ++k) {
+      const int pair = first + k < plan.n ? first + k : plan.n - 1;
+      const bool swap = BeginsWithSecond(plan, pair);
+      offsets[2 * k] = swap ? plan.Second(pair) : plan.First(pair);
+      offsets[2 * k + 1] = swap ? plan.First(pair) : plan.Second(pair);
+    }
+  }
+}
+
 // Whether all pairs have windows. One for each eight pairs is given up with the first that has
 // none.
 template <int kWindows>
-bool PlanWindows(PairPlan* plan, int32_t lowest, int32_t end) {
+bool PlanWindows(PairPlan* plan, const Extent& extent) {
   plan->windows = kWindows;
   plan->hasWindows = true;
   for (int i = 0; i < BlocksOf(*plan) * kPairs; i += 8) {
     int32_t offsets[16];
     const int eight = i % kPairs / 8;
-    const int first = FirstPairOf(*plan, i / kPairs) + 8 * eight;
-    for (int k = 0; k < 8; ++k) {
-      const int pair = first + k < plan->n ? first + k : plan->n - 1;
-      const bool swap = BeginsWithSecond(*plan, pair);
-      offsets[2 * k] = swap ? plan->Second(pair) : plan->First(pair);
-      offsets[2 * k + 1] = swap ? plan->First(pair) : plan->Second(pair);
-    }
+    OffsetsOfEight(*plan, FirstPairOf(*plan, i / kPairs) + 8 * eight, offsets);
     uint8_t* const block = plan->prepared + 3 * (i - i % kPairs);
     uint8_t at[16];
     constexpr int kShared = 8 / kWindows;
     for (int w = 0; w < kWindows; ++w) {
       int32_t window;
-      const bool fits = PlanWindow<kShared>(offsets + 2 * kShared * w, lowest, end, &window,
-                                            at + 2 * kShared * w);
+      const bool fits =
+          PlanWindow<kShared>(offsets + 2 * kShared * w, extent, &window, at + 2 * kShared * w);
       memcpy(block + 4 * (eight * kWindows + w), &window, 4);
       if (!fits) plan->hasWindows = false;
     }
@@ -270,24 +316,15 @@ bool PlanWindows(PairPlan* plan, int32_t lowest, int32_t end) {
 
 void PlanPairs(PairPlan* plan) {
   if (IsForNarrower(*plan)) return kNarrower.planPairs(plan);
-  int32_t lowest = INT32_MAX;
-  int32_t end = 0;
-  for (int i = 0; i < plan->n; ++i) {
-    const int32_t offsets[2] = {plan->First(i), plan->Second(i)};
-    for (const int32_t offset : offsets) {
-      if (offset < lowest) lowest = offset;
-      if (offset >= end) end = offset + 1;
-    }
-  }
-  if (!PlanWindows<1>(plan, lowest, end)) PlanWindows<2>(plan, lowest, end);
+  const Extent extent = ExtentOf(*plan);
+  if (!PlanWindows<1>(plan, extent)) PlanWindows<2>(plan, extent);
   if (plan->weights == nullptr) return;
   for (int block = 0; block < BlocksOf(*plan); ++block) {
     const int first = FirstPairOf(*plan, block);
     const int n = plan->n - first < kPairs ? plan->n - first : kPairs;
     uint16_t* const blends = plan->blends + kPairs * block;
-    for (int i = 0; i < kPairs; ++i) {
-      blends[i] = i < n ? NegativeWeight(plan->weights[first + i]) : uint16_t{0};
-    }
+    for (int i = 0; i < n; ++i) blends[i] = NegativeWeight(plan->weights[first + i]);
+    for (int i = n; i < kPairs; ++i) blends[i] = 0;
   }
 }
 
