@@ -220,6 +220,19 @@ inline PixelBytes Load4(const uint8_t* p) {
   const uint8x16x4_t pixels = vld4q_u8(p);
   return {{pixels.val[0]}, {pixels.val[1]}, {pixels.val[2]}, {pixels.val[3]}};
 }
+// The same for uses by halves of vectors, which 32-bit compilers copy from a load of whole ones.
+inline PixelBytes Load4ByHalves(const uint8_t* p) {
+#ifdef __aarch64__
+  return Load4(p);
+#else
+  const uint8x8x4_t low = vld4_u8(p);
+  const uint8x8x4_t high = vld4_u8(p + 32);
+  return {{vcombine_u8(low.val[0], high.val[0])},
+          {vcombine_u8(low.val[1], high.val[1])},
+          {vcombine_u8(low.val[2], high.val[2])},
+          {vcombine_u8(low.val[3], high.val[3])}};
+#endif
+}
 inline void Store4(uint8_t* p, Bytes a, Bytes b, Bytes c, Bytes d) {
   const uint8x16x4_t pixels = {{a.v, b.v, c.v, d.v}};
   vst4q_u8(p, pixels);
@@ -432,8 +445,8 @@ struct WeightParts {
 
 template <bool kSeconds>
 inline PixelBytes LoadQuadOperands(const uint8_t* p) {
+  if constexpr (!kSeconds) return Load4ByHalves(p);
   const PixelBytes a = Load4(p);
-  if constexpr (!kSeconds) return a;
   const PixelBytes b = Load4(p + 4 * kBytes);
   return {Seconds(a.low, b.low), Seconds(a.middle, b.middle), Seconds(a.high, b.high), SetBytes(0)};
 }
@@ -470,14 +483,15 @@ class WeightedSum {
     uint16x8_t low;
     if constexpr (kParts == LowParts::kMinus) {
       low = vmlsl_u8(vmlsl_u8(vmlsl_u8(lowOffset_, l, low_[0]), m, low_[1]), h, low_[2]);
+      low = Fixed({low}).v;
     } else {
       const uint16x8_t first = kAnyOffset ? vmlal_u8(lowOffset_, h, low_[2]) : vmull_u8(h, low_[2]);
       low = vmlal_u8(vmlal_u8(first, m, low_[1]), l, low_[0]);
     }
-    const uint16x8_t first =
-        kAnyOffset ? vmlal_u8(highOffset_, h, high_[2]) : vmull_u8(h, high_[2]);
-    const uint16x8_t high = vmlal_u8(vmlal_u8(first, m, high_[1]), l, high_[0]);
-    return vshrn_n_u16(vsraq_n_u16(high, low, 8), 8);
+    const uint16x8_t high = vmlal_u8(vmlal_u8(vmull_u8(h, high_[2]), m, high_[1]), l, high_[0]);
+    const uint16x8_t sum = Fixed({vsraq_n_u16(high, low, 8)}).v;
+    // An offset that is added last needs not be copied first.
+    return kAnyOffset ? vaddhn_u16(sum, highOffset_) : vshrn_n_u16(sum, 8);
   }
 
   uint8x8_t high_[3], low_[3];
