@@ -98,8 +98,9 @@ void Use(Input* input, const MBITMAP& bitmap) {
     // Rows of a caller's pitch may overlap or be cut: that is the caller's image.
     if (bitmap.pitch[slot] < side.blocks.block[i].rowBytes) return;
   }
-  if (differential::IsSemiPlanar(side.format) && bitmap.pitch[1] != bitmap.pitch[2])
+  if (differential::IsSemiPlanar(side.format) && bitmap.pitch[1] != bitmap.pitch[2]) {
     return;  // one plane
+  }
   uint8_t grey[9 * 7];
   for (size_t i = 0; i < sizeof(grey); ++i) grey[i] = uint8_t(i * 5);
   const MBITMAP small = {FORMAT_GRAY8, 9, 7, {9, 0, 0}, {grey, nullptr, nullptr}};

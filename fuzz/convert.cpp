@@ -81,8 +81,9 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
       expected = code;
     }
     isFirst = false;
-    if (code != expected)
+    if (code != expected) {
       FailIn(job, set, "code " + std::to_string(code) + ", expected " + std::to_string(expected));
+    }
     const std::string difference = images.Difference();
     if (!difference.empty()) FailIn(job, set, difference);
   }

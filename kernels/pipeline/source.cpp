@@ -477,8 +477,9 @@ Source::Lines Source::FetchLines(int32_t r) {
 const uint8_t* Source::Luma(int32_t r, uint8_t* into) {
   // Rows that are neither blended nor used again.
   const bool once = into != nullptr && job_.engine.stepY >= 0x10000 && !interpolates_;
-  if (once && !BlendsRows(r))
+  if (once && !BlendsRows(r)) {
     return ReadSamples(into, RowToRead(0, SourceRow(r, 1), first_), first_);
+  }
   const Lines lines = FetchLines<&Source::FillLumaLine>(r);
   if (lines.weight == 0) return lines.first->channel[0];
   uint8_t* const blended = into != nullptr ? into : blended_[0];
