@@ -178,7 +178,7 @@ MPPPARAM DrawParams(Input* input) {
 int32_t DrawLength(Input* input) {
   const int32_t kind = input->Between(0, 63);
   if (kind == 63) return int32_t(input->Word());
-  if (kind == 62) return input->Between(301, 1200);  // more than a strip of a row
+  if (kind == 62) return input->Between(301, 1200);       // more than a strip of a row
   if (kind == 61) return input->Between(1201, kLongest);  // more than the widest strip
   if (kind >= 60) return input->Between(1, 300);
   return input->Between(1, kind < 40 ? 20 : 70);
