@@ -57,6 +57,7 @@ constexpr Job kJobs[] = {
     {"RGBA_to_NV21_video", 3, kRgba, FORMAT_NV21 | kVideo},
     {"RGBA_to_I420_full", 0, kRgba, FORMAT_I420 | kFull},
     {"RGBA_R90", 0, kRgba, kRgba, kRotate90},
+    {"RGB24_R90", 0, FORMAT_BGR888, FORMAT_BGR888, kRotate90},
     {"RGBA_720p", 0, kRgba, kRgba, 0, true},
     {"NV21_copy", 0, FORMAT_NV21 | kFull, FORMAT_NV21 | kFull},
     {"NV21_R90", 1, FORMAT_NV21 | kFull, FORMAT_NV21 | kFull, kRotate90},

@@ -26,7 +26,7 @@ void TransposeUnits(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdif
 template <typename Block, int kUnit>
 void TransposeBy(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch, int rows,
                  int columns) {
-  constexpr int kLine = 64 / kUnit;
+  constexpr int kLine = 64 / kUnit / Block::kRows * Block::kRows;
   const int lastRow = rows - Block::kRows;
   const int lastColumn = columns - Block::kColumns;
   if (lastRow < 0 || lastColumn < 0) {

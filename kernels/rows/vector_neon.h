@@ -661,6 +661,67 @@ struct Block16 {
   }
 };
 
+// Eight rows of eight pixels of three bytes, each byte's plane by itself.
+struct Block24 {
+  static constexpr int kRows = 8;
+  static constexpr int kColumns = 8;
+  static void Write(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch) {
+    uint8x8x3_t r0 = vld3_u8(src);
+    uint8x8x3_t r1 = vld3_u8(src += srcPitch);
+    uint8x8x3_t r2 = vld3_u8(src += srcPitch);
+    uint8x8x3_t r3 = vld3_u8(src += srcPitch);
+    uint8x8x3_t r4 = vld3_u8(src += srcPitch);
+    uint8x8x3_t r5 = vld3_u8(src += srcPitch);
+    uint8x8x3_t r6 = vld3_u8(src += srcPitch);
+    uint8x8x3_t r7 = vld3_u8(src += srcPitch);
+    Turn<1>(&r0, &r1);
+    Turn<1>(&r2, &r3);
+    Turn<1>(&r4, &r5);
+    Turn<1>(&r6, &r7);
+    Turn<2>(&r0, &r2);
+    Turn<2>(&r1, &r3);
+    Turn<2>(&r4, &r6);
+    Turn<2>(&r5, &r7);
+    Turn<4>(&r0, &r4);
+    Turn<4>(&r1, &r5);
+    Turn<4>(&r2, &r6);
+    Turn<4>(&r3, &r7);
+    vst3_u8(dst, r0);
+    vst3_u8(dst += dstPitch, r1);
+    vst3_u8(dst += dstPitch, r2);
+    vst3_u8(dst += dstPitch, r3);
+    vst3_u8(dst += dstPitch, r4);
+    vst3_u8(dst += dstPitch, r5);
+    vst3_u8(dst += dstPitch, r6);
+    vst3_u8(dst += dstPitch, r7);
+  }
+
+ private:
+  // Exchanges neighbouring units of kUnit bytes of two rows.
+  template <int kUnit>
+  static void Turn(uint8x8x3_t* a, uint8x8x3_t* b) {
+    Turn<kUnit>(&a->val[0], &b->val[0]);
+    Turn<kUnit>(&a->val[1], &b->val[1]);
+    Turn<kUnit>(&a->val[2], &b->val[2]);
+  }
+  template <int kUnit>
+  static void Turn(uint8x8_t* a, uint8x8_t* b) {
+    if constexpr (kUnit == 1) {
+      const uint8x8x2_t turned = vtrn_u8(*a, *b);
+      *a = turned.val[0];
+      *b = turned.val[1];
+    } else if constexpr (kUnit == 2) {
+      const uint16x4x2_t turned = vtrn_u16(vreinterpret_u16_u8(*a), vreinterpret_u16_u8(*b));
+      *a = vreinterpret_u8_u16(turned.val[0]);
+      *b = vreinterpret_u8_u16(turned.val[1]);
+    } else {
+      const uint32x2x2_t turned = vtrn_u32(vreinterpret_u32_u8(*a), vreinterpret_u32_u8(*b));
+      *a = vreinterpret_u8_u32(turned.val[0]);
+      *b = vreinterpret_u8_u32(turned.val[1]);
+    }
+  }
+};
+
 // Eight rows of four words.
 struct Block32 {
   static constexpr int kRows = 8;
@@ -690,6 +751,8 @@ void Transpose(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t s
       return TransposeBy<Block8, 1>(dst, dstPitch, src, srcPitch, rows, columns);
     case 2:
       return TransposeBy<Block16, 2>(dst, dstPitch, src, srcPitch, rows, columns);
+    case 3:
+      return TransposeBy<Block24, 3>(dst, dstPitch, src, srcPitch, rows, columns);
     case 4:
       return TransposeBy<Block32, 4>(dst, dstPitch, src, srcPitch, rows, columns);
     default:

@@ -14,6 +14,7 @@
 #else
 #include "kernels/rows/vector_x86_lanes.h"
 #endif
+#include "kernels/rows/transpose.h"
 #include "kernels/rows/vector_x86_words.h"
 #include "kernels/rows/weights.h"
 
@@ -164,8 +165,55 @@ void WithSum(const Weights& weights, const Call& call) {
   }
 }
 
-// The reference version is vectors already.
-constexpr auto Transpose = scalar::Transpose;
+// ---- Transposition
+// Eight rows of four pixels of three bytes, which are turned as words with a byte to spare.
+struct Block24 {
+  static constexpr int kRows = 8;
+  static constexpr int kColumns = 4;
+  static void Write(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch) {
+    const __m128i toStart = _mm_setr_epi8(0, 1, 2, 4, 5, 6, 8, 9, 10, 12, 13, 14, -1, -1, -1, -1);
+    const __m128i toEnd = _mm_setr_epi8(-1, -1, -1, -1, 0, 1, 2, 4, 5, 6, 8, 9, 10, 12, 13, 14);
+    __m128i upper[kColumns], lower[kColumns];
+    ReadFour(upper, src, srcPitch);
+    ReadFour(lower, src + 4 * srcPitch, srcPitch);
+    for (int i = 0; i < kColumns; ++i, dst += dstPitch) {
+      const __m128i first = _mm_shuffle_epi8(upper[i], toEnd);
+      const __m128i last = _mm_shuffle_epi8(lower[i], toStart);
+      Store16(dst, _mm_alignr_epi8(last, first, 4));
+      _mm_storel_epi64(reinterpret_cast<__m128i*>(dst + 16), _mm_srli_si128(last, 4));
+    }
+  }
+
+ private:
+  // Columns of four rows.
+  static void ReadFour(__m128i (&columns)[4], const uint8_t* src, ptrdiff_t pitch) {
+    const __m128i a = ReadRow(src);
+    const __m128i b = ReadRow(src + pitch);
+    const __m128i c = ReadRow(src + 2 * pitch);
+    const __m128i d = ReadRow(src + 3 * pitch);
+    const __m128i ab = _mm_unpacklo_epi32(a, b);
+    const __m128i cd = _mm_unpacklo_epi32(c, d);
+    const __m128i restOfAB = _mm_unpackhi_epi32(a, b);
+    const __m128i restOfCD = _mm_unpackhi_epi32(c, d);
+    columns[0] = _mm_unpacklo_epi64(ab, cd);
+    columns[1] = _mm_unpackhi_epi64(ab, cd);
+    columns[2] = _mm_unpacklo_epi64(restOfAB, restOfCD);
+    columns[3] = _mm_unpackhi_epi64(restOfAB, restOfCD);
+  }
+  static __m128i ReadRow(const uint8_t* p) {
+    const __m128i toWords = _mm_setr_epi8(0, 1, 2, -1, 3, 4, 5, -1, 6, 7, 8, -1, 9, 10, 11, -1);
+    int32_t rest;
+    __builtin_memcpy(&rest, p + 8, sizeof(rest));
+    return _mm_shuffle_epi8(_mm_insert_epi32(Load8(p), rest, 2), toWords);
+  }
+};
+
+// The reference version of the other units is vectors already.
+void Transpose(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch, int unit,
+               int rows, int columns) {
+  if (unit != 3) return scalar::Transpose(dst, dstPitch, src, srcPitch, unit, rows, columns);
+  TransposeBy<Block24, 3>(dst, dstPitch, src, srcPitch, rows, columns);
+}
 
 }  // namespace
 }  // namespace kestrel
