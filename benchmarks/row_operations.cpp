@@ -6,12 +6,11 @@
 
 #include <algorithm>
 #include <cstdint>
-#include <cstdio>
 #include <cstdlib>
-#include <map>
 #include <string>
 #include <vector>
 
+#include "benchmarks/common/table_of_sets.h"
 #include "engine/postprocess.h"
 #include "kernels/rows/rows.h"
 
@@ -376,56 +375,6 @@ const Case kCases[] = {
      }},
 };
 
-// One line for each operation, one column for each instruction set.
-class TableReporter : public benchmark::BenchmarkReporter {
- public:
-  explicit TableReporter(const kestrel::RowOpsList& sets) : sets_(sets) {}
-
-  bool ReportContext(const Context& context) override {
-    PrintBasicContext(&GetErrorStream(), context);
-    return true;
-  }
-  void ReportRuns(const std::vector<Run>& runs) override {
-    for (const Run& run : runs) {
-      if (run.run_type != Run::RT_Iteration || run.error_occurred) continue;
-      const double nanoseconds = 1e9 / run.counters.at("items_per_second").value;
-      const auto [entry, isNew] = times_.emplace(run.run_name.function_name, nanoseconds);
-      if (!isNew) entry->second = std::min(entry->second, nanoseconds);
-    }
-  }
-  void Finalize() override {
-    std::printf("%-32s", "nanoseconds per pixel");
-    for (const RowOps* const* ops = sets_.ops; *ops != nullptr; ++ops) {
-      std::printf("  %16s", (*ops)->name);
-    }
-    std::printf("\n");
-    for (const Case& c : kCases) PrintLine(c.name);
-  }
-
- private:
-  // 0 when it was filtered out.
-  double TimeOf(const std::string& name, const RowOps& ops) const {
-    const auto entry = times_.find(name + "/" + ops.name);
-    return entry == times_.end() ? 0 : entry->second;
-  }
-  void PrintLine(const char* name) const {
-    const double scalar = TimeOf(name, kestrel::kScalarRows);
-    std::string line;
-    bool hasRun = false;
-    for (const RowOps* const* ops = sets_.ops; *ops != nullptr; ++ops) {
-      const double time = TimeOf(name, **ops);
-      char text[40];
-      std::snprintf(text, sizeof(text), "  %8.3f (%5.2f)", time, time > 0 ? scalar / time : 0);
-      line += text;
-      hasRun = hasRun || time > 0;
-    }
-    if (hasRun) std::printf("%-32s%s\n", name, line.c_str());
-  }
-
-  kestrel::RowOpsList sets_;
-  std::map<std::string, double> times_;
-};
-
 void Time(benchmark::State& state, const Case& c, const RowOps& ops, Runs* runs) {
   ops.planPairs(&runs->plan);
   for ([[maybe_unused]] auto _ : state) {
@@ -448,7 +397,9 @@ int main(int argc, char** argv) {
   }
   benchmark::Initialize(&argc, argv);
   if (benchmark::ReportUnrecognizedArguments(argc, argv)) return 1;
-  TableReporter table(sets);
+  std::vector<std::string> names;
+  for (const Case& c : kCases) names.emplace_back(c.name);
+  bench::TableOfSets table("nanoseconds per pixel", names, sets);
   benchmark::RunSpecifiedBenchmarks(&table);
   benchmark::Shutdown();
   return 0;
