@@ -80,8 +80,8 @@ void Dump(const MBITMAP& bitmap, const differential::Side& side) {
   const int64_t size = file.Size();
   Require(size <= BytesOf(side), "a dump is larger than its image");
   const size_t row = size_t(std::min<int64_t>(size, side.blocks.block[0].rowBytes));
-  // Luma comes first; sizes of packed rows are rounded down.
-  if (row > 0 && side.format.planeCount == 3) {
+  // Luma comes first, if it is there; sizes of packed rows are rounded down.
+  if (row > 0 && side.format.planeCount == 3 && bitmap.plane[0] != nullptr) {
     Require(std::memcmp(file.Start(row).data(), bitmap.plane[0], row) == 0,
             "a dump does not start with the first row");
   }
