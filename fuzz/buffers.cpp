@@ -145,13 +145,14 @@ MBITMAP Describe(const MPPFORMAT& record, const uint8_t* const* planes, const in
   return bitmap;
 }
 
-// A dump reads all rows, and those of pairs whole: not where the pitch is not that of the plane,
-// nor where U and V have memory of their own.
+// A dump reads all rows, and those of pairs whole, each plane by the pitch of its own number: not
+// where a pitch is not that of its plane, where U and V of pairs have memory of their own, or where
+// V comes first and has another pitch than U, since elsewhere pitches stay in the order of U and V.
 bool CanBeDumped(const fuzz::Job& job) {
   const differential::Side& side = job.drawn.dst;
-  const bool isSplit =
-      side.isKnown && differential::IsSemiPlanar(side.format) && side.blocks.count == 3;
-  return side.isKnown && !isSplit && job.farDstPitch == 0;
+  if (!side.isKnown || job.farDstPitch != 0) return false;
+  if (differential::IsSemiPlanar(side.format)) return side.blocks.count == 2;
+  return !side.format.HasVPlaneFirst() || side.pitches[1] == side.pitches[2];
 }
 
 // Both images between guard pages: conversion in one shot, and a dump of either.

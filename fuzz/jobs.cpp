@@ -230,6 +230,7 @@ void DrawImages(Input* input, Job* job) {
   drawn.content = Content(input->Between(0, 2));
   drawn.seed = input->Byte();
   drawn.number = 0;
+  job->farSrcPitch = job->farDstPitch = 0;  // this may be drawn anew, for other sizes
 
   int64_t dstRight = int64_t(params.dstOriginX) + drawn.dst.record.width;
   int64_t dstBottom = int64_t(params.dstOriginY) + drawn.dst.record.height;
