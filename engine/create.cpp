@@ -262,7 +262,8 @@ void OrientDestination(EngineContext* c) {
   }
 }
 
-void FillPassEngine(const GeometryOf& g, EngineContext* c, PassEngine* e) {
+void FillPassEngine(const GeometryOf& g, PassEngine* e) {
+  EngineContext* const c = e->context;
   e->srcRegionX = c->srcOriginX;
   e->srcRegionY = c->srcOriginY;
   e->srcRegionWidth = SaturateToInt32(g.x.srcLength);
@@ -282,7 +283,6 @@ void FillPassEngine(const GeometryOf& g, EngineContext* c, PassEngine* e) {
   e->srcLayout = c->srcLayout;
   e->dstLayout = c->dstLayout;
   memcpy(e->dstPlaneFactors, c->dstPlaneFactors, sizeof(e->dstPlaneFactors));
-  e->context = c;
   e->swapXY = c->swapXY;
   e->mirrorX = c->mirrorX;
   e->mirrorY = c->mirrorY;
@@ -300,11 +300,13 @@ void FillPassEngine(const GeometryOf& g, EngineContext* c, PassEngine* e) {
   e->alpha = c->alpha;
 }
 
-// The decisions themselves. The order of the steps matters: several flags are taken before a later
-// step changes what they were derived from, and kernels rely on that.
-uint32_t Decide(const MPPFORMAT& dst, const MPPFORMAT& src, const MPPPARAM& params,
-                const EngineContext* like, EngineContext* c, PassEngine* e) {
+// The order of the decisions matters: several flags are taken before a later step changes what they
+// were derived from, and kernels rely on that. These come first, and do not depend on the pass
+// mode.
+uint32_t Describe(const MPPFORMAT& dst, const MPPFORMAT& src, const MPPPARAM& params,
+                  GeometryOf* geometry, EngineContext* c) {
   c->params = params;
+  c->rows = SelectRowOps();
   c->tableEnabled = 1;
   c->dither = params.dither;
   c->alpha = params.alpha < 255 ? params.alpha : 255;
@@ -317,8 +319,8 @@ uint32_t Decide(const MPPFORMAT& dst, const MPPFORMAT& src, const MPPPARAM& para
   c->swapXY = params.transformCode & MPP_SWAP_XY;
   c->mirrorX = params.transformCode & MPP_MIRROR_X;
   c->mirrorY = params.transformCode & MPP_MIRROR_Y;
-  GeometryOf geometry = InitialGeometry(*c, dst, src);
-  CopySteps(geometry, c);
+  *geometry = InitialGeometry(*c, dst, src);
+  CopySteps(*geometry, c);
   c->params.brightness = ClampAdjustment(params.brightness);
   c->params.contrast = ClampAdjustment(params.contrast);
   c->params.saturation = ClampAdjustment(params.saturation);
@@ -336,11 +338,17 @@ uint32_t Decide(const MPPFORMAT& dst, const MPPFORMAT& src, const MPPPARAM& para
     c->dstPlaneFactors[6 + i] = c->dstSubsample[3 + i];
   }
   SetPath(c);
+  c->srcLayoutBit = LayoutBit(c->srcFormat);
+  c->dstLayoutBit = LayoutBit(c->dstFormat);
+  const bool negative = dst.width < 0 || dst.height < 0 || src.width < 0 || src.height < 0;
+  return negative ? KESTREL_BAD_ARGUMENT : KESTREL_OK;
+}
+
+// `like` is null, or the context of another pass mode.
+uint32_t Decide(GeometryOf geometry, const EngineContext* like, PassEngine* e) {
+  EngineContext* const c = e->context;
   SetBlockMode(c);
-  if (dst.width < 0 || dst.height < 0 || src.width < 0 || src.height < 0) {
-    return KESTREL_BAD_ARGUMENT;
-  }
-  ApplyAspectPolicy(params.aspectMode, c->blockMode, &geometry.x, &geometry.y);
+  ApplyAspectPolicy(c->params.aspectMode, c->blockMode, &geometry.x, &geometry.y);
   CopySteps(geometry, c);
   if (c->stepX == 0 || c->stepY == 0) return KESTREL_BAD_ARGUMENT;
   c->srcOriginX = SaturateToInt32(geometry.x.srcOrigin);
@@ -363,14 +371,8 @@ uint32_t Decide(const MPPFORMAT& dst, const MPPFORMAT& src, const MPPPARAM& para
     c->xEnlarge = c->stepX < 0x10000;
     c->yEnlarge = c->stepY < 0x10000;
   }
-  FillPassEngine(geometry, c, e);
+  FillPassEngine(geometry, e);
   return KESTREL_OK;
-}
-
-void FreeContext(EngineContext* context) {
-  if (context == nullptr) return;
-  if (context->table != nullptr) MMemFree(nullptr, context->table);
-  MMemFree(nullptr, context);
 }
 
 // RGBX and BGRX are built as XRGB and XBGR: their spare byte is in the high byte in practice.
@@ -385,46 +387,47 @@ uint32_t BuiltAs(uint32_t format) {
   }
 }
 
-// `first` is null, or a pass whose parameters differ in the pass mode only.
-uint32_t BuildPass(const MPPFORMAT& dst, const MPPFORMAT& src, const MPPPARAM& params,
-                   const KestrelRowOps* rows, const PassEngine* first, PassEngine** out) {
+void FreePass(PassEngine* engine) {
+  if (engine == nullptr) return;
+  if (engine->context->table != nullptr) MMemFree(nullptr, engine->context->table);
+  MMemFree(nullptr, engine->context);
+  MMemFree(nullptr, engine);
+}
+
+PassEngine* AllocatePass() {
+  PassEngine* engine = AllocateZeroed<PassEngine>();
+  if (engine == nullptr) return nullptr;
+  engine->context = AllocateZeroed<EngineContext>();
+  if (engine->context != nullptr) return engine;
+  MMemFree(nullptr, engine);
+  return nullptr;
+}
+
+// Builds `count` passes: one of the pass mode given, or those of pass modes 1, 2 and so on. On
+// failure passes[] has those that are to be freed.
+uint32_t BuildPasses(const MPPFORMAT& dst, const MPPFORMAT& src, const MPPPARAM& params,
+                     PassEngine** passes, uint32_t count) {
   if (dst.width == 0 || dst.height == 0 || src.width == 0 || src.height == 0) {
     return KESTREL_BAD_ARGUMENT;
   }
-  PassEngine* engine = AllocateZeroed<PassEngine>();
-  if (engine == nullptr) return KESTREL_OUT_OF_MEMORY;
-  EngineContext* context = AllocateZeroed<EngineContext>();
-  if (context == nullptr) {
-    MMemFree(nullptr, engine);
-    return KESTREL_OUT_OF_MEMORY;
+  EngineContext described;
+  GeometryOf geometry;
+  for (uint32_t i = 0; i < count; ++i) {
+    passes[i] = AllocatePass();
+    if (passes[i] == nullptr) return KESTREL_OUT_OF_MEMORY;
+    EngineContext* const c = passes[i]->context;
+    if (i == 0) {
+      const uint32_t result = Describe(dst, src, params, &geometry, c);
+      if (result != KESTREL_OK) return result;
+      described = *c;
+    } else {
+      *c = described;
+    }
+    if (count > 1) c->params.passMode = i + 1;
+    const uint32_t result = Decide(geometry, i > 0 ? passes[0]->context : nullptr, passes[i]);
+    if (result != KESTREL_OK) return result;
   }
-  context->rows = rows;
-  const EngineContext* const like = first != nullptr ? first->context : nullptr;
-  const uint32_t result = Decide(dst, src, params, like, context, engine);
-  if (result != KESTREL_OK) {
-    FreeContext(context);
-    MMemFree(nullptr, engine);
-    return result;
-  }
-  context->srcLayoutBit = LayoutBit(context->srcFormat);
-  context->dstLayoutBit = LayoutBit(context->dstFormat);
-  *out = engine;
   return KESTREL_OK;
-}
-
-uint32_t BuildPasses(const MPPFORMAT& dst, const MPPFORMAT& src, const MPPPARAM& params,
-                     MPPHandle* handle) {
-  const KestrelRowOps* const rows = SelectRowOps();
-  if (params.passMode != MPP_PASS_TILED) {
-    return BuildPass(dst, src, params, rows, nullptr, &handle->pass[0]);
-  }
-  MPPPARAM pass = params;
-  uint32_t result = KESTREL_OK;
-  for (uint32_t i = 0; i < 3 && result == KESTREL_OK; ++i) {
-    pass.passMode = i + 1;
-    result = BuildPass(dst, src, pass, rows, handle->pass[0], &handle->pass[i]);
-  }
-  return result;
 }
 
 }  // namespace
@@ -439,7 +442,14 @@ uint32_t MPPBuildEngine(const MPPFORMAT* dstFormat, const MPPFORMAT* srcFormat,
   if (dstFormat == nullptr || srcFormat == nullptr || params == nullptr || outEngine == nullptr) {
     return KESTREL_BAD_ARGUMENT;
   }
-  return BuildPass(*dstFormat, *srcFormat, *params, SelectRowOps(), nullptr, outEngine);
+  PassEngine* engine = nullptr;
+  const uint32_t result = BuildPasses(*dstFormat, *srcFormat, *params, &engine, 1);
+  if (result == KESTREL_OK) {
+    *outEngine = engine;
+  } else {
+    FreePass(engine);
+  }
+  return result;
 }
 
 uint32_t MPPCreate(MPPFORMAT* dstFormat, MPPFORMAT* srcFormat, MPPPARAM* params,
@@ -465,7 +475,8 @@ uint32_t MPPCreate(MPPFORMAT* dstFormat, MPPFORMAT* srcFormat, MPPPARAM* params,
   srcFormat->format = BuiltAs(srcCode);
   if ((dstFormat->format & 0xFF000000u) != 0x15000000u) params->dither = 0;
 
-  const uint32_t result = BuildPasses(*dstFormat, *srcFormat, *params, handle);
+  const uint32_t count = params->passMode == MPP_PASS_TILED ? 3 : 1;
+  const uint32_t result = BuildPasses(*dstFormat, *srcFormat, *params, handle->pass, count);
   dstFormat->format = dstCode;
   srcFormat->format = srcCode;
   params->dither = dither;
@@ -479,11 +490,7 @@ uint32_t MPPCreate(MPPFORMAT* dstFormat, MPPFORMAT* srcFormat, MPPPARAM* params,
 
 uint32_t MPPDestroy(MPPHandle* handle) {
   if (handle == nullptr) return KESTREL_OK;
-  for (PassEngine* engine : handle->pass) {
-    if (engine == nullptr) continue;
-    FreeContext(engine->context);
-    MMemFree(nullptr, engine);
-  }
+  for (PassEngine* engine : handle->pass) FreePass(engine);
   MMemFree(nullptr, handle);
   return KESTREL_OK;
 }

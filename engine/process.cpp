@@ -32,9 +32,7 @@ bool IsEmpty(const MRECT& rect) {
 // Whether rows 0..lastRow of every bound plane can be addressed. A pitch that would need 2 GiB
 // cannot be true, and INT32_MIN has no opposite for mirrored jobs.
 bool CanAddress(const PlaneLayout& binding, int64_t lastRow) {
-  const int planes = binding.planeCount == 3 ? 3 : 1;
-  for (int i = 0; i < planes; ++i) {
-    const int64_t pitch = binding.pitch[i];
+  for (const int64_t pitch : binding.pitch) {  // all the same where there is one plane
     const int64_t magnitude = pitch < 0 ? -pitch : pitch;
     // At least one byte of the last row belongs to the plane as well.
     if (magnitude > INT32_MAX || magnitude * lastRow >= kMaxPlaneSpan) return false;

@@ -13,6 +13,7 @@
 
 #include "exact_support.h"
 #include "platform/tessel/tessel.h"
+#include "tests/support/guarded_buffer.h"
 
 // This program's own base library: it knows every block and its size, and can refuse one.
 namespace {
@@ -468,6 +469,14 @@ TEST_F(Dump, OfPlanarImagesSkipsPlanesWithoutPitch) {
     sheet.Append(&expected, 3 - skipped, 4, 4);
     EXPECT_EQ(Written(sheet.bitmap), expected);
   }
+}
+
+TEST_F(Dump, LooksAtNothingBeyondTheRecord) {
+  const Sheet sheet(0x50000811, 8, 8);
+  testing_support::GuardedBuffer page(sizeof(MBITMAP));
+  void* const last = page.Place(sizeof(MBITMAP), testing_support::GuardedBuffer::Edge::kEnd);
+  memcpy(last, &sheet.bitmap, sizeof(MBITMAP));
+  EXPECT_EQ(Written(*static_cast<const MBITMAP*>(last)), Written(sheet.bitmap));
 }
 
 TEST_F(Dump, OfNv12RoundsChromaRowsDownAndOfNv21Up) {
