@@ -130,25 +130,23 @@ Pitches ComputePitches(const BufferLayout& layout, int64_t width) {
   }
 }
 
-// Bytes of the block that holds all planes; more than INT32_MAX when there can be no such block. A
-// semi-planar image has one chroma plane.
+// Bytes of the block that holds all planes; more than INT32_MAX when there can be no such block.
 uint64_t BlockSize(const BufferLayout& layout, const Pitches& pitches, int64_t height) {
   for (const int64_t pitch : pitches.of) {
     if (pitch < 0 || pitch > INT32_MAX) return UINT64_MAX;
   }
   // The sum of three products of 31-bit numbers fits 64 bits.
   const uint64_t rows = uint64_t(layout.roundsUp() ? RoundUpTo16(height) : height);
-  uint64_t size = rows * uint64_t(pitches.of[0]);
-  if (layout.hasChroma()) {
-    const uint64_t chromaRows = rows / layout.vertical;
-    size += chromaRows * uint64_t(pitches.of[1]);
-    // Engines walk the U plane with pitch 1 wherever it is: in slot 2 when V comes first.
-    const bool longer = layout.vFirst && pitches.of[1] > pitches.of[2];
-    if (layout.kind == BufferLayout::kPlanar) {
-      size += chromaRows * uint64_t(pitches.of[longer ? 1 : 2]);
-    }
-  }
-  return size;
+  const uint64_t size = rows * uint64_t(pitches.of[0]);
+  if (!layout.hasChroma()) return size;
+  const uint64_t chromaRows = rows / layout.vertical;
+  const uint64_t first = chromaRows * uint64_t(pitches.of[1]);
+  const uint64_t second = chromaRows * uint64_t(pitches.of[2]);
+  const uint64_t longer = first > second ? first : second;
+  // The plane of a semi-planar image is walked with both pitches. In planar ones engines walk the U
+  // plane with pitch 1 wherever it is: in slot 2 when V comes first.
+  if (layout.kind != BufferLayout::kPlanar) return size + longer;
+  return size + first + (layout.vFirst ? longer : second);
 }
 
 // An address that may lie beyond the block: a one-plane format with pitches 1 and 2 gets them

@@ -272,6 +272,19 @@ TEST_F(Buffers, KeepThreeGivenPitches) {
   }
 }
 
+TEST_F(Buffers, OfPairsOfChromaHoldRowsOfTheLongerPitch) {
+  for (const uint32_t code : {FORMAT_NV12, FORMAT_NV21}) {
+    for (const int longer : {1, 2}) {
+      MBITMAP bitmap = Fresh(code, 100, 50);
+      bitmap.pitch[0] = bitmap.pitch[1] = bitmap.pitch[2] = 112;
+      bitmap.pitch[longer] = 400;
+      ASSERT_EQ(MBitmapAlloc(&bitmap), KESTREL_OK);
+      EXPECT_EQ(blocks[bitmap.plane[0]], 64u * 112 + 32 * 400) << std::hex << code;
+      MBitmapFree(&bitmap);
+    }
+  }
+}
+
 TEST_F(Buffers, RecomputeThreePitchesWhenOneIsZero) {
   for (const Allocated& row : kAllocated) {
     if (row.pitch[1] == 0) continue;
