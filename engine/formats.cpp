@@ -158,6 +158,7 @@ uint32_t ParseGrey(FormatDesc* desc, uint32_t code) {
 
 uint32_t ParseSemiPlanar(FormatDesc* desc, uint32_t code) {
   const uint32_t internal = code & ~FORMAT_STANDARD_MASK;
+  desc->colourStandard = ColourStandard(code);
   switch (internal) {
     case CODE_NV21:
     case CODE_NV12:
@@ -174,7 +175,6 @@ uint32_t ParseSemiPlanar(FormatDesc* desc, uint32_t code) {
       return KESTREL_UNSUPPORTED;
   }
   desc->code = internal;
-  desc->colourStandard = ColourStandard(code);
   return KESTREL_OK;
 }
 
