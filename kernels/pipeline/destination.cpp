@@ -2,6 +2,8 @@
 
 #include <string.h>
 
+#include "kernels/pipeline/overlap.h"
+
 namespace kestrel {
 namespace {
 
@@ -88,13 +90,13 @@ void PlaneWriter::WriteBlock(int64_t column, int64_t row, const uint8_t* units, 
   }
   const size_t bytes = size_t(n) * size_t(unit_);
   if (plane_.columnStep == unit_ && pitch == plane_.rowStep && pitch == ptrdiff_t(bytes)) {
-    memcpy(plane_.At(column, row), units, bytes * size_t(runs));
+    CopyAscending(plane_.At(column, row), units, bytes * size_t(runs));
     return;
   }
   for (int i = 0; i < runs; ++i) {
     uint8_t* const start = plane_.At(column, row + i);
     if (plane_.columnStep == unit_) {
-      memcpy(start, units + i * pitch, bytes);
+      CopyAscending(start, units + i * pitch, bytes);
     } else {
       rows_.writePixels(start, plane_.columnStep, units + i * pitch, unit_, n);
     }

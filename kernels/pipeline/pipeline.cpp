@@ -3,6 +3,7 @@
 #include <string.h>
 
 #include "kernels/pipeline/destination.h"
+#include "kernels/pipeline/overlap.h"
 #include "kernels/pipeline/source.h"
 
 namespace kestrel {
@@ -44,6 +45,7 @@ class Pipeline {
       if (lumaDone_ && chromaDone_) return;
       if (ConvertRgbInPlace()) return;
       if (ConvertYuvByRows()) return;
+      if (RgbLiesInPlace()) stripWidth_ = Width();
       for (int32_t x = job_.rect.left; x < job_.rect.right; x += stripWidth_) {
         SelectColumns(x);
         for (int32_t r = job_.rect.top; r < job_.rect.bottom;) r += ConvertRows(r);
@@ -97,6 +99,7 @@ class Pipeline {
     const ptrdiff_t run = columns > kStrip ? columns : kStrip;
     const ptrdiff_t runs = makesChroma ? 6 : 3;
     constexpr ptrdiff_t kLeast = ptrdiff_t{3} * kCollected;
+    static_assert(kLeast >= ptrdiff_t{4} * kStrip, "as many pixels may be kept there");
     constexpr size_t kNarrow = kStrip;
     constexpr size_t kTurned = ArrangedSamples::kTurnedColumns;
     // For a column no job takes more than 44 bytes besides, and none that turns YUV more than 32.
@@ -267,9 +270,16 @@ class Pipeline {
       if (!destination_.ContainsLumaRow(r)) continue;
       const uint8_t* const from =
           source_.LumaAt(luma.firstX, source_.SourceRow(r, 1)) - engine_.srcLayout.yOffset;
-      memcpy(destination_.GroupsAt(luma, chroma, r), from, size_t{2} * size_t(luma.n));
+      CopyAscending(destination_.GroupsAt(luma, chroma, r), from, size_t{2} * size_t(luma.n));
     }
     return true;
+  }
+
+  // Whether rows of RGB to RGB need no buffer, and so no strips.
+  bool RgbLiesInPlace() {
+    const bool unit = engine_.stepX == 0x10000 && engine_.stepY == 0x10000;
+    return unit && engine_.pathKind == PATH_RGB_TO_RGB && destination_.writer(0).inPlace() &&
+           source_.LumaLiesInPlace(job_.rect.left, Width());
   }
 
   // Whether pixels of RGB keep every bit.
@@ -782,9 +792,9 @@ class Pipeline {
       uint8_t* const into = keepsPixels_ && to.n == n_ ? to.pixels : nullptr;
       const uint8_t* const first = source_.Pixels(r, into) + ptrdiff_t{to.first} * from.bytes;
       if (!keepsPixels_) {
-        rows_.repackPixels(to.pixels, first, from, destination_.pixelFormat(), to.n);
+        RepackAscending(to.pixels, first, to.n);
       } else if (first != into) {
-        memcpy(to.pixels, first, size_t(to.n) * size_t(from.bytes));
+        CopyAscending(to.pixels, first, size_t(to.n) * size_t(from.bytes));
       }
       destination_.FinishPixels();
       return copies;
@@ -797,6 +807,22 @@ class Pipeline {
     }
     destination_.PutRgb(r, run.channel, run.alpha, clampedCarry_);
     return 1;
+  }
+
+  // Rows may be converted where they are: in ascending order of pixels then, several at once where
+  // none is written before it is read.
+  void RepackAscending(uint8_t* dst, const uint8_t* src, int n) {
+    const PixelFormat& from = source_.pixelFormat();
+    const PixelFormat& to = destination_.pixelFormat();
+    if (!Overlap(dst, size_t(n) * size_t(to.bytes), src, size_t(n) * size_t(from.bytes))) {
+      return rows_.repackPixels(dst, src, from, to, n);
+    }
+    const int most = dst <= src && to.bytes <= from.bytes ? kStrip : 1;
+    for (int i = 0; i < n; i += most) {
+      const int count = n - i < most ? n - i : most;
+      memcpy(memory_, src + ptrdiff_t{i} * from.bytes, size_t(count) * size_t(from.bytes));
+      rows_.repackPixels(dst + ptrdiff_t{i} * to.bytes, memory_, from, to, count);
+    }
   }
 
   void RgbToYuv(int32_t r) {
@@ -973,7 +999,7 @@ class Pipeline {
   const EngineContext& engine_;
   Source source_;
   Destination destination_;
-  // Runs of samples; or those of short rows, luma and then chroma.
+  // Runs of samples; or those of short rows, luma and then chroma; or kStrip pixels.
   uint8_t* memory_ = nullptr;
   uint8_t* channels_[3] = {};
   uint8_t *luma_ = nullptr, *u_ = nullptr, *v_ = nullptr;
