@@ -346,7 +346,8 @@ TEST(TableBlock, IsReadWhereEveryColourStaysInside) {
         }
       }
       const bool isRead = s.insideClampTable != 0;
-      EXPECT_FALSE(isRead && (below < 0 || above < 0)) << code << ", adjusted " << adjustments;
+      // A remainder that dithering carries and the carries of chroma words add up to 8 levels.
+      EXPECT_FALSE(isRead && (below < 0 || above < 8)) << code << ", adjusted " << adjustments;
       EXPECT_TRUE(isRead || below < 12 || above < 12) << code << ", adjusted " << adjustments;
       read += isRead;
       leftBelow += below < 0 && above >= 12;

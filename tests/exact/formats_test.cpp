@@ -373,6 +373,9 @@ TEST(PlaneLayouts, OfPlanarCodesWithOpenSubsamplingTakeAllSixFactorsFromTheDescr
     EXPECT_EQ(laid.layout.isPlanar, 1u);
     EXPECT_EQ(laid.layout.isPacked, 0u);
     for (int32_t step : laid.layout.step) EXPECT_EQ(step, 1);
+    EXPECT_EQ(laid.layout.yOffset, 0u);
+    EXPECT_EQ(laid.layout.uOffset, 0u);
+    EXPECT_EQ(laid.layout.vOffset, 0u);
   }
 }
 

@@ -646,6 +646,9 @@ TEST_F(FromDescriptor, CopiesRows) {
                       bytes[size_t(y * (row + gap) + from)])
                 << x << ", " << y;
           }
+          for (int32_t x = row + gap; x < int32_t(fake.info.stride); ++x) {
+            ASSERT_EQ(fake.pixels[y * int32_t(fake.info.stride) + x], 0) << x << ", " << y;
+          }
         }
       }
     }
