@@ -20,7 +20,7 @@ using testing_support::GuardedBuffer;
 
 constexpr size_t kCapacity = size_t{1} << 22;
 constexpr int32_t kLongest = 4800;
-constexpr int64_t kMostPixels = int64_t{kLongest} * 75;
+constexpr int64_t kMostPixels = int64_t{kLongest} * 25;
 constexpr int64_t kFarthest = 16777216;  // regions that start beyond are not drawn
 
 // The plainest first, of which zeros are made, then the others.
