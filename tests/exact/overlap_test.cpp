@@ -1,6 +1,7 @@
 // Source and destination in the same memory: rows whose bytes overlap are processed in ascending
 // order, so that pixels can be converted where they are.
 #include <algorithm>
+#include <cctype>
 #include <vector>
 
 #include "tests/exact/exact_support.h"
@@ -34,8 +35,8 @@ void ExpectInPlace(const testing_support::InstructionSet& set, const Rgb& from, 
   testing_support::ForceRows(engine.handle(), set);
   const Bytes source = Numbered(size_t(fromPitch) * kHeight);
   Bytes apart = source;
-  Bytes from1 = source;
-  ASSERT_EQ(Process(engine, OnePlane(apart, toPitch), OnePlane(from1, fromPitch)), KESTREL_OK);
+  Bytes input = source;
+  ASSERT_EQ(Process(engine, OnePlane(apart, toPitch), OnePlane(input, fromPitch)), KESTREL_OK);
   Bytes inPlace = source;
   ASSERT_EQ(Process(engine, OnePlane(inPlace, toPitch), OnePlane(inPlace, fromPitch)), KESTREL_OK);
   EXPECT_EQ(inPlace, apart);
