@@ -16,6 +16,7 @@
 
 namespace {
 
+using kestrel::PairPlan;
 using kestrel::PixelFormat;
 using kestrel::RowOps;
 using kestrel::YuvToRgbForm;
@@ -106,6 +107,14 @@ struct Runs {
     plan.stride = 1;
     plan.weights = weights.data();
     plan.blends = blends.data();
+    pixelPlan = plan;
+    pixelPlan.n = 4 * kPixels;
+    pixelPlan.unit = 4;
+    pixelPlan.keptByte = 3;
+    pixelPlan.prepared = preparedPixels.data();
+    pixelPlan.first = scaledPixels.data();
+    pixelPlan.second = nextPixels.data();
+    pixelPlan.blends = pixelBlends.data();
     inChannels[0] = a.data();
     inChannels[1] = b.data();
     inChannels[2] = c.data();
@@ -127,9 +136,12 @@ struct Runs {
   std::vector<uint8_t> out[3];
   std::vector<int32_t> scaled, scaledPixels, nextPixels, neighbours;
   std::vector<uint16_t> weights;
-  std::vector<uint8_t> prepared = std::vector<uint8_t>(3 * kPairs);
+  std::vector<uint8_t> prepared = std::vector<uint8_t>(PairPlan::kPreparedBytes * kPairs);
   std::vector<uint16_t> blends = std::vector<uint16_t>(kPairs);
-  kestrel::PairPlan plan = {};
+  std::vector<uint8_t> preparedPixels =
+      std::vector<uint8_t>(PairPlan::kPreparedBytes * 4 * kPixels);
+  std::vector<uint16_t> pixelBlends = std::vector<uint16_t>(4 * kPixels);
+  PairPlan plan = {}, pixelPlan = {};
   kestrel::Carry carry = {{7, 3, 7}, {0, 0, 0}};
   const uint8_t* inChannels[3];
   uint8_t* outChannels[3];
@@ -173,6 +185,11 @@ const Case kCases[] = {
      [](const RowOps& ops, Runs* r) { ops.readPairs(r->out[0].data(), r->a.data(), r->plan); }},
     {"blendPairs", kPairs,
      [](const RowOps& ops, Runs* r) { ops.blendPairs(r->out[0].data(), r->a.data(), r->plan); }},
+    {"planPairs RGBA", kPixels, [](const RowOps& ops, Runs* r) { ops.planPairs(&r->pixelPlan); }},
+    {"blendPairs RGBA", kPixels,
+     [](const RowOps& ops, Runs* r) {
+       ops.blendPairs(r->out[0].data(), r->pixels.data(), r->pixelPlan);
+     }},
     {"blendColumns", kPixels,
      [](const RowOps& ops, Runs* r) {
        ops.blendColumns(r->out[0].data(), r->a.data(), r->b.data(), r->weights.data(), kPixels);
@@ -180,12 +197,6 @@ const Case kCases[] = {
     {"blendRows", kPixels,
      [](const RowOps& ops, Runs* r) {
        ops.blendRows(r->out[0].data(), r->a.data(), r->b.data(), 21845, kPixels);
-     }},
-    {"blendPixels RGBA", kPixels,
-     [](const RowOps& ops, Runs* r) {
-       ops.blendPixels(r->out[0].data(), r->pixels.data(),
-                       {r->scaledPixels.data(), r->nextPixels.data(), r->weights.data()}, 3,
-                       kPixels);
      }},
     {"blendPixelRows RGBA", kPixels,
      [](const RowOps& ops, Runs* r) {
@@ -377,6 +388,7 @@ const Case kCases[] = {
 
 void Time(benchmark::State& state, const Case& c, const RowOps& ops, Runs* runs) {
   ops.planPairs(&runs->plan);
+  ops.planPairs(&runs->pixelPlan);
   for ([[maybe_unused]] auto _ : state) {
     c.call(ops, runs);
     benchmark::ClobberMemory();

@@ -102,9 +102,9 @@ class Pipeline {
     static_assert(kLeast >= ptrdiff_t{4} * kStrip, "as many pixels may be kept there");
     constexpr size_t kNarrow = kStrip;
     constexpr size_t kTurned = ArrangedSamples::kTurnedColumns;
-    // For a column no job takes more than 44 bytes besides, and none that turns YUV more than 32.
+    // For a column no job takes more than 58 bytes besides, and none that turns YUV more than 32.
     static_assert(StripMemory::kSize >= ArrangedSamples::kTurnedSize + kLeast + 32 * kTurned &&
-                      StripMemory::kSize >= ArrangedSamples::kMirroredSize + kLeast + 44 * kNarrow,
+                      StripMemory::kSize >= ArrangedSamples::kMirroredSize + kLeast + 58 * kNarrow,
                   "there is room for the narrowest strips");
     memory_ = memory->Take<uint8_t>(size_t(runs * run > kLeast ? runs * run : kLeast));
     if (memory_ == nullptr) return;

@@ -55,9 +55,16 @@ void SampleColumns::PlanApart(int32_t apart, const RowOps& rows) const {
   PlanWith(nullptr, nullptr, rows);
 }
 
+void SampleColumns::PlanPixels(const int32_t* second, const uint16_t* weights,
+                               const PixelFormat& format, const RowOps& rows) const {
+  plan->unit = format.bytes;
+  plan->keptByte = format.alphaByte;
+  PlanWith(second, weights, rows);
+}
+
 void SampleColumns::PlanWith(const int32_t* second, const uint16_t* weights,
                              const RowOps& rows) const {
-  plan->n = n;
+  plan->n = n * plan->unit;
   plan->first = offset;
   plan->second = second;
   plan->stride = 1;
@@ -83,13 +90,13 @@ Source::Source(const Job& job)
   first_.plan = &firstPlan_;
   chromaU_.plan = second_.plan = &chromaPlan_;
   constexpr int64_t kAhead = 6;  // rows of the destination
-  const auto halfRow = [&job](int plane) {
+  const auto quarterRow = [&job](int plane) {
     const int64_t pitch = job.srcPitches[plane];
-    return int32_t((pitch < 0 ? -pitch : pitch) / 2);
+    return int32_t((pitch < 0 ? -pitch : pitch) / 4);
   };
-  first_.wide = second_.wide = halfRow(0);
-  chromaU_.wide = halfRow(1);
-  chromaV_.wide = halfRow(2);
+  first_.wide = second_.wide = quarterRow(0);
+  chromaU_.wide = quarterRow(1);
+  chromaV_.wide = quarterRow(2);
   for (int chroma = 0; chroma < 2; ++chroma) {
     const int64_t factor = chroma != 0 ? job.engine.srcSubsample[4] : 1;
     const int64_t ahead = kAhead * job.engine.stepY / (factor * 65536);
@@ -110,6 +117,9 @@ void Source::TakeMemory(StripMemory* memory, int columns) {
   const auto blocks = [](int n) {
     constexpr size_t kBlock = PairPlan::kBlock;
     return (size_t(n) + kBlock - 1) / kBlock * kBlock;
+  };
+  const auto takePlan = [=](int n) {
+    return memory->Take<uint8_t>(PairPlan::kPreparedBytes * blocks(n));
   };
   // n columns in each of some pieces, which follow each other.
   const auto takePieces = [=](auto& pieces, size_t n) {
@@ -133,12 +143,16 @@ void Source::TakeMemory(StripMemory* memory, int columns) {
       takePieces(scratch_, n);
       takePieces(blended_, n);
     }
-    if (pixels_.bytes != 2) return;
-    firstPlan_.prepared = memory->Take<uint8_t>(3 * blocks(columns));
-    if (blends) chromaPlan_.prepared = memory->Take<uint8_t>(3 * blocks(columns));
+    if (pixels_.bytes == 2) {
+      firstPlan_.prepared = takePlan(columns);
+      if (blends) chromaPlan_.prepared = takePlan(columns);
+    } else if (blends && BlendsPixels()) {
+      firstPlan_.prepared = takePlan(pixels_.bytes * columns);
+      firstPlan_.blends = memory->Take<uint16_t>(blocks(pixels_.bytes * columns));
+    }
     return;
   }
-  firstPlan_.prepared = memory->Take<uint8_t>(3 * blocks(blends ? columns : columns / 2));
+  firstPlan_.prepared = takePlan(blends ? columns : columns / 2);
   for (Line& line : lines_) line.samples[0] = memory->Take<uint8_t>(n);
   if (blends) {
     firstPlan_.blends = memory->Take<uint16_t>(blocks(columns));
@@ -153,7 +167,7 @@ void Source::TakeMemory(StripMemory* memory, int columns) {
   }
   chromaU_.offset = memory->Take<int32_t>(size_t(chroma));
   if (job_.has(kPairChroma)) chromaV_.offset = memory->Take<int32_t>(size_t(chroma));
-  chromaPlan_.prepared = memory->Take<uint8_t>(3 * blocks(chroma));
+  chromaPlan_.prepared = takePlan(chroma);
   if (toPixels) packed_ = memory->Take<uint8_t>(2 * n);
   if (!toPixels || c.dither != 0 || job_.has(kClampedCarry)) {
     u_ = memory->Take<uint8_t>(size_t(chroma));
@@ -183,6 +197,9 @@ void Source::SelectColumns(int32_t x, int n) {
   if (interpolates_) second_.FinishSamples(n);
   if (job_.engine.srcLayout.code == CODE_RGB) {
     // Pixels are gathered whole; those of two bytes are pairs of them.
+    if (interpolates_ && BlendsPixels()) {
+      return first_.PlanPixels(second_.offset, weights_, pixels_, rows_);
+    }
     if (pixels_.bytes != 2 || palette_ != nullptr) return;
     if (!first_.contiguous) first_.PlanApart(1, rows_);
     if (interpolates_ && !second_.contiguous) second_.PlanApart(1, rows_);
@@ -507,8 +524,7 @@ void Source::FillPixelLine(Line* line, int32_t row) {
   uint8_t* const pixels = line->samples[0];
   line->channel[0] = pixels;
   if (interpolates_) {
-    rows_.blendPixels(pixels, start, {first_.offset, second_.offset, weights_}, pixels_.alphaByte,
-                      first_.n);
+    rows_.blendPairs(pixels, start, firstPlan_);
   } else if (first_.contiguous) {
     line->channel[0] = start + first_.offset[0];
   } else {
@@ -517,8 +533,7 @@ void Source::FillPixelLine(Line* line, int32_t row) {
 }
 
 bool Source::HasPixels(int32_t r) const {
-  return palette_ == nullptr &&
-         ((pixels_.bytes == 4 && pixels_.wholeBytes) || !(interpolates_ || BlendsRows(r)));
+  return palette_ == nullptr && (BlendsPixels() || !(interpolates_ || BlendsRows(r)));
 }
 
 bool Source::BlendsRows(int32_t r) const {
@@ -532,8 +547,13 @@ const uint8_t* Source::Pixels(int32_t r, uint8_t* into) {
     const Lines lines = FetchLines<&Source::FillPixelLine>(r);
     if (lines.weight == 0) return lines.first->channel[0];
     uint8_t* const blended = into != nullptr ? into : blended_[0];
-    rows_.blendPixelRows(blended, lines.first->channel[0], lines.second->channel[0], lines.weight,
-                         pixels_.alphaByte, first_.n);
+    const uint8_t* const a = lines.first->channel[0];
+    const uint8_t* const b = lines.second->channel[0];
+    if (pixels_.bytes == 4) {
+      rows_.blendPixelRows(blended, a, b, lines.weight, pixels_.alphaByte, first_.n);
+    } else {
+      rows_.blendRows(blended, a, b, lines.weight, pixels_.bytes * first_.n);
+    }
     return blended;
   }
   const uint8_t* const row = RowToRead(0, SourceRow(r, 1), first_);

@@ -33,6 +33,9 @@ struct SampleColumns {
   void Plan(const RowOps& rows) const;
   // Pairs of each column's sample and another, with weights or null.
   void PlanWith(const int32_t* second, const uint16_t* weights, const RowOps& rows) const;
+  // Of each column's pixel and another, byte by byte, but for alpha.
+  void PlanPixels(const int32_t* second, const uint16_t* weights, const PixelFormat& format,
+                  const RowOps& rows) const;
   // Pairs of each column's sample and the one so many bytes after it.
   void PlanApart(int32_t apart, const RowOps& rows) const;
 };
@@ -101,7 +104,7 @@ class Source {
   const uint8_t* ChromaPairs(int32_t r, uint8_t* into);
   RgbRun Rgb(int32_t r);
   // The strip's packed pixels. Null unless HasPixels: where they come from a palette, or are
-  // blended and not of four whole bytes. Not to be mixed with Rgb in a strip. What is not in place
+  // blended and have fields within bytes. Not to be mixed with Rgb in a strip. What is not in place
   // is made in `into` where that is given.
   const uint8_t* Pixels(int32_t r, uint8_t* into = nullptr);
   bool HasPixels(int32_t r) const;
@@ -179,6 +182,8 @@ class Source {
   // The strip's pixels of a row, side by side.
   void Gather(uint8_t* into, const uint8_t* row, const SampleColumns& columns) const;
   int32_t ChromaColumn(int32_t x) const;
+  // Whether pixels are blended as they are, without taking their channels apart.
+  bool BlendsPixels() const { return palette_ == nullptr && pixels_.wholeBytes; }
   // Samples of chroma that a strip may have.
   int ChromaOf(int columns) const;
   const uint8_t* Chroma(int plane, int32_t r, const SampleColumns& columns, uint8_t* buffer);

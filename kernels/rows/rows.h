@@ -95,36 +95,45 @@ struct LevelMap {
 };
 
 // For each of n pairs of bytes where they come from, and what an instruction set prepares of that
-// for itself. The lists are the caller's: byte offsets from the start of a row.
+// for itself. The lists are the caller's: byte offsets from the start of a row. Bytes of pixels are
+// pairs as well: each unit of some bytes has an entry in the lists.
 struct PairPlan {
-  static constexpr int kBlock = 64;  // of pairs
+  static constexpr int kBlock = 64;         // of pairs
+  static constexpr int kPreparedBytes = 3;  // for each pair
   int n = 0;
-  const int32_t* first = nullptr;  // of pair i: first[i * stride], second[i * stride]
+  const int32_t* first = nullptr;  // of unit i: first[i * stride], second[i * stride]
   const int32_t* second = nullptr;
   int32_t apart = 0;  // without `second`: from each first byte to the second
   int stride = 1;
-  const uint16_t* weights = nullptr;  // for blendPairs: a weight for each pair
-  // Memory for what is prepared, in whole blocks: 3 bytes for each pair, and a word for each that
-  // has a weight.
+  const uint16_t* weights = nullptr;  // for blendPairs: a weight for each unit
+  int unit = 1;                       // bytes: 1, or those of a pixel of 3 or 4
+  int keptByte = -1;                  // of a unit: both of its pairs are the first byte
+  // Memory for what is prepared, in whole blocks: some bytes for each pair, and a word for each
+  // that has a weight.
   uint8_t* prepared = nullptr;
   uint16_t* blends = nullptr;
 
-  int32_t First(int i) const { return first[ptrdiff_t{i} * stride]; }
-  int32_t Second(int i) const {
-    return second != nullptr ? second[ptrdiff_t{i} * stride] : First(i) + apart;
-  }
+  // Where the units of pairs begin.
+  struct Lists {
+    explicit Lists(const PairPlan& plan)
+        : first(plan.first),
+          second(plan.second == nullptr ? plan.first : plan.second),
+          stride(plan.stride),
+          apart(plan.second == nullptr ? plan.apart : 0) {}
+    int32_t First(int unit) const { return first[ptrdiff_t{unit} * stride]; }
+    int32_t Second(int unit) const { return second[ptrdiff_t{unit} * stride] + apart; }
+    const int32_t* first;
+    const int32_t* second;
+    int stride;
+    int32_t apart;
+  };
 
-  // Of each eight pairs: one or two windows of 16 bytes, for all or for half of them, or -1 where
-  // there is none, and where in the windows their bytes are; by blocks as vectors take them.
-  int windows = 0;          // of each eight
+  // Of the bytes that are read the lowest, and how far it is to the end of the highest.
+  int32_t lowest = 0, extent = 0;
+  // How many windows of some bytes each group of pairs has, of which vectors take theirs: 1, 2 or
+  // 4. Where there is no such window pairs are read one by one.
+  int windows = 0;
   bool hasWindows = false;  // everywhere
-};
-
-// Byte offsets of two neighbouring pixels, and the weight of the second.
-struct PixelTaps {
-  const int32_t* first;
-  const int32_t* second;
-  const uint16_t* weights;
 };
 
 // Error carry of 16-bit RGB: the bits that narrowing drops are added to the next pixel's index.
@@ -160,10 +169,7 @@ struct KestrelRowOps {
                        int n);
   void (*blendRows)(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t weight, int n);
 
-  // The same for packed pixels of four bytes: pixel i from those at first[i] and second[i], each of
-  // its bytes blended by weights[i] but for byte `alphaByte`, which is the first pixel's. -1: none.
-  void (*blendPixels)(uint8_t* dst, const uint8_t* src, const kestrel::PixelTaps& taps,
-                      int alphaByte, int n);
+  // The same for packed pixels of four bytes, but for byte `alphaByte`, which is a's. -1: none.
   void (*blendPixelRows)(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t weight,
                          int alphaByte, int n);
 

@@ -68,32 +68,22 @@ void BlendRows(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t weight
   for (int i = 0; i < n; ++i) dst[i] = Blend(a[i], b[i], int32_t(weight));
 }
 
-static void BlendPixel(uint8_t* dst, const uint8_t* a, const uint8_t* b, int32_t weight,
-                       int alphaByte) {
-  for (int k = 0; k < 4; ++k) dst[k] = k == alphaByte ? a[k] : Blend(a[k], b[k], weight);
-}
-
-void BlendPixels(uint8_t* dst, const uint8_t* src, const PixelTaps& taps, int alphaByte, int n) {
-  for (int i = 0; i < n; ++i) {
-    BlendPixel(dst + ptrdiff_t{4} * i, src + taps.first[i], src + taps.second[i], taps.weights[i],
-               alphaByte);
-  }
-}
-
 void BlendPixelRows(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t weight,
                     int alphaByte, int n) {
-  for (int i = 0; i < n; ++i) {
-    BlendPixel(dst + ptrdiff_t{4} * i, a + ptrdiff_t{4} * i, b + ptrdiff_t{4} * i, int32_t(weight),
-               alphaByte);
+  for (int i = 0; i < 4 * n; ++i) {
+    dst[i] = i % 4 == alphaByte ? a[i] : Blend(a[i], b[i], int32_t(weight));
   }
 }
 
 void PlanPairs(PairPlan*) {}
 
+// (In copies of the plan's lists: a byte that is written might change those of a plan by
+// reference.)
 void ReadSomePairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan, int i, int end) {
+  const PairPlan::Lists lists(plan);
   for (; i < end; ++i) {
-    dst[2 * i] = src[plan.First(i)];
-    dst[2 * i + 1] = src[plan.Second(i)];
+    dst[2 * i] = src[lists.First(i)];
+    dst[2 * i + 1] = src[lists.Second(i)];
   }
 }
 
@@ -101,9 +91,35 @@ void ReadPairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan) {
   ReadSomePairs(dst, src, plan, 0, plan.n);
 }
 
+template <int kUnit>
+void BlendUnits(uint8_t* dst, const uint8_t* src, const PairPlan& plan, int i, int end) {
+  const PairPlan::Lists lists(plan);
+  const uint16_t* const weights = plan.weights;
+  const int keptByte = plan.keptByte;
+  const auto blend = [=](int unit, int byte, int endOfBytes) {
+    const uint8_t* const first = src + lists.First(unit);
+    const uint8_t* const second = src + lists.Second(unit);
+    const int32_t weight = weights[unit];
+    uint8_t* const out = dst + ptrdiff_t{unit} * kUnit;
+    for (; byte < endOfBytes; ++byte) {
+      out[byte] = byte == keptByte ? first[byte] : Blend(first[byte], second[byte], weight);
+    }
+  };
+  int unit = i / kUnit;
+  const int from = i % kUnit;
+  if (from != 0) blend(unit++, from, end - i + from < kUnit ? end - i + from : kUnit);
+  for (; (unit + 1) * kUnit <= end; ++unit) blend(unit, 0, kUnit);
+  if (unit * kUnit < end) blend(unit, 0, end - unit * kUnit);
+}
+
 void BlendSomePairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan, int i, int end) {
-  for (; i < end; ++i) {
-    dst[i] = Blend(src[plan.First(i)], src[plan.Second(i)], plan.weights[i]);
+  switch (plan.unit) {
+    case 1:
+      return BlendUnits<1>(dst, src, plan, i, end);
+    case 3:
+      return BlendUnits<3>(dst, src, plan, i, end);
+    default:
+      return BlendUnits<4>(dst, src, plan, i, end);
   }
 }
 
@@ -668,7 +684,6 @@ const RowOps kScalarRows = {"scalar",
                             scalar::BlendPairs,
                             scalar::BlendColumns,
                             scalar::BlendRows,
-                            scalar::BlendPixels,
                             scalar::BlendPixelRows,
                             scalar::UnpackRgb,
                             scalar::UnpackAlpha,

@@ -22,7 +22,6 @@ void BlendPairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan);
 void BlendSomePairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan, int i, int end);
 void BlendColumns(uint8_t* dst, const uint8_t* a, const uint8_t* b, const uint16_t* weights, int n);
 void BlendRows(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t weight, int n);
-void BlendPixels(uint8_t* dst, const uint8_t* src, const PixelTaps& taps, int alphaByte, int n);
 void BlendPixelRows(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t weight,
                     int alphaByte, int n);
 void UnpackRgb(uint8_t* const rgb[3], const uint8_t* src, const PixelFormat& format, int n);

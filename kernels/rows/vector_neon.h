@@ -109,6 +109,10 @@ inline Bytes operator-(Bytes a, Bytes b) {
 inline Bytes operator&(Bytes a, Bytes b) {
   return {vandq_u8(a.v, b.v)};
 }
+// Bits of a where `selected` has ones, else of b.
+inline Bytes SelectBits(Bytes selected, Bytes a, Bytes b) {
+  return {vbslq_u8(selected.v, a.v, b.v)};
+}
 inline Bytes AddSaturated(Bytes a, Bytes b) {
   return {vqaddq_u8(a.v, b.v)};
 }
@@ -341,9 +345,11 @@ inline void StorePairs(uint8_t* p, const Pairs& pairs) {
   const uint8x16x2_t both = {{pairs.first, pairs.second}};
   vst2q_u8(p, both);
 }
-// Of a window's pairs the first bytes, then the second ones.
+// Bytes that windows have, by which pairs are taken from them. Of a window's pairs the first bytes,
+// then the second ones.
+constexpr int kWindow = 16;
 template <int kShared>
-inline void SetShuffle(uint8_t* shuffle, const uint8_t (&at)[16]) {
+inline void SetShuffle(uint8_t* shuffle, const uint8_t (&at)[kWindow]) {
   for (int k = 0; k < 8; ++k) {
     uint8_t* const window = shuffle + k / kShared * 2 * kShared + k % kShared;
     window[0] = at[2 * k];
@@ -364,34 +370,47 @@ inline uint8x8_t Pick(uint8x16_t window, uint8x8_t shuffle) {
   return vtbl2_u8({{vget_low_u8(window), vget_high_u8(window)}}, shuffle);
 #endif
 }
+// Eight bytes of two windows.
+inline uint8x8_t PickHalves(const uint8_t* first, const uint8_t* second, uint8x8_t shuffle) {
+  const uint8x8_t upper = vcreate_u8(0xFFFFFFFF00000000);
+  return vbsl_u8(upper, Pick(vld1q_u8(second), shuffle), Pick(vld1q_u8(first), shuffle));
+}
 // Eight pairs of a plan's block: first bytes, then second ones.
 template <int kWindows>
-inline uint8x16_t GatherEight(const uint8_t* src, const int32_t* window, uint8x16_t shuffle) {
-  const uint8x16_t bytes = vld1q_u8(src + window[0]);
-  const uint8x8_t low = Pick(bytes, vget_low_u8(shuffle));
-  const uint8x8_t high =
-      Pick(kWindows == 1 ? bytes : vld1q_u8(src + window[1]), vget_high_u8(shuffle));
-  if constexpr (kWindows == 1) return vcombine_u8(low, high);
-  // Four first bytes and four second ones of either window.
-  const uint32x2x2_t halves = vtrn_u32(vreinterpret_u32_u8(low), vreinterpret_u32_u8(high));
-  return vcombine_u8(vreinterpret_u8_u32(halves.val[0]), vreinterpret_u8_u32(halves.val[1]));
+inline uint8x16_t GatherEight(const uint8_t* src, const uint16_t* windows, uint8x16_t shuffle) {
+  const auto window = [=](int i) { return src + windows[i]; };
+  const uint8x8_t order[] = {vget_low_u8(shuffle), vget_high_u8(shuffle)};
+  if constexpr (kWindows == 1) {
+    const uint8x16_t bytes = vld1q_u8(window(0));
+    return vcombine_u8(Pick(bytes, order[0]), Pick(bytes, order[1]));
+  } else if constexpr (kWindows == 2) {
+    // Four first bytes and four second ones of either window.
+    const uint32x2x2_t halves = vtrn_u32(vreinterpret_u32_u8(Pick(vld1q_u8(window(0)), order[0])),
+                                         vreinterpret_u32_u8(Pick(vld1q_u8(window(1)), order[1])));
+    return vcombine_u8(vreinterpret_u8_u32(halves.val[0]), vreinterpret_u8_u32(halves.val[1]));
+  } else {
+    // Two and two of each.
+    const uint16x4x2_t halves =
+        vuzp_u16(vreinterpret_u16_u8(PickHalves(window(0), window(1), order[0])),
+                 vreinterpret_u16_u8(PickHalves(window(2), window(3), order[1])));
+    return vcombine_u8(vreinterpret_u8_u16(halves.val[0]), vreinterpret_u8_u16(halves.val[1]));
+  }
 }
+// A block of a plan: of its windows and its shuffle.
 template <int kWindows>
-inline Pairs GatherPairs(const uint8_t* src, const uint8_t* block) {
-  int32_t window[2 * kWindows];
-  __builtin_memcpy(window, block, sizeof(window));
-  const uint8x16_t a = GatherEight<kWindows>(src, window, vld1q_u8(block + kPairs));
-  const uint8x16_t b = GatherEight<kWindows>(src, window + kWindows, vld1q_u8(block + kPairs + 16));
+inline Pairs GatherPairs(const uint8_t* src, const uint8_t* windows, const uint8_t* shuffle) {
+  uint16_t window[2 * kWindows];
+  __builtin_memcpy(window, windows, sizeof(window));
+  const uint8x16_t a = GatherEight<kWindows>(src, window, vld1q_u8(shuffle));
+  const uint8x16_t b = GatherEight<kWindows>(src, window + kWindows, vld1q_u8(shuffle + 16));
   return {vcombine_u8(vget_low_u8(a), vget_low_u8(b)),
           vcombine_u8(vget_high_u8(a), vget_high_u8(b))};
 }
 
 // ---- Pixels of four bytes
-// Words for the bytes of pixels: `one` for byte `byte`, `others` for the rest.
-inline Words QuadWords(int byte, int one, int others) {
-  uint16_t words[8];
-  for (int i = 0; i < 8; ++i) words[i] = uint16_t(i % 4 == byte ? one : others);
-  return {vld1q_u16(words)};
+// All bits of one byte of each pixel.
+inline Bytes QuadBytes(int byte) {
+  return {vreinterpretq_u8_u32(vdupq_n_u32(0xFFu << (8 * byte)))};
 }
 // (Through bytes: pixels need not be aligned.)
 inline uint32_t LoadQuad(const uint8_t* p) {
@@ -406,13 +425,6 @@ inline Bytes GatherQuads(const uint8_t* src, const int32_t* offsets, int32_t) {
   v = vsetq_lane_u32(LoadQuad(src + offsets[3]), v, 3);
   return {vreinterpretq_u8_u32(v)};
 }
-// Each of a vector's pixels' weights for all its bytes.
-inline WordsPair SpreadToQuads(const uint16_t* weights) {
-  const uint16x4_t w = vld1_u16(weights);
-  return {{vcombine_u16(vdup_lane_u16(w, 0), vdup_lane_u16(w, 1))},
-          {vcombine_u16(vdup_lane_u16(w, 2), vdup_lane_u16(w, 3))}};
-}
-
 // The odd bytes of two vectors.
 inline Bytes Seconds(Bytes a, Bytes b) {
   return {vuzpq_u8(a.v, b.v).val[1]};

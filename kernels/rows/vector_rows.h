@@ -119,15 +119,20 @@ void BlendColumns(uint8_t* dst, const uint8_t* a, const uint8_t* b, const uint16
       Units{a, 1}, Units{b, 1}, Units{reinterpret_cast<const uint8_t*>(weights), 2});
 }
 
-template <bool kFromSecond>
-void BlendRowsFrom(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t weight, int n) {
+// (Vectors are no arguments of functions that are called: those would leave it to their callers to
+// clear the upper parts of registers, which slow down what follows.)
+template <bool kFromSecond, bool kKeepsByte>
+void BlendRowsFrom(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t weight, int keptByte,
+                   int n) {
   const Words w = SetWords(int(weight));
+  const Bytes kept = QuadBytes(keptByte);
   uint8_t* const dsts[] = {dst};
-  ForRun<1>(
+  ForRun<1, kKeepsByte ? 4 : 1>(
       dsts, n,
       [=](uint8_t* const* out, const uint8_t* inA, const uint8_t* inB) {
         const Bytes first = LoadBytes(inA);
-        const Bytes second = LoadBytes(inB);
+        Bytes second = LoadBytes(inB);
+        if constexpr (kKeepsByte) second = SelectBits(kept, first, second);
         StoreBytes(out[0], AddShare(kFromSecond ? second : first, first, second, w));
       },
       Units{a, 1}, Units{b, 1});
@@ -136,9 +141,20 @@ void BlendRowsFrom(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t we
 // As in Blend: a weight of 0.5 and more counts as itself less one.
 void BlendRows(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t weight, int n) {
   if (weight >= 32768) {
-    BlendRowsFrom<true>(dst, a, b, weight, n);
+    BlendRowsFrom<true, false>(dst, a, b, weight, 0, n);
   } else {
-    BlendRowsFrom<false>(dst, a, b, weight, n);
+    BlendRowsFrom<false, false>(dst, a, b, weight, 0, n);
+  }
+}
+
+void BlendPixelRows(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t weight,
+                    int alphaByte, int n) {
+  if (alphaByte < 0) {
+    BlendRows(dst, a, b, weight, 4 * n);
+  } else if (weight >= 32768) {
+    BlendRowsFrom<true, true>(dst, a, b, weight, alphaByte, 4 * n);
+  } else {
+    BlendRowsFrom<false, true>(dst, a, b, weight, alphaByte, 4 * n);
   }
 }
 
@@ -153,37 +169,6 @@ void GatherPixels(uint8_t* dst, const uint8_t* src, const int32_t* offsets, int 
     }
   }
   scalar::GatherPixels(dst + ptrdiff_t{i} * bytes, src, offsets + i, bytes, n - i);
-}
-
-void BlendPixels(uint8_t* dst, const uint8_t* src, const PixelTaps& taps, int alphaByte, int n) {
-  const Words keep = QuadWords(alphaByte, 0, 0xFFFF);
-  const int32_t end = n > 0 ? taps.second[n - 1] + 4 : 0;
-  int i = 0;
-  for (; i + kQuads <= n; i += kQuads) {
-    const WordsPair first = Widen(GatherQuads(src, taps.first + i, end));
-    const WordsPair second = Widen(GatherQuads(src, taps.second + i, end));
-    const WordsPair weights = SpreadToQuads(taps.weights + i);
-    StoreBytes(dst + 4 * i, Narrow(Blend(first.low, second.low, weights.low & keep),
-                                   Blend(first.high, second.high, weights.high & keep)));
-  }
-  if (i == n) return;
-  kNarrower.blendPixels(dst + 4 * i, src, {taps.first + i, taps.second + i, taps.weights + i},
-                        alphaByte, n - i);
-}
-
-void BlendPixelRows(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t weight,
-                    int alphaByte, int n) {
-  const Words weights = QuadWords(alphaByte, 0, int(weight));
-  uint8_t* const dsts[] = {dst};
-  ForRun<1, 4>(
-      dsts, 4 * n,
-      [=](uint8_t* const* out, const uint8_t* inA, const uint8_t* inB) {
-        const WordsPair first = Widen(LoadBytes(inA));
-        const WordsPair second = Widen(LoadBytes(inB));
-        StoreBytes(out[0], Narrow(Blend(first.low, second.low, weights),
-                                  Blend(first.high, second.high, weights)));
-      },
-      Units{a, 1}, Units{b, 1});
 }
 
 // The bytes that a plan reads.
@@ -203,39 +188,47 @@ inline Extent ExtentOf(const int32_t* offsets, int n, int stride) {
 // (A stride that compilers know to be 1 lets them take several at once.)
 inline Extent ExtentOf(const PairPlan& plan) {
   const int32_t* const offsets = plan.first;
+  const int units = plan.n / plan.unit;
   const Extent a =
-      plan.stride == 1 ? ExtentOf(offsets, plan.n, 1) : ExtentOf(offsets, plan.n, plan.stride);
+      plan.stride == 1 ? ExtentOf(offsets, units, 1) : ExtentOf(offsets, units, plan.stride);
   const Extent b = plan.second == nullptr ? Extent{a.lowest + plan.apart, a.end + plan.apart}
-                   : plan.stride == 1     ? ExtentOf(plan.second, plan.n, 1)
-                                          : ExtentOf(plan.second, plan.n, plan.stride);
-  return {a.lowest < b.lowest ? a.lowest : b.lowest, a.end > b.end ? a.end : b.end};
+                   : plan.stride == 1     ? ExtentOf(plan.second, units, 1)
+                                          : ExtentOf(plan.second, units, plan.stride);
+  return {a.lowest < b.lowest ? a.lowest : b.lowest,
+          (a.end > b.end ? a.end : b.end) + plan.unit - 1};
 }
 
-// Pairs that share a window: where it begins, and where in it their bytes are. No window reaches
-// beyond the bytes that the run reads anyway, [lowest, end). False when there is none.
+// Pairs are taken in groups, from one, two or four windows. A vector takes a group's pairs, or
+// several vectors' lanes take as many groups'.
+constexpr int kGroup = kWindow / 2;
+
+// Pairs that share a window: where it begins, from the lowest byte on, and where in it their bytes
+// are. No window reaches beyond the bytes that the run reads anyway, [lowest, end). False when
+// there is none.
+constexpr uint16_t kNoWindow = 0xFFFF;
 template <int kPairs>
-bool PlanWindow(const int32_t* offsets, const Extent& extent, int32_t* window, uint8_t* at) {
+bool PlanWindow(const int32_t* offsets, const Extent& extent, uint16_t* window, uint8_t* at) {
   int32_t first = offsets[0];
   int32_t last = offsets[0];
   for (int k = 0; k < 2 * kPairs; ++k) {
     first = offsets[k] < first ? offsets[k] : first;
     last = offsets[k] > last ? offsets[k] : last;
   }
-  if (first > extent.end - 16) first = extent.end - 16;
-  const bool fits = first >= extent.lowest && last - first < 16;
-  *window = fits ? first : -1;
+  if (first > extent.end - kWindow) first = extent.end - kWindow;
+  const int32_t start = first - extent.lowest;
+  const bool fits = start >= 0 && start < kNoWindow && last - first < kWindow;
+  *window = fits ? uint16_t(start) : kNoWindow;
   for (int k = 0; k < 2 * kPairs; ++k) at[k] = uint8_t(fits ? offsets[k] - first : 0);
   return fits;
 }
 
-// A plan's pairs in blocks of kPairs: first the windows of each eight of them (with room for two),
-// then two bytes for each pair. The last block reaches back over pairs of the one before it; one
-// that is the only one and not full repeats its last pair.
-inline int32_t WindowAt(const uint8_t* block, int i) {
-  int32_t window;
-  memcpy(&window, block + 4 * i, 4);
-  return window;
-}
+// A plan's pairs in blocks of kPairs: first the windows of each group (with room for four), then
+// two bytes for each pair. The last block reaches back over pairs of the one before it; one that is
+// the only one and not full repeats its last pair.
+constexpr int kWindowBytes = kPairs / kGroup * 4 * int(sizeof(uint16_t));
+constexpr int kBlockBytes = PairPlan::kPreparedBytes * kPairs;
+static_assert(kWindowBytes + 2 * kPairs <= kBlockBytes, "what is prepared has room");
+
 inline int BlocksOf(const PairPlan& plan) {
   return (plan.n + kPairs - 1) / kPairs;
 }
@@ -245,105 +238,133 @@ inline int FirstPairOf(const PairPlan& plan, int block) {
   return first < latest ? first : latest;
 }
 
-// Plans of fewer pairs than a block has: the set that makes a plan is the one that uses it, because
-// nothing but its length decides. Even a block that is not full costs less than single pairs.
+// Plans of fewer pairs than a block has, or fewer bytes than a window. Even a block that is not
+// full costs less than single pairs.
 inline bool IsForNarrower(const PairPlan& plan) {
-  return !kIsNarrowest && plan.n < kPairs;
+  return !kIsNarrowest && (plan.n < kPairs || plan.extent < kWindow);
 }
 
 // Weights are unsigned. A blend whose weight is 0.5 or more begins with the second byte: its pair
 // is planned the other way around, and the rest of the weight counts. For all, what is kept is the
 // negative of the weight, down to -0.5, by which the first byte less the second is multiplied.
-inline bool BeginsWithSecond(const PairPlan& plan, int pair) {
-  return plan.weights != nullptr && plan.weights[pair] >= 32768;
+inline bool BeginsWithSecond(uint16_t weight) {
+  return weight >= 32768;
 }
 inline uint16_t NegativeWeight(uint16_t weight) {
-  return weight >= 32768 ? weight : uint16_t(-weight);
+  return BeginsWithSecond(weight) ? weight : uint16_t(-weight);
 }
 
 // Offsets of eight pairs from one on, in turn. Beyond the last pair that one again.
-inline void OffsetsOfEight(const PairPlan& plan, int first, int32_t (&offsets)[16]) {
+inline void OffsetsOfEight(const PairPlan& plan, int first, int32_t* offsets) {
   const bool isWhole = first + 8 <= plan.n;
+  const bool areBytes = isWhole && plan.unit == 1;
   const int32_t* const from = plan.first + ptrdiff_t{first} * plan.stride;
-  if (isWhole && plan.stride == 2 && plan.second == plan.first + 1 && plan.weights == nullptr) {
-    memcpy(offsets, from, sizeof(offsets));
-  } else if (isWhole && plan.stride == 1 && plan.second == nullptr && plan.weights == nullptr) {
+  if (areBytes && plan.stride == 2 && plan.second == plan.first + 1 && plan.weights == nullptr) {
+    memcpy(offsets, from, 16 * sizeof(*offsets));
+  } else if (areBytes && plan.stride == 1 && plan.second == nullptr && plan.weights == nullptr) {
     for (int k = 0; k < 8; ++k) {
       offsets[2 * k] = from[k];
       offsets[2 * k + 1] = from[k] + plan.apart;
     }
-  } else if (isWhole && plan.stride == 1 && plan.second != nullptr && plan.weights != nullptr) {
+  } else if (areBytes && plan.stride == 1 && plan.second != nullptr && plan.weights != nullptr) {
     const int32_t* const other = plan.second + first;
     for (int k = 0; k < 8; ++k) {
-      const bool swap = BeginsWithSecond(plan, first + k);
+      const bool swap = BeginsWithSecond(plan.weights[first + k]);
       offsets[2 * k] = swap ? other[k] : from[k];
       offsets[2 * k + 1] = swap ? from[k] : other[k];
     }
   } else {
+    const PairPlan::Lists lists(plan);
     for (int k = 0; k < 8; ++k) {
       const int pair = first + k < plan.n ? first + k : plan.n - 1;
-      const bool swap = BeginsWithSecond(plan, pair);
-      offsets[2 * k] = swap ? plan.Second(pair) : plan.First(pair);
-      offsets[2 * k + 1] = swap ? plan.First(pair) : plan.Second(pair);
+      const int unit = pair / plan.unit;
+      const int byte = pair % plan.unit;
+      const int32_t a = lists.First(unit) + byte;
+      const int32_t b = byte == plan.keptByte ? a : lists.Second(unit) + byte;
+      const bool swap = plan.weights != nullptr && BeginsWithSecond(plan.weights[unit]);
+      offsets[2 * k] = swap ? b : a;
+      offsets[2 * k + 1] = swap ? a : b;
     }
   }
 }
 
-// Whether all pairs have windows. One for each eight pairs is given up with the first that has
-// none.
+// Whether all pairs have windows. Fewer than four for each group are given up with the first that
+// has none.
 template <int kWindows>
 bool PlanWindows(PairPlan* plan, const Extent& extent) {
+  constexpr int kShared = kGroup / kWindows;
   plan->windows = kWindows;
   plan->hasWindows = true;
-  for (int i = 0; i < BlocksOf(*plan) * kPairs; i += 8) {
-    int32_t offsets[16];
-    const int eight = i % kPairs / 8;
-    OffsetsOfEight(*plan, FirstPairOf(*plan, i / kPairs) + 8 * eight, offsets);
-    uint8_t* const block = plan->prepared + 3 * (i - i % kPairs);
-    uint8_t at[16];
-    constexpr int kShared = 8 / kWindows;
+  for (int i = 0; i < BlocksOf(*plan) * kPairs; i += kGroup) {
+    const int group = i % kPairs / kGroup;
+    int32_t offsets[2 * kGroup];
+    for (int k = 0; k < kGroup; k += 8) {
+      OffsetsOfEight(*plan, FirstPairOf(*plan, i / kPairs) + kGroup * group + k, offsets + 2 * k);
+    }
+    uint8_t* const block = plan->prepared + kBlockBytes * (i / kPairs);
+    uint8_t at[2 * kGroup];
     for (int w = 0; w < kWindows; ++w) {
-      int32_t window;
+      uint16_t window;
       const bool fits =
           PlanWindow<kShared>(offsets + 2 * kShared * w, extent, &window, at + 2 * kShared * w);
-      memcpy(block + 4 * (eight * kWindows + w), &window, 4);
+      memcpy(block + sizeof(window) * size_t(group * kWindows + w), &window, sizeof(window));
       if (!fits) plan->hasWindows = false;
     }
-    if (kWindows == 1 && !plan->hasWindows) return false;
-    SetShuffle<kShared>(block + kPairs + 16 * eight, at);
+    if (kWindows < 4 && !plan->hasWindows) return false;
+    SetShuffle<kShared>(block + kWindowBytes + 2 * kGroup * group, at);
   }
   return plan->hasWindows;
 }
 
 void PlanPairs(PairPlan* plan) {
-  if (IsForNarrower(*plan)) return kNarrower.planPairs(plan);
+  if (plan->n == 0) return;
   const Extent extent = ExtentOf(*plan);
-  if (!PlanWindows<1>(plan, extent)) PlanWindows<2>(plan, extent);
+  plan->lowest = extent.lowest;
+  plan->extent = extent.end - extent.lowest;
+  if (IsForNarrower(*plan)) return kNarrower.planPairs(plan);
+  if (!PlanWindows<1>(plan, extent) && !PlanWindows<2>(plan, extent)) {
+    PlanWindows<4>(plan, extent);
+  }
   if (plan->weights == nullptr) return;
   for (int block = 0; block < BlocksOf(*plan); ++block) {
     const int first = FirstPairOf(*plan, block);
     const int n = plan->n - first < kPairs ? plan->n - first : kPairs;
     uint16_t* const blends = plan->blends + kPairs * block;
-    for (int i = 0; i < n; ++i) blends[i] = NegativeWeight(plan->weights[first + i]);
+    for (int i = 0; i < n; ++i) {
+      blends[i] = NegativeWeight(plan->weights[(first + i) / plan->unit]);
+    }
     for (int i = n; i < kPairs; ++i) blends[i] = 0;
   }
 }
 
-// Whether the pairs of a block have windows, two for each eight.
+// Whether the pairs of a block have windows, four for each group.
 bool HasWindows(const uint8_t* block) {
-  int32_t windows = 0;
-  for (int k = 0; k < kPairs / 4; ++k) windows |= WindowAt(block, k);
-  return windows >= 0;
+  uint16_t windows[kPairs / kGroup * 4];
+  memcpy(windows, block, sizeof(windows));
+  bool all = true;
+  for (const uint16_t window : windows) all = all && window != kNoWindow;
+  return all;
 }
 
+// Calls store(dst, pairs, block) for `count` blocks from one on.
+template <int kWindows, typename Store>
+inline void StoreBlocksOf(uint8_t* out, int step, const uint8_t* src, const uint8_t* prepared,
+                          int block, int count, const Store& store) {
+  for (; count > 0; --count, ++block, prepared += kBlockBytes, out += step) {
+    store(out, GatherPairs<kWindows>(src, prepared, prepared + kWindowBytes), block);
+  }
+}
 template <typename Store>
-inline void StoreBlock(uint8_t* out, const uint8_t* src, const PairPlan& plan, int block,
-                       const Store& store) {
-  const uint8_t* const prepared = plan.prepared + 3 * kPairs * block;
+KESTREL_INLINE void StoreBlocks(uint8_t* out, int step, const uint8_t* src, const PairPlan& plan,
+                                int block, int count, const Store& store) {
+  const uint8_t* const prepared = plan.prepared + kBlockBytes * block;
+  src += plan.lowest;
   if (plan.windows == 1) {
-    store(out, GatherPairs<1>(src, prepared), block);
+    StoreBlocksOf<1>(out, step, src, prepared, block, count, store);
+  } else if (plan.windows == 2) {
+    StoreBlocksOf<2>(out, step, src, prepared, block, count, store);
   } else {
-    store(out, GatherPairs<2>(src, prepared), block);
+    StoreBlocksOf<4>(out, step, src, prepared, block, count, store);
   }
 }
 
@@ -353,8 +374,8 @@ __attribute__((noinline)) void ForSomePairs(uint8_t* dst, const uint8_t* src, co
                                             const Store& store, const Other& other) {
   const int whole = plan.n / kPairs;
   for (int block = 0; block < whole; ++block) {
-    if (HasWindows(plan.prepared + 3 * kPairs * block)) {
-      StoreBlock(dst + block * kPairs * kDstUnit, src, plan, block, store);
+    if (HasWindows(plan.prepared + kBlockBytes * block)) {
+      StoreBlocks(dst + block * kPairs * kDstUnit, 0, src, plan, block, 1, store);
     } else {
       other(block * kPairs, (block + 1) * kPairs);
     }
@@ -370,24 +391,11 @@ inline void ForPairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan, con
   if (!plan.hasWindows) return ForSomePairs<kDstUnit>(dst, src, plan, store, other);
   const int n = plan.n;
   const int whole = n / kPairs;
-  const uint8_t* prepared = plan.prepared;
-  uint8_t* out = dst;
-  if (plan.windows == 1) {
-    for (int block = 0; block < whole; ++block, prepared += 3 * kPairs, out += kPairs * kDstUnit) {
-      store(out, GatherPairs<1>(src, prepared), block);
-    }
-  } else {
-    for (int block = 0; block < whole; ++block, prepared += 3 * kPairs, out += kPairs * kDstUnit) {
-      store(out, GatherPairs<2>(src, prepared), block);
-    }
-  }
+  StoreBlocks(dst, kPairs * kDstUnit, src, plan, 0, whole, store);
   if (whole * kPairs == n) return;
-  if (whole > 0) {
-    return StoreBlock(dst + (n - kPairs) * kDstUnit, src, plan, whole, store);
-  }
   uint8_t rest[kPairs * kDstUnit];
-  StoreBlock(rest, src, plan, 0, store);
-  memcpy(dst, rest, size_t(n) * kDstUnit);
+  StoreBlocks(whole > 0 ? dst + (n - kPairs) * kDstUnit : rest, 0, src, plan, whole, 1, store);
+  if (whole == 0) memcpy(dst, rest, size_t(n) * kDstUnit);
 }
 
 void ReadPairs(uint8_t* dst, const uint8_t* src, const PairPlan& plan) {
@@ -1454,7 +1462,6 @@ constexpr RowOps VectorRows(const char* name) noexcept {
           BlendPairs,
           ForLong<&RowOps::blendColumns, BlendColumns>::Run,
           ForLong<&RowOps::blendRows, BlendRows>::Run,
-          BlendPixels,
           ForLong<&RowOps::blendPixelRows, BlendPixelRows, kQuads>::Run,
           TableUnpackRgb,
           ForLong<&RowOps::unpackAlpha, UnpackAlpha>::Run,

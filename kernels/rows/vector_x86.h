@@ -64,14 +64,12 @@ inline Bytes AddShare(Bytes base, Bytes a, Bytes b, Words weight) {
 inline Bytes Seconds(Bytes a, Bytes b) {
   return InOrder(Narrow(ShiftRightUnsigned<8>(Words{a.v}), ShiftRightUnsigned<8>(Words{b.v})));
 }
-// A block of a plan.
+// A block of a plan: of its windows and its shuffle.
 template <int kWindows>
-inline Pairs GatherPairs(const uint8_t* src, const uint8_t* block) {
-  constexpr int kHalf = kPairs / 16 * kWindows;
-  int32_t window[2 * kHalf];
-  __builtin_memcpy(window, block, sizeof(window));
-  return {{GatherWords<kWindows>(src, window, block + kPairs),
-           GatherWords<kWindows>(src, window + kHalf, block + kPairs + kBytes)}};
+inline Pairs GatherPairs(const uint8_t* src, const uint8_t* windows, const uint8_t* shuffle) {
+  constexpr int kHalf = kPairs / kWindow * kWindows;
+  return {{GatherWords<kWindows>(src, windows, 0, shuffle),
+           GatherWords<kWindows>(src, windows, kHalf, shuffle + kBytes)}};
 }
 inline void StoreBlended(uint8_t* p, const Pairs& pairs, const uint16_t* negativeWeights) {
   StoreBytes(p, InOrder(Narrow(Blended(pairs.words[0], negativeWeights),

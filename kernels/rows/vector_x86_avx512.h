@@ -232,17 +232,17 @@ inline Bytes InOrder(Bytes narrowed) {
 
 // Half a block of a plan: its windows and its shuffle.
 template <int kWindows>
-inline Words GatherWords(const uint8_t* src, const int32_t* window, const uint8_t* shuffle) {
+inline Words GatherWords(const uint8_t* src, const uint8_t* windows, int first,
+                         const uint8_t* shuffle) {
+  const auto window = [=](int i) { return src + WindowAt(windows, first + i); };
   const Register order = Load(shuffle);
-  const auto bytes = [&](int half) {
-    return Join(Load16(src + window[half]), Load16(src + window[kWindows + half]),
-                Load16(src + window[2 * kWindows + half]),
-                Load16(src + window[3 * kWindows + half]));
-  };
-  const Register first = _mm512_shuffle_epi8(bytes(0), order);
-  if constexpr (kWindows == 1) return {first};
-  constexpr uint64_t kUpperHalves = 0xFF00FF00FF00FF00;
-  return {_mm512_mask_shuffle_epi8(first, kUpperHalves, bytes(1), order)};
+  Register pairs = _mm512_permutexvar_epi8(order, Load(window(0)));
+  constexpr int kShared = kBytes / kWindows;
+  for (int i = 1; i < kWindows; ++i) {
+    const __mmask64 others = ~uint64_t{0} << (kShared * i);
+    pairs = _mm512_mask_permutexvar_epi8(pairs, others, order, Load(window(i)));
+  }
+  return {pairs};
 }
 
 // ---- Pixels of four bytes
@@ -284,23 +284,6 @@ KESTREL_INLINE Bytes GatherQuads(const uint8_t* src, const int32_t* offsets, int
   const Register high = _mm512_mask_blend_epi32(0xAAAA, every4[2], every4[3]);
   return {_mm512_mask_blend_epi32(0xCCCC, low, high)};
 }
-// Byte i of a vector's pixels in words is of pixel i / 8 of each lane's half: its weight's place.
-template <int kHalf>
-constexpr Order WeightsOfQuads() {
-  Order order = {};
-  for (int i = 0; i < kBytes; ++i) {
-    order.of[i] = uint8_t(2 * (4 * (i / 16) + 2 * kHalf + i % 16 / 8) + i % 2);
-  }
-  return order;
-}
-constexpr Order kWeightsOfLow = WeightsOfQuads<0>();
-constexpr Order kWeightsOfHigh = WeightsOfQuads<1>();
-// Each of a vector's pixels' weights for all its bytes.
-inline WordsPair SpreadToQuads(const uint16_t* weights) {
-  const __m256i w = Load32(weights);
-  return {{Reorder(w, kWeightsOfLow)}, {Reorder(w, kWeightsOfHigh)}};
-}
-
 }  // namespace
 }  // namespace kestrel
 

@@ -197,18 +197,26 @@ inline Bytes InOrder(Bytes narrowed) {
 
 // Half a block of a plan: its windows and its shuffle.
 template <int kWindows>
-inline Words GatherWords(const uint8_t* src, const int32_t* window, const uint8_t* shuffle) {
+inline Words GatherWords(const uint8_t* src, const uint8_t* windows, int first,
+                         const uint8_t* shuffle) {
+  const auto window = [=](int i) { return src + WindowAt(windows, first + i); };
   const Register order = Load(shuffle);
   const auto gather = [&](int half) {
 #ifdef __AVX2__
-    const Register bytes = Join(Load16(src + window[half]), Load16(src + window[kWindows + half]));
+    const Register bytes = Join(Load16(window(half)), Load16(window(kWindows + half)));
 #else
-    const Register bytes = Load16(src + window[half]);
+    const Register bytes = Load16(window(half));
 #endif
     return KESTREL_SIMD(shuffle_epi8)(bytes, order);
   };
-  if constexpr (kWindows == 1) return {gather(0)};
-  return {KESTREL_SIMD(blend_epi16)(gather(0), gather(1), 0xF0)};
+  if constexpr (kWindows == 1) {
+    return {gather(0)};
+  } else if constexpr (kWindows == 2) {
+    return {KESTREL_SIMD(blend_epi16)(gather(0), gather(1), 0xF0)};
+  } else {
+    return {KESTREL_SIMD(blend_epi16)(KESTREL_SIMD(blend_epi16)(gather(0), gather(1), 0x0C),
+                                      KESTREL_SIMD(blend_epi16)(gather(2), gather(3), 0xC0), 0xF0)};
+  }
 }
 
 // ---- Pixels of four bytes
@@ -260,19 +268,6 @@ KESTREL_INLINE Bytes GatherQuads(const uint8_t* src, const int32_t* offsets, int
   return {GatherFourQuads(src, offsets)};
 #endif
 }
-// Each of a vector's pixels' weights for all its bytes.
-inline WordsPair SpreadToQuads(const uint16_t* weights) {
-  const __m128i low = _mm_setr_epi8(0, 1, 0, 1, 0, 1, 0, 1, 2, 3, 2, 3, 2, 3, 2, 3);
-  const __m128i high = _mm_setr_epi8(4, 5, 4, 5, 4, 5, 4, 5, 6, 7, 6, 7, 6, 7, 6, 7);
-#ifdef __AVX2__
-  const Register w = Join(Load8(weights), Load8(weights + 4));
-#else
-  const Register w = Load8(weights);
-#endif
-  return {{KESTREL_SIMD(shuffle_epi8)(w, Broadcast(low))},
-          {KESTREL_SIMD(shuffle_epi8)(w, Broadcast(high))}};
-}
-
 }  // namespace
 }  // namespace kestrel
 

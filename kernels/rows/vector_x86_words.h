@@ -157,6 +157,14 @@ inline Bytes operator-(Bytes a, Bytes b) {
 inline Bytes operator&(Bytes a, Bytes b) {
   return {KESTREL_SIMD_WHOLE(and)(a.v, b.v)};
 }
+// Bits of a where `selected` has ones, else of b.
+inline Bytes SelectBits(Bytes selected, Bytes a, Bytes b) {
+#ifdef __AVX512VBMI__
+  return {_mm512_ternarylogic_epi32(selected.v, a.v, b.v, 0xCA)};
+#else
+  return {KESTREL_SIMD(blendv_epi8)(b.v, a.v, selected.v)};
+#endif
+}
 inline Bytes AddSaturated(Bytes a, Bytes b) {
   return {KESTREL_SIMD(adds_epu8)(a.v, b.v)};
 }
@@ -260,9 +268,22 @@ inline void StorePairs(uint8_t* p, const Pairs& pairs) {
   StoreWords(p, pairs.words[0]);
   StoreWords(p + kBytes, pairs.words[1]);
 }
+// Bytes that windows have, by which pairs are taken from them. Of kShared pairs of a window two
+// bytes for each say where in it they are.
+#ifdef __AVX512VBMI__
+constexpr int kWindow = 64;
+#else
+constexpr int kWindow = 16;
+#endif
 template <int kShared>
-inline void SetShuffle(uint8_t* shuffle, const uint8_t (&at)[16]) {
-  Store16(shuffle, Load16(at));
+inline void SetShuffle(uint8_t* shuffle, const uint8_t (&at)[kWindow]) {
+  __builtin_memcpy(shuffle, at, kWindow);
+}
+// Where window i begins. (One by one: compilers take longer to pick them out of a register.)
+inline ptrdiff_t WindowAt(const uint8_t* windows, int i) {
+  uint16_t window;
+  __builtin_memcpy(&window, windows + sizeof(window) * size_t(i), sizeof(window));
+  return window;
 }
 inline Words Blended(Words pairs, const uint16_t* negativeWeights) {
   const Register lessSecond = KESTREL_SIMD(set1_epi16)(int16_t(0xFF01));
@@ -315,11 +336,9 @@ KESTREL_INLINE Quads Interleave4(Bytes a, Bytes b, Bytes c, Bytes d) {
   return {{KESTREL_SIMD(unpacklo_epi16)(ab0, cd0), KESTREL_SIMD(unpackhi_epi16)(ab0, cd0),
            KESTREL_SIMD(unpacklo_epi16)(ab1, cd1), KESTREL_SIMD(unpackhi_epi16)(ab1, cd1)}};
 }
-// Words for the bytes of pixels: `one` for byte `byte`, `others` for the rest.
-inline Words QuadWords(int byte, int one, int others) {
-  alignas(16) int16_t words[8];
-  for (int i = 0; i < 8; ++i) words[i] = int16_t(i % 4 == byte ? one : others);
-  return {Broadcast(Load16(words))};
+// All bits of one byte of each pixel.
+inline Bytes QuadBytes(int byte) {
+  return {KESTREL_SIMD(set1_epi32)(int32_t(0xFFu << (8 * byte)))};
 }
 
 }  // namespace

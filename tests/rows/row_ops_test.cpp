@@ -290,7 +290,7 @@ void GatherPixels(Trial* trial, const RowOps& ops, int n, int variant) {
 struct Pairs {
   Pairs(Trial* trial, int n, int variant) {
     plan.n = n == kLongest ? kLongestPlan : n;
-    const int32_t size = trial->random().Between(1, 2 * plan.n + 1);
+    const int32_t size = trial->random().Between(1, 6 * plan.n + 1);
     src = trial->Source(size_t(size));
     std::vector<int32_t> first = DrawOffsets(trial, plan.n, variant % 3, size);
     std::vector<int32_t> second = DrawOffsets(trial, plan.n, variant % 3, size);
@@ -298,8 +298,7 @@ struct Pairs {
       std::transform(first.begin(), first.end(), second.begin(),
                      [size](int32_t offset) { return std::min(offset + 1, size - 1); });
     }
-    prepared.resize(size_t(3) * WholeBlocks(plan.n));
-    plan.prepared = prepared.data();
+    Prepare();
     if (variant < 3 && trial->random().Percent(30)) {
       plan.stride = 1;
       const int32_t most = std::min(2, size - 1);
@@ -322,8 +321,13 @@ struct Pairs {
       plan.second = plan.first + 1;
     }
   }
-  static size_t WholeBlocks(int n) {
-    return size_t((n + PairPlan::kBlock - 1) / PairPlan::kBlock * PairPlan::kBlock);
+  // Exactly as much memory as a plan asks for.
+  void Prepare() {
+    const size_t blocks = size_t(plan.n + PairPlan::kBlock - 1) / PairPlan::kBlock;
+    prepared.resize(PairPlan::kPreparedBytes * blocks * PairPlan::kBlock);
+    blends.resize(blocks * PairPlan::kBlock);
+    plan.prepared = prepared.data();
+    plan.blends = blends.data();
   }
   uint8_t First(ptrdiff_t i) const { return src[plan.first[i * plan.stride]]; }
   uint8_t Second(ptrdiff_t i) const {
@@ -333,7 +337,11 @@ struct Pairs {
 
   PairPlan plan{};
   std::vector<uint8_t> prepared;
-  const uint8_t* src;
+  std::vector<uint16_t> blends;
+  const uint8_t* src = nullptr;
+
+ protected:
+  Pairs() = default;
 };
 
 void ReadPairs(Trial* trial, const RowOps& ops, int n, int variant) {
@@ -364,8 +372,6 @@ void BlendPairs(Trial* trial, const RowOps& ops, int n, int variant) {
   std::vector<uint16_t> drawn(size_t(pairs.plan.n), 0);
   std::generate(drawn.begin(), drawn.end(), [trial] { return uint16_t(DrawWeight(trial)); });
   pairs.plan.weights = trial->Source(drawn);
-  std::vector<uint16_t> blends(Pairs::WholeBlocks(pairs.plan.n));
-  pairs.plan.blends = blends.data();
   const auto dst = trial->Written(size_t(pairs.plan.n));
   for (ptrdiff_t i = 0; i < pairs.plan.n; ++i) {
     dst.expected[i] = Blended(pairs.First(i), pairs.Second(i), pairs.plan.weights[i]);
@@ -407,25 +413,46 @@ void BlendRows(Trial* trial, const RowOps& ops, int n, int variant) {
       });
 }
 
-// Variants 0..3: the byte that keeps the first pixel's value; 4: none. Offsets are of bytes.
-void BlendPixels(Trial* trial, const RowOps& ops, int n, int variant) {
-  const int alphaByte = variant % 5 == 4 ? -1 : variant % 5;
-  const int32_t starts = trial->random().Between(1, 8 * n + 1);
-  const uint8_t* const src = trial->Source(size_t(starts + 3));
-  const int32_t* const first = trial->Source(DrawOffsets(trial, n, variant / 5, starts));
-  const int32_t* const second = trial->Source(DrawOffsets(trial, n, variant / 5, starts));
-  std::vector<uint16_t> drawn(size_t(n), 0);
-  std::generate(drawn.begin(), drawn.end(), [trial] { return uint16_t(DrawWeight(trial)); });
-  const uint16_t* const weights = trial->Source(drawn);
-  const auto dst = trial->Written(size_t(4) * size_t(n));
-  for (ptrdiff_t i = 0; i < n; ++i) {
-    for (ptrdiff_t k = 0; k < 4; ++k) {
-      const uint8_t kept = src[first[i] + k];
-      dst.expected[4 * i + k] =
-          k == alphaByte ? kept : Blended(kept, src[second[i] + k], weights[i]);
+// Pixels of three bytes, or of four of which one may be kept. Most often neighbours at a steady
+// pace, with pixels of the same picture; else anywhere, from any byte on.
+struct PixelPairs : Pairs {
+  PixelPairs(Trial* trial, int n, int variant) {
+    plan.unit = variant % 6 == 5 ? 3 : 4;
+    plan.keptByte = variant % 6 < 4 ? variant % 6 : -1;
+    const int pixels = n == kLongest ? kLongestPlan / 4 : n;
+    plan.n = pixels * plan.unit;
+    const bool areNeighbours = variant >= 6;
+    const int32_t size = trial->random().Between(1, 8 * pixels + 1);
+    const int32_t starts = areNeighbours ? size : size * 4;
+    std::vector<int32_t> first = DrawOffsets(trial, pixels, variant / 6 % 3, starts);
+    std::vector<int32_t> second = DrawOffsets(trial, pixels, variant / 6 % 3, starts);
+    for (size_t i = 0; areNeighbours && i < first.size(); ++i) {
+      second[i] = std::min(first[i] + 1, size - 1) * plan.unit;
+      first[i] *= plan.unit;
     }
+    src = trial->Source(size_t(areNeighbours ? size * plan.unit : starts + plan.unit - 1));
+    plan.first = trial->Source(first);
+    plan.second = trial->Source(second);
+    Prepare();
   }
-  ops.blendPixels(dst.got, src, {first, second, weights}, alphaByte, n);
+};
+
+void BlendPixelPairs(Trial* trial, const RowOps& ops, int n, int variant) {
+  PixelPairs pairs(trial, n, variant);
+  PairPlan& plan = pairs.plan;
+  std::vector<uint16_t> drawn(size_t(plan.n / plan.unit), 0);
+  std::generate(drawn.begin(), drawn.end(), [trial] { return uint16_t(DrawWeight(trial)); });
+  plan.weights = trial->Source(drawn);
+  const auto dst = trial->Written(size_t(plan.n));
+  for (ptrdiff_t i = 0; i < plan.n; ++i) {
+    const ptrdiff_t pixel = i / plan.unit;
+    const ptrdiff_t byte = i % plan.unit;
+    const uint8_t kept = pairs.src[plan.first[pixel] + byte];
+    const uint8_t other = pairs.src[plan.second[pixel] + byte];
+    dst.expected[i] = byte == plan.keptByte ? kept : Blended(kept, other, plan.weights[pixel]);
+  }
+  ops.planPairs(&plan);
+  ops.blendPairs(dst.got, pairs.src, plan);
 }
 
 void BlendPixelRows(Trial* trial, const RowOps& ops, int n, int variant) {
@@ -859,7 +886,7 @@ constexpr Operation kOperations[] = {
     {"BlendPairs", 6, BlendPairs},
     {"BlendColumns", 3, BlendColumns},
     {"BlendRows", 3, BlendRows},
-    {"BlendPixels", 15, BlendPixels},
+    {"BlendPixelPairs", 24, BlendPixelPairs},
     {"BlendPixelRows", 5, BlendPixelRows},
     {"UnpackRgb", kPixelFormatCount, UnpackRgb},
     {"UnpackAlpha", kPixelFormatCount - kFirstWithAlpha, UnpackAlpha},
@@ -883,9 +910,9 @@ constexpr Operation kOperations[] = {
     {"WritePixels", 24, WritePixels},
 };
 
-// A new operation is a new pointer in the table, and needs its line above. Planning has none, and
-// there is the name.
-static_assert(sizeof(RowOps) == (std::size(kOperations) + 2) * sizeof(void (*)()),
+// A new operation is a new pointer in the table, and needs its line above. Planning has none, one
+// has two, and there is the name.
+static_assert(sizeof(RowOps) == (std::size(kOperations) + 1) * sizeof(void (*)()),
               "every operation has its test");
 
 // ---- Trials -------------------------------------------------------------------------------------
