@@ -109,6 +109,9 @@ inline Bytes operator-(Bytes a, Bytes b) {
 inline Bytes operator&(Bytes a, Bytes b) {
   return {vandq_u8(a.v, b.v)};
 }
+inline Bytes operator|(Bytes a, Bytes b) {
+  return {vorrq_u8(a.v, b.v)};
+}
 // Bits of a where `selected` has ones, else of b.
 inline Bytes SelectBits(Bytes selected, Bytes a, Bytes b) {
   return {vbslq_u8(selected.v, a.v, b.v)};
@@ -117,6 +120,9 @@ inline Bytes AddSaturated(Bytes a, Bytes b) {
   return {vqaddq_u8(a.v, b.v)};
 }
 // By no more than 8.
+inline Bytes ShiftLeft(Bytes a, uint32_t bits) {
+  return {vshlq_u8(a.v, vdupq_n_s8(int8_t(bits)))};
+}
 inline Bytes ShiftRightUnsigned(Bytes a, uint32_t bits) {
   return {vshlq_u8(a.v, vdupq_n_s8(int8_t(-int(bits))))};
 }

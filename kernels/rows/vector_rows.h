@@ -497,12 +497,159 @@ inline uint8_t AlphaOf(AlphaFill alpha) {
   return uint8_t(alpha.bits >> 24);
 }
 
+// ---- Packed pixels of any layout, by way of planes of their bytes
+struct BytePlanes {
+  static constexpr int kMost = 512;  // pixels
+  explicit BytePlanes(int bytes) {
+    // A field may lie beyond the bytes of a pixel.
+    for (int k = bytes; k < 4; ++k) memset(of[k], 0, sizeof(of[k]));
+  }
+  uint8_t of[4][kMost];
+};
+
+// Calls call(x, n) for pieces of a run of n >= kBytes, none of which is shorter than a vector.
+template <typename Call>
+inline void ForPieces(int n, const Call& call) {
+  constexpr int kMost = BytePlanes::kMost;
+  for (int x = 0; x < n;) {
+    const int rest = n - x;
+    const int count = rest <= kMost ? rest : rest < kMost + kBytes ? rest - kBytes : kMost;
+    call(x, count);
+    x += count;
+  }
+}
+
+template <int kPixel>
+void TakeBytesApart(BytePlanes* planes, const uint8_t* src, int n) {
+  uint8_t* const dsts[] = {planes->of[0], planes->of[1], planes->of[2], planes->of[3]};
+  ForRun<1>(
+      dsts, n,
+      [](uint8_t* const* out, const uint8_t* in) {
+        PixelBytes p = {LoadBytes(in), SetBytes(0), SetBytes(0), SetBytes(0)};
+        if constexpr (kPixel == 2) Load2(in, &p.low, &p.middle);
+        if constexpr (kPixel == 3) p = Load3(in);
+        if constexpr (kPixel == 4) p = Load4(in);
+        StoreBytes(out[0], p.low);
+        StoreBytes(out[1], p.middle);
+        StoreBytes(out[2], p.high);
+        StoreBytes(out[3], p.alpha);
+      },
+      Units{src, kPixel});
+}
+template <int kPixel>
+void PutBytesTogether(uint8_t* dst, const BytePlanes& planes, int n) {
+  uint8_t* const dsts[] = {dst};
+  ForRun<kPixel>(
+      dsts, n,
+      [](uint8_t* const* out, const uint8_t* low, const uint8_t* middle, const uint8_t* high,
+         const uint8_t* alpha) {
+        if constexpr (kPixel == 1) StoreBytes(out[0], LoadBytes(low));
+        if constexpr (kPixel == 2) Store2(out[0], LoadBytes(low), LoadBytes(middle));
+        if constexpr (kPixel == 3) {
+          Store3(out[0], LoadBytes(low), LoadBytes(middle), LoadBytes(high));
+        }
+        if constexpr (kPixel == 4) {
+          Store4(out[0], LoadBytes(low), LoadBytes(middle), LoadBytes(high), LoadBytes(alpha));
+        }
+      },
+      Units{planes.of[0], 1}, Units{planes.of[1], 1}, Units{planes.of[2], 1},
+      Units{planes.of[3], 1});
+}
+template <typename Call>
+inline void WithBytes(int bytes, const Call& call) {
+  if (bytes == 4) {
+    call(PixelSize<4>());
+  } else if (bytes == 3) {
+    call(PixelSize<3>());
+  } else if (bytes == 2) {
+    call(PixelSize<2>());
+  } else {
+    call(PixelSize<1>());
+  }
+}
+
+// A field's top eight bits: the lower ones of them in one byte, the upper ones in the next.
+void UnpackField(uint8_t* dst, const BytePlanes& planes, uint32_t position, uint32_t size, int n) {
+  if (size == 0) {
+    memset(dst, 0, size_t(n));
+    return;
+  }
+  const uint32_t last = (position + size - 1) / 8;
+  const uint32_t up = 8 * (last + 1) - position - size;
+  const Bytes kept = SetBytes(size < 8 ? 0xFF << (8 - size) : 0xFF);
+  uint8_t* const dsts[] = {dst};
+  ForRun<1>(
+      dsts, n,
+      [=](uint8_t* const* out, const uint8_t* upper, const uint8_t* lower) {
+        const Bytes level =
+            ShiftLeft(LoadBytes(upper), up) | ShiftRightUnsigned(LoadBytes(lower), 8 - up);
+        StoreBytes(out[0], level & kept);
+      },
+      Units{planes.of[last], 1}, Units{planes.of[last > 0 ? last - 1 : 0], 1});
+}
+void UnpackFields(uint8_t* const rgb[3], const uint8_t* src, const PixelFormat& format, int n) {
+  BytePlanes planes(format.bytes);
+  ForPieces(n, [&](int x, int count) {
+    WithBytes(format.bytes, [&](auto size) {
+      constexpr int kPixel = decltype(size)::value;
+      TakeBytesApart<kPixel>(&planes, src + ptrdiff_t{x} * kPixel, count);
+    });
+    for (int c = 0; c < 3; ++c) {
+      UnpackField(rgb[c] + x, planes, format.position[c], format.size[c], count);
+    }
+  });
+}
+
+// Adds levels to byte k of pixels, shifted right and then left, or left only.
+void AddLevels(BytePlanes* planes, uint32_t k, const uint8_t* levels, uint32_t right, uint32_t left,
+               int n) {
+  if (k >= 4) return;
+  uint8_t* const plane = planes->of[k];
+  uint8_t* const dsts[] = {plane};
+  ForRun<1>(
+      dsts, n,
+      [=](uint8_t* const* out, const uint8_t* in, const uint8_t* inLevels) {
+        const Bytes level = ShiftLeft(ShiftRightUnsigned(LoadBytes(inLevels), right), left);
+        StoreBytes(out[0], LoadBytes(in) | level);
+      },
+      Units{plane, 1}, Units{levels, 1});
+}
+void PackFields(uint8_t* dst, const uint8_t* const rgb[3], const PixelFormat& format,
+                const FieldShifts& shifts, AlphaFill alpha, int n) {
+  BytePlanes planes(4);
+  ForPieces(n, [&](int x, int count) {
+    memset(planes.of, 0, sizeof(planes.of));
+    for (int c = 0; c < 3; ++c) {
+      const int32_t right = shifts.right[c] > 0 ? shifts.right[c] : 0;
+      const uint32_t at = format.position[c] + uint32_t(right - shifts.right[c]);
+      const uint32_t left = at % 8;
+      AddLevels(&planes, at / 8, rgb[c] + x, uint32_t(right), left, count);
+      // What does not fit that byte.
+      if (uint32_t(right) < left) {
+        AddLevels(&planes, at / 8 + 1, rgb[c] + x, uint32_t(right) + 8 - left, 0, count);
+      }
+    }
+    for (int k = 0; k < 4; ++k) {
+      const uint8_t keep = uint8_t(alpha.keep >> (8 * k));
+      const uint8_t bits = uint8_t(alpha.bits >> (8 * k));
+      for (int i = 0; keep != 0xFF && i < count; ++i) {
+        planes.of[k][i] = uint8_t((planes.of[k][i] & keep) | bits);
+      }
+    }
+    WithBytes(format.bytes, [&](auto size) {
+      constexpr int kPixel = decltype(size)::value;
+      PutBytesTogether<kPixel>(dst + ptrdiff_t{x} * kPixel, planes, count);
+    });
+  });
+}
+
 void PackRgb(uint8_t* dst, const uint8_t* const rgb[3], const PixelFormat& format,
              const FieldShifts& shifts, AlphaFill alpha, int n) {
   const PixelShape shape(format);
   const bool narrowed = shape.bytes == 2 && shifts.right[0] == 0;
+  if (format.bytes == 0) return scalar::PackRgb(dst, rgb, format, shifts, alpha, n);
   if (shape.bytes == 0 || (shape.bytes == 2 && !narrowed && shifts.right[0] != 3)) {
-    return scalar::PackRgb(dst, rgb, format, shifts, alpha, n);
+    return PackFields(dst, rgb, format, shifts, alpha, n);
   }
   const Bytes fill = SetBytes(AlphaOf(alpha));
   uint8_t* const dsts[] = {dst};
@@ -537,7 +684,8 @@ void PackRgb(uint8_t* dst, const uint8_t* const rgb[3], const PixelFormat& forma
 
 void UnpackRgb(uint8_t* const rgb[3], const uint8_t* src, const PixelFormat& format, int n) {
   const PixelShape shape(format);
-  if (shape.bytes == 0) return scalar::UnpackRgb(rgb, src, format, n);
+  if (format.bytes == 0) return scalar::UnpackRgb(rgb, src, format, n);
+  if (shape.bytes == 0) return UnpackFields(rgb, src, format, n);
   uint8_t* const dsts[] = {rgb[shape.blueFirst ? 2 : 0], rgb[1], rgb[shape.blueFirst ? 0 : 2]};
   WithPixelSize(shape, [&](auto size) {
     constexpr int kPixel = decltype(size)::value;
@@ -1090,8 +1238,8 @@ void YuvToFields(const PixelRows& rows, const ChromaRows& chroma, const YuvToRgb
       TableYuvToPixels({quads, 0, rows.y + row * rows.yPitch + x, 0, 1}, part, colour, kQuad,
                        {~0u, 0}, count);
       TableUnpackRgb(rgb, quads, kQuad, count);
-      scalar::PackRgb(rows.dst + row * rows.dstPitch + ptrdiff_t{x} * format.bytes, rgb, format,
-                      shifts, alpha, count);
+      TablePackRgb(rows.dst + row * rows.dstPitch + ptrdiff_t{x} * format.bytes, rgb, format,
+                   shifts, alpha, count);
     }
   }
 }
@@ -1259,7 +1407,7 @@ void PixelsToYuv(uint8_t* dst, const uint8_t* src, const PixelFormat& format, Rg
                  int n) {
   const PixelShape shape(format);
   if (shape.bytes == 0) {
-    return ForChannels(scalar::UnpackRgb, src, format, n,
+    return ForChannels(TableUnpackRgb, src, format, n,
                        [=](int x, uint8_t* const rgb[3], int count) {
                          TableRgbToYuv(dst + x, rgb, tables, count);
                        });
@@ -1316,7 +1464,7 @@ void PixelPairsToChroma(uint8_t* u, uint8_t* v, int step, const uint8_t* src,
   const Weights weightsOfU(tables + 3, shape.blueFirst);
   const Weights weightsOfV(tables + 5, shape.blueFirst);
   if (shape.bytes == 0) {
-    return ChromaOfFields(scalar::UnpackRgb, TableRgbToYuv, u, v, step, src, format, tables, n);
+    return ChromaOfFields(TableUnpackRgb, TableRgbToYuv, u, v, step, src, format, tables, n);
   }
   if (!AreOpposite(weightsOfU.signs(), weightsOfV.signs())) {
     return scalar::PixelPairsToChroma(u, v, step, src, format, tables, n);

@@ -157,6 +157,9 @@ inline Bytes operator-(Bytes a, Bytes b) {
 inline Bytes operator&(Bytes a, Bytes b) {
   return {KESTREL_SIMD_WHOLE(and)(a.v, b.v)};
 }
+inline Bytes operator|(Bytes a, Bytes b) {
+  return {KESTREL_SIMD_WHOLE(or)(a.v, b.v)};
+}
 // Bits of a where `selected` has ones, else of b.
 inline Bytes SelectBits(Bytes selected, Bytes a, Bytes b) {
 #ifdef __AVX512VBMI__
@@ -169,6 +172,10 @@ inline Bytes AddSaturated(Bytes a, Bytes b) {
   return {KESTREL_SIMD(adds_epu8)(a.v, b.v)};
 }
 // By no more than 8.
+inline Bytes ShiftLeft(Bytes a, uint32_t bits) {
+  const Bytes shifted = {KESTREL_SIMD(sll_epi16)(a.v, _mm_cvtsi32_si128(int(bits)))};
+  return shifted & SetBytes(0xFF << bits);
+}
 inline Bytes ShiftRightUnsigned(Bytes a, uint32_t bits) {
   const Bytes shifted = {KESTREL_SIMD(srl_epi16)(a.v, _mm_cvtsi32_si128(int(bits)))};
   return shifted & SetBytes(255 >> bits);
