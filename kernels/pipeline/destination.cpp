@@ -316,18 +316,21 @@ void Destination::SelectColumns(int32_t x, int n) {
                   AreGroups(int64_t(x_) - job_.rect.left, n_, firstChroma_, chromaCount_);
 }
 
-// Whether samples of packed 4:2:2 begin in the same group of four bytes and end in the same.
+// Whether samples of packed 4:2:2 or 4:4:4 begin in the same group and end in the same.
 bool Destination::AreGroups(int64_t lumaColumn, int lumaCount, int64_t chromaColumn,
                             int chromaCount) const {
   const PlaneLayout& layout = engine_.dstLayout;
-  const bool packed = layout.isPacked != 0 && layout.step[0] == 2 && planes_[0].columnStep == 2;
-  if (!packed || exchange_ != LumaExchange::kNone || chromaCount <= 0 ||
-      lumaCount != 2 * chromaCount) {
+  if (layout.isPacked == 0 || planes_[0].columnStep != layout.step[0] ||
+      exchange_ != LumaExchange::kNone || chromaCount <= 0) {
     return false;
   }
   const uint8_t* const group = planes_[0].At(lumaColumn, 0) - layout.yOffset;
-  return planes_[1].At(chromaColumn, 0) == group + layout.uOffset &&
-         planes_[2].At(chromaColumn, 0) == group + layout.vOffset && layout.yOffset < 2 &&
+  if (planes_[1].At(chromaColumn, 0) != group + layout.uOffset ||
+      planes_[2].At(chromaColumn, 0) != group + layout.vOffset) {
+    return false;
+  }
+  if (layout.step[0] == 3) return lumaCount == chromaCount;
+  return layout.step[0] == 2 && lumaCount == 2 * chromaCount && layout.yOffset < 2 &&
          (layout.uOffset ^ layout.vOffset) == 2 && ((layout.uOffset ^ layout.yOffset) & 1) == 1;
 }
 
@@ -392,17 +395,28 @@ uint8_t* Destination::StartChromaPairs(int32_t r) {
   return writers_[1].Start(firstChroma_, row, chromaCount_);
 }
 
+void Destination::WriteGroups(int32_t r, const uint8_t* y, const uint8_t* u, const uint8_t* v) {
+  const PlaneLayout& layout = engine_.dstLayout;
+  uint8_t* const group =
+      planes_[0].At(int64_t(x_) - job_.rect.left, int64_t(r) - job_.rect.top) - layout.yOffset;
+  if (layout.step[0] == 3) {
+    // Like pixels of three bytes.
+    const uint8_t* const channels[3] = {y, u, v};
+    const PixelFormat format = {
+        3, {8, 8, 8}, {8 * layout.yOffset, 8 * layout.uOffset, 8 * layout.vOffset}, -1, true};
+    rows_.packRgb(group, channels, format, {}, {~0u, 0}, n_);
+    return;
+  }
+  const bool uFirst = layout.uOffset < layout.vOffset;
+  rows_.interleave(buffer_, uFirst ? u : v, uFirst ? v : u, chromaCount_);
+  const bool lumaFirst = layout.yOffset == 0;
+  rows_.interleave(group, lumaFirst ? y : buffer_, lumaFirst ? buffer_ : y, n_);
+}
+
 void Destination::PutChroma(int32_t r, const uint8_t* u, const uint8_t* v) {
   if (chromaCount_ == 0) return;
   if (writesGroups_) {
-    if (heldLuma_ == nullptr) return;
-    const PlaneLayout& layout = engine_.dstLayout;
-    const bool uFirst = layout.uOffset < layout.vOffset;
-    rows_.interleave(buffer_, uFirst ? u : v, uFirst ? v : u, chromaCount_);
-    uint8_t* const group =
-        planes_[0].At(int64_t(x_) - job_.rect.left, int64_t(r) - job_.rect.top) - layout.yOffset;
-    const bool lumaFirst = layout.yOffset == 0;
-    rows_.interleave(group, lumaFirst ? heldLuma_ : buffer_, lumaFirst ? buffer_ : heldLuma_, n_);
+    if (heldLuma_ != nullptr) WriteGroups(r, heldLuma_, u, v);
     heldLuma_ = nullptr;
     return;
   }

@@ -136,7 +136,7 @@ class Destination {
   const int32_t* uColumns() const { return uColumns_; }
   const int32_t* vColumns() const { return vColumns_; }
   int chromaCount() const { return chromaCount_; }
-  // (Where packed 4:2:2 is written whole, luma is kept until the row's chroma comes.)
+  // (Where groups are written whole, luma is kept until the row's chroma comes.)
   void PutLuma(int32_t r, const uint8_t* luma);
   // Memory for a row of luma, for the strip columns that it says; not where luma is exchanged.
   PixelRun StartLuma(int32_t r) { return StartPixels(r, 1); }
@@ -157,7 +157,8 @@ class Destination {
   };
   PlaneRun LumaRun() const;
   PlaneRun ChromaRun() const;
-  // Where the first group of a row of packed 4:2:2 begins; null unless the runs are whole groups.
+  // Where the first group of a row of packed 4:2:2 or 4:4:4 begins; null unless the runs are whole
+  // groups.
   uint8_t* GroupsAt(const PlaneRun& luma, const PlaneRun& chroma, int32_t r) const;
   bool ContainsLumaRow(int32_t r) const {
     return planes_[0].rows.Contains(int64_t(r) - job_.rect.top);
@@ -169,7 +170,7 @@ class Destination {
   PlaneWriter& writer(int plane) { return writers_[plane]; }
   // Whether runs of every plane lie in memory as they are packed.
   bool AllInPlace() const;
-  // Whether the strip's rows of packed 4:2:2 are written as groups of two pixels.
+  // Whether the strip's rows of packed 4:2:2 or 4:4:4 are written as groups of two pixels or one.
   bool writesGroups() const { return writesGroups_; }
 
   // RGB. Memory for the pixels of some rows; null when they are outside the image. With `copies`
@@ -215,6 +216,7 @@ class Destination {
   bool AreGroups(int64_t lumaColumn, int lumaCount, int64_t chromaColumn, int chromaCount) const;
   void MakeRoom(int writer, int64_t column, int64_t row, int n, int runs = 1);
   void PutChromaPlane(int plane, int32_t r, const uint8_t* samples);
+  void WriteGroups(int32_t r, const uint8_t* y, const uint8_t* u, const uint8_t* v);
 
   const Job& job_;
   const RowOps& rows_;

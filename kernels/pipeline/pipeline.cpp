@@ -251,7 +251,7 @@ class Pipeline {
     if (!chromaDone_ && job_.rect.left >= 0) chromaDone_ = CopyChroma(destination_.ChromaRun());
   }
 
-  // Packed 4:2:2 to the same layout, untransformed: groups of two pixels are copied whole.
+  // Packed 4:2:2 or 4:4:4 to the same layout, untransformed: groups are copied whole.
   bool CopyGroups() {
     const bool unit = engine_.stepX == 0x10000 && engine_.stepY == 0x10000;
     if (!unit || engine_.pathKind != PATH_YUV_TO_YUV || job_.mapsLevels() ||
@@ -262,15 +262,18 @@ class Pipeline {
     const PlaneRun luma = destination_.LumaRun();
     if (luma.n <= 0 || !destination_.hasChroma()) return false;
     const PlaneRun chroma = destination_.ChromaRun();
-    const bool inPhase = chroma.n > 0 && chroma.firstX == luma.firstX + 1 &&
+    // The last pixel of a group decides its chroma.
+    const int32_t pixels = int32_t(engine_.dstSubsample[1]);
+    const bool inPhase = chroma.n > 0 && chroma.firstX == luma.firstX + pixels - 1 &&
                          source_.LumaAdvances(luma.firstX, luma.n) &&
-                         source_.ColumnOf(luma.firstX) % 2 == 0;
+                         source_.ColumnOf(luma.firstX) % pixels == 0;
     if (!inPhase || destination_.GroupsAt(luma, chroma, job_.rect.top) == nullptr) return false;
     for (int32_t r = job_.rect.top; r < job_.rect.bottom; ++r) {
       if (!destination_.ContainsLumaRow(r)) continue;
       const uint8_t* const from =
           source_.LumaAt(luma.firstX, source_.SourceRow(r, 1)) - engine_.srcLayout.yOffset;
-      CopyAscending(destination_.GroupsAt(luma, chroma, r), from, size_t{2} * size_t(luma.n));
+      CopyAscending(destination_.GroupsAt(luma, chroma, r), from,
+                    size_t(engine_.dstLayout.step[0]) * size_t(luma.n));
     }
     return true;
   }

@@ -436,6 +436,23 @@ struct PixelShape {
   bool blueFirst;
 };
 
+// For channels by themselves, which bytes may have in any order: `at` says which one is where.
+struct ChannelShape : PixelShape {
+  explicit ChannelShape(const PixelFormat& format) : PixelShape(format) {
+    if (bytes == 0 && format.bytes == 3 && format.wholeBytes) {
+      int found[3] = {-1, -1, -1};
+      for (int c = 0; c < 3; ++c) found[format.position[c] / 8] = c;
+      if (found[0] < 0 || found[1] < 0 || found[2] < 0) return;
+      bytes = 3;
+      for (int k = 0; k < 3; ++k) at[k] = found[k];
+    } else if (blueFirst) {
+      at[0] = 2;
+      at[2] = 0;
+    }
+  }
+  int at[3] = {0, 1, 2};
+};
+
 // Pixels of 5, 6 and 5 bits from channels whose fields are in the top bits, or in the lowest.
 inline Words Pack565(Words low, Words green, Words high) {
   return ShiftRightUnsigned<3>(low) | ShiftLeft<3>(green & SetWords(0xFC)) |
@@ -645,7 +662,7 @@ void PackFields(uint8_t* dst, const uint8_t* const rgb[3], const PixelFormat& fo
 
 void PackRgb(uint8_t* dst, const uint8_t* const rgb[3], const PixelFormat& format,
              const FieldShifts& shifts, AlphaFill alpha, int n) {
-  const PixelShape shape(format);
+  const ChannelShape shape(format);
   const bool narrowed = shape.bytes == 2 && shifts.right[0] == 0;
   if (format.bytes == 0) return scalar::PackRgb(dst, rgb, format, shifts, alpha, n);
   if (shape.bytes == 0 || (shape.bytes == 2 && !narrowed && shifts.right[0] != 3)) {
@@ -653,9 +670,9 @@ void PackRgb(uint8_t* dst, const uint8_t* const rgb[3], const PixelFormat& forma
   }
   const Bytes fill = SetBytes(AlphaOf(alpha));
   uint8_t* const dsts[] = {dst};
-  const Units low = {rgb[shape.blueFirst ? 2 : 0], 1};
-  const Units middle = {rgb[1], 1};
-  const Units high = {rgb[shape.blueFirst ? 0 : 2], 1};
+  const Units low = {rgb[shape.at[0]], 1};
+  const Units middle = {rgb[shape.at[1]], 1};
+  const Units high = {rgb[shape.at[2]], 1};
   if (narrowed) {
     return ForRun<2>(
         dsts, n,
@@ -683,10 +700,10 @@ void PackRgb(uint8_t* dst, const uint8_t* const rgb[3], const PixelFormat& forma
 }
 
 void UnpackRgb(uint8_t* const rgb[3], const uint8_t* src, const PixelFormat& format, int n) {
-  const PixelShape shape(format);
+  const ChannelShape shape(format);
   if (format.bytes == 0) return scalar::UnpackRgb(rgb, src, format, n);
   if (shape.bytes == 0) return UnpackFields(rgb, src, format, n);
-  uint8_t* const dsts[] = {rgb[shape.blueFirst ? 2 : 0], rgb[1], rgb[shape.blueFirst ? 0 : 2]};
+  uint8_t* const dsts[] = {rgb[shape.at[0]], rgb[shape.at[1]], rgb[shape.at[2]]};
   WithPixelSize(shape, [&](auto size) {
     constexpr int kPixel = decltype(size)::value;
     ForRun<1>(
@@ -1521,6 +1538,10 @@ void ReadStrided(uint8_t* dst, const uint8_t* src, ptrdiff_t step, int n) {
       Bytes first, second;
       Load2(src + 2 * i, &first, &second);
       StoreBytes(dst + i, first);
+    }
+  } else if (step == 3) {
+    for (; i + kBytes < n; i += kBytes) {
+      StoreBytes(dst + i, Load3(src + 3 * i).low);
     }
   } else if (step == 4) {
     for (; i + kBytes < n; i += kBytes) {
