@@ -219,9 +219,9 @@ const Case kCases[] = {
      [](const RowOps& ops, Runs* r) {
        ops.unpackAlpha(r->out[0].data(), r->pixels.data(), kRgba, kPixels);
      }},
-    {"unpackIndexed 8", kPixels,
+    {"gatherIndexed 8", kPixels,
      [](const RowOps& ops, Runs* r) {
-       ops.unpackIndexed(r->outChannels, r->a.data(), r->scaled.data(), 8, r->palette.data(),
+       ops.gatherIndexed(r->out[0].data(), r->a.data(), r->scaled.data(), 8, r->palette.data(),
                          kPixels);
      }},
 

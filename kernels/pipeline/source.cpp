@@ -5,6 +5,9 @@
 namespace kestrel {
 namespace {
 
+// Indexed pixels become entries of their palette, and those are like other pixels.
+constexpr PixelFormat kPaletteEntry = {4, {8, 8, 8}, {16, 8, 0}, -1, true};
+
 bool HasSwappedLuma(uint32_t code) {
   return code >= CODE_YVYU_SWAPPED_LUMA && code <= CODE_VYUY_SWAPPED_LUMA;
 }
@@ -77,9 +80,10 @@ Source::Source(const Job& job)
       rows_(job.rows()),
       columnPositions_(job),
       rowPositions_(job),
-      pixels_(DescribePixels(job.engine.srcFormat, job.engine.srcChannelSize,
-                             job.engine.srcChannelPos)),
       palette_(job.engine.srcFormat.palette),
+      pixels_(palette_ != nullptr ? kPaletteEntry
+                                  : DescribePixels(job.engine.srcFormat, job.engine.srcChannelSize,
+                                                   job.engine.srcChannelPos)),
       swappedLuma_(HasSwappedLuma(job.engine.srcFormat.code)),
       wantsAlpha_(pixels_.alphaByte >= 0 && job.engine.pathKind == PATH_RGB_TO_RGB) {
   const PlaneLayout& layout = job.engine.srcLayout;
@@ -137,18 +141,19 @@ void Source::TakeMemory(StripMemory* memory, int columns) {
     weights_ = memory->Take<uint16_t>(n);
   }
   if (isRgb) {
-    for (Line& line : lines_) takePieces(line.samples, n);
-    packed_ = memory->Take<uint8_t>(n * size_t(palette_ != nullptr ? 1 : pixels_.bytes));
-    if (blends) {
-      takePieces(scratch_, n);
-      takePieces(blended_, n);
+    takePieces(channels_, n);
+    if (blends || !BlendsPixels()) {
+      for (Line& line : lines_) takePieces(line.samples, n);
     }
-    if (pixels_.bytes == 2) {
+    if (blends) takePieces(blended_, n);
+    const int bytes = pixels_.bytes;
+    packed_ = memory->Take<uint8_t>(n * size_t(blends && palette_ != nullptr ? 2 * bytes : bytes));
+    if (bytes == 2) {
       firstPlan_.prepared = takePlan(columns);
       if (blends) chromaPlan_.prepared = takePlan(columns);
     } else if (blends && BlendsPixels()) {
-      firstPlan_.prepared = takePlan(pixels_.bytes * columns);
-      firstPlan_.blends = memory->Take<uint16_t>(blocks(pixels_.bytes * columns));
+      if (palette_ == nullptr) firstPlan_.prepared = takePlan(bytes * columns);
+      firstPlan_.blends = memory->Take<uint16_t>(blocks(bytes * columns));
     }
     return;
   }
@@ -197,10 +202,16 @@ void Source::SelectColumns(int32_t x, int n) {
   if (interpolates_) second_.FinishSamples(n);
   if (job_.engine.srcLayout.code == CODE_RGB) {
     // Pixels are gathered whole; those of two bytes are pairs of them.
+    if (interpolates_ && palette_ != nullptr) {
+      for (int i = 0; i < pixels_.bytes * n; ++i) {
+        firstPlan_.blends[i] = weights_[i / pixels_.bytes];
+      }
+      return;
+    }
     if (interpolates_ && BlendsPixels()) {
       return first_.PlanPixels(second_.offset, weights_, pixels_, rows_);
     }
-    if (pixels_.bytes != 2 || palette_ != nullptr) return;
+    if (pixels_.bytes != 2) return;
     if (!first_.contiguous) first_.PlanApart(1, rows_);
     if (interpolates_ && !second_.contiguous) second_.PlanApart(1, rows_);
     return;
@@ -413,20 +424,20 @@ const uint8_t* Source::ReadSamples(uint8_t* buffer, const uint8_t* row,
   return buffer;
 }
 
-void Source::ReadPixels(uint8_t* const rgb[3], const uint8_t* row, const SampleColumns& columns) {
-  if (palette_ != nullptr) {
-    rows_.unpackIndexed(rgb, row, columns.offset, job_.engine.srcFormat.colourStandard, palette_,
-                        columns.n);
-  } else if (columns.contiguous) {
-    rows_.unpackRgb(rgb, row + columns.offset[0], pixels_, columns.n);
-  } else {
+void Source::ReadChannels(uint8_t* const rgb[3], const uint8_t* row, const SampleColumns& columns) {
+  const uint8_t* pixels = row + columns.offset[0];
+  if (!columns.contiguous) {
     Gather(packed_, row, columns);
-    rows_.unpackRgb(rgb, packed_, pixels_, columns.n);
+    pixels = packed_;
   }
+  rows_.unpackRgb(rgb, pixels, pixels_, columns.n);
 }
 
 void Source::Gather(uint8_t* into, const uint8_t* row, const SampleColumns& columns) const {
-  if (pixels_.bytes == 2) {
+  if (palette_ != nullptr) {
+    rows_.gatherIndexed(into, row, columns.offset, job_.engine.srcFormat.colourStandard, palette_,
+                        columns.n);
+  } else if (pixels_.bytes == 2) {
     rows_.readPairs(into, row, *columns.plan);
   } else {
     rows_.gatherPixels(into, row, columns.offset, pixels_.bytes, columns.n);
@@ -443,25 +454,20 @@ void Source::FillLumaLine(Line* line, int32_t row) {
   }
 }
 
+// Pixels that have fields within bytes.
 void Source::FillRgbLine(Line* line, int32_t row) {
   const uint8_t* start = RowToRead(0, row, first_);
   uint8_t* const rgb[3] = {line->samples[0], line->samples[1], line->samples[2]};
-  ReadPixels(rgb, start, first_);
+  ReadChannels(rgb, start, first_);
   for (int c = 0; c < 3; ++c) line->channel[c] = rgb[c];
-  line->alpha = nullptr;
   if (wantsAlpha_) {
-    // Alpha is never interpolated.
-    const uint8_t* pixels = start + first_.offset[0];
-    if (!first_.contiguous) {
-      Gather(packed_, start, first_);
-      pixels = packed_;
-    }
+    // Alpha is never interpolated. (What is not in place was gathered just now.)
+    const uint8_t* const pixels = first_.contiguous ? start + first_.offset[0] : packed_;
     rows_.unpackAlpha(line->samples[3], pixels, pixels_, first_.n);
-    line->alpha = line->samples[3];
   }
   if (!interpolates_) return;
-  uint8_t* const second[3] = {scratch_[0], scratch_[1], scratch_[2]};
-  ReadPixels(second, start, second_);
+  uint8_t* const second[3] = {channels_[0], channels_[1], channels_[2]};
+  ReadChannels(second, start, second_);
   for (int c = 0; c < 3; ++c) rows_.blendColumns(rgb[c], rgb[c], second[c], weights_, first_.n);
 }
 
@@ -523,9 +529,15 @@ void Source::FillPixelLine(Line* line, int32_t row) {
   const uint8_t* const start = RowToRead(0, row, first_);
   uint8_t* const pixels = line->samples[0];
   line->channel[0] = pixels;
-  if (interpolates_) {
+  if (interpolates_ && palette_ != nullptr) {
+    const int bytes = pixels_.bytes * first_.n;
+    uint8_t* const second = packed_ + bytes;
+    Gather(packed_, start, first_);
+    Gather(second, start, second_);
+    rows_.blendColumns(pixels, packed_, second, firstPlan_.blends, bytes);
+  } else if (interpolates_) {
     rows_.blendPairs(pixels, start, firstPlan_);
-  } else if (first_.contiguous) {
+  } else if (PixelsAreInPlace()) {
     line->channel[0] = start + first_.offset[0];
   } else {
     Gather(pixels, start, first_);
@@ -533,7 +545,7 @@ void Source::FillPixelLine(Line* line, int32_t row) {
 }
 
 bool Source::HasPixels(int32_t r) const {
-  return palette_ == nullptr && (BlendsPixels() || !(interpolates_ || BlendsRows(r)));
+  return BlendsPixels() || !(interpolates_ || BlendsRows(r));
 }
 
 bool Source::BlendsRows(int32_t r) const {
@@ -557,7 +569,7 @@ const uint8_t* Source::Pixels(int32_t r, uint8_t* into) {
     return blended;
   }
   const uint8_t* const row = RowToRead(0, SourceRow(r, 1), first_);
-  if (first_.contiguous) return row + first_.offset[0];
+  if (PixelsAreInPlace()) return row + first_.offset[0];
   uint8_t* const gathered = into != nullptr ? into : packed_;
   Gather(gathered, row, first_);
   return gathered;
@@ -578,10 +590,16 @@ int Source::RowsAlike(int32_t r, int most) const {
 }
 
 RgbRun Source::Rgb(int32_t r) {
+  if (BlendsPixels()) {
+    const uint8_t* const pixels = Pixels(r);
+    rows_.unpackRgb(channels_, pixels, pixels_, first_.n);
+    if (wantsAlpha_) rows_.unpackAlpha(channels_[3], pixels, pixels_, first_.n);
+    return {{channels_[0], channels_[1], channels_[2]}, wantsAlpha_ ? channels_[3] : nullptr};
+  }
   const Lines lines = FetchLines<&Source::FillRgbLine>(r);
   const uint8_t* const* const first = lines.first->channel;
   const uint8_t* const* const second = lines.second->channel;
-  RgbRun run = {{first[0], first[1], first[2]}, lines.first->alpha};
+  RgbRun run = {{first[0], first[1], first[2]}, wantsAlpha_ ? lines.first->samples[3] : nullptr};
   if (lines.weight == 0) return run;
   for (int c = 0; c < 3; ++c) {
     rows_.blendRows(blended_[c], first[c], second[c], lines.weight, first_.n);

@@ -103,8 +103,8 @@ class Source {
   // Pairs in the source's order; made in `into` when they are not in place.
   const uint8_t* ChromaPairs(int32_t r, uint8_t* into);
   RgbRun Rgb(int32_t r);
-  // The strip's packed pixels. Null unless HasPixels: where they come from a palette, or are
-  // blended and have fields within bytes. Not to be mixed with Rgb in a strip. What is not in place
+  // The strip's packed pixels. Null unless HasPixels: where they are blended and have fields within
+  // bytes. Not to be mixed with Rgb in a strip. What is not in place
   // is made in `into` where that is given.
   const uint8_t* Pixels(int32_t r, uint8_t* into = nullptr);
   bool HasPixels(int32_t r) const;
@@ -154,8 +154,7 @@ class Source {
   struct Line {
     int32_t row;
     const uint8_t* channel[3];  // into `samples`, or into the source
-    const uint8_t* alpha;
-    uint8_t* samples[4];  // channels and alpha, or packed pixels, in one piece
+    uint8_t* samples[4];        // channels and alpha, or packed pixels, in one piece
   };
 
   const uint8_t* RowStart(int plane, int32_t row) const {
@@ -176,14 +175,15 @@ class Source {
   }
   const uint8_t* ReadSamples(uint8_t* buffer, const uint8_t* row,
                              const SampleColumns& columns) const;
-  void ReadPixels(uint8_t* const rgb[3], const uint8_t* row, const SampleColumns& columns);
+  void ReadChannels(uint8_t* const rgb[3], const uint8_t* row, const SampleColumns& columns);
   const uint8_t* FindGroups(int32_t r) const;
   PixelChroma ReadChroma(int32_t row, uint8_t* into);
   // The strip's pixels of a row, side by side.
   void Gather(uint8_t* into, const uint8_t* row, const SampleColumns& columns) const;
   int32_t ChromaColumn(int32_t x) const;
   // Whether pixels are blended as they are, without taking their channels apart.
-  bool BlendsPixels() const { return palette_ == nullptr && pixels_.wholeBytes; }
+  bool BlendsPixels() const { return pixels_.wholeBytes; }
+  bool PixelsAreInPlace() const { return palette_ == nullptr && first_.contiguous; }
   // Samples of chroma that a strip may have.
   int ChromaOf(int columns) const;
   const uint8_t* Chroma(int plane, int32_t r, const SampleColumns& columns, uint8_t* buffer);
@@ -205,8 +205,8 @@ class Source {
   const RowOps& rows_;
   ColumnPositions columnPositions_;
   RowPositions rowPositions_;
-  PixelFormat pixels_;
   const uint8_t* palette_;
+  PixelFormat pixels_;  // or entries of the palette
   bool swappedLuma_;
   bool wantsAlpha_;            // it is copied to the destination
   bool interpolates_ = false;  // some column of the strip has a weight
@@ -228,7 +228,7 @@ class Source {
     PixelChroma chroma;
   } lastChroma_ = {-1, {}};
   Line lines_[2];
-  uint8_t* scratch_[3] = {};   // second taps
+  uint8_t* channels_[4] = {};  // of second taps, or those and alpha of pixels
   uint8_t* packed_ = nullptr;  // gathered pixels, or pairs of chroma samples
   uint8_t* blended_[4] = {};   // channels, or packed pixels, in one piece
   uint8_t *u_ = nullptr, *v_ = nullptr;

@@ -179,9 +179,10 @@ struct KestrelRowOps {
   // Byte `alphaByte` of each pixel.
   void (*unpackAlpha)(uint8_t* alpha, const uint8_t* src, const kestrel::PixelFormat& format,
                       int n);
-  // Palette colours of the pixels at `columns`; bits per pixel 1, 4 or 8, leftmost in the top bits.
-  void (*unpackIndexed)(uint8_t* const rgb[3], const uint8_t* row, const int32_t* columns,
-                        uint32_t bits, const uint8_t* palette, int n);
+  // Palette entries, of four bytes, of the pixels at `columns`; bits per pixel 1, 2, 4 or 8,
+  // leftmost in the top bits.
+  void (*gatherIndexed)(uint8_t* dst, const uint8_t* row, const int32_t* columns, uint32_t bits,
+                        const uint8_t* palette, int n);
 
   void (*yuvToRgbWide)(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u, const uint8_t* v,
                        const kestrel::YuvToRgbWide& sums, int n);

@@ -210,34 +210,28 @@ void UnpackAlpha(uint8_t* alpha, const uint8_t* src, const PixelFormat& format, 
 }
 
 template <uint32_t kBits>
-void UnpackEntries(uint8_t* const rgb[3], const uint8_t* row, const int32_t* columns,
-                   const uint8_t* palette, int n) {
+void GatherEntries(uint8_t* dst, const uint8_t* row, const int32_t* columns, const uint8_t* palette,
+                   int n) {
   constexpr uint32_t kPerByte = 8 / kBits;
-  uint8_t* const red = rgb[0];
-  uint8_t* const green = rgb[1];
-  uint8_t* const blue = rgb[2];
   for (int i = 0; i < n; ++i) {
     const uint32_t column = uint32_t(columns[i]);
     const uint32_t shift = kBits * (kPerByte - 1 - column % kPerByte);
     const uint32_t entry = (uint32_t(row[column / kPerByte]) >> shift) & ((1u << kBits) - 1);
-    const uint32_t colour = LoadPixel<4>(palette + size_t{4} * entry);
-    red[i] = uint8_t(colour >> 16);
-    green[i] = uint8_t(colour >> 8);
-    blue[i] = uint8_t(colour);
+    memcpy(dst + ptrdiff_t{4} * i, palette + size_t{4} * entry, 4);
   }
 }
 
-void UnpackIndexed(uint8_t* const rgb[3], const uint8_t* row, const int32_t* columns, uint32_t bits,
+void GatherIndexed(uint8_t* dst, const uint8_t* row, const int32_t* columns, uint32_t bits,
                    const uint8_t* palette, int n) {
   switch (bits) {
     case 1:
-      return UnpackEntries<1>(rgb, row, columns, palette, n);
+      return GatherEntries<1>(dst, row, columns, palette, n);
     case 2:
-      return UnpackEntries<2>(rgb, row, columns, palette, n);
+      return GatherEntries<2>(dst, row, columns, palette, n);
     case 4:
-      return UnpackEntries<4>(rgb, row, columns, palette, n);
+      return GatherEntries<4>(dst, row, columns, palette, n);
     default:
-      return UnpackEntries<8>(rgb, row, columns, palette, n);
+      return GatherEntries<8>(dst, row, columns, palette, n);
   }
 }
 
@@ -687,7 +681,7 @@ const RowOps kScalarRows = {"scalar",
                             scalar::BlendPixelRows,
                             scalar::UnpackRgb,
                             scalar::UnpackAlpha,
-                            scalar::UnpackIndexed,
+                            scalar::GatherIndexed,
                             scalar::YuvToRgbByWideSums,
                             scalar::YuvToRgbCarry,
                             scalar::YuvToPixels,

@@ -26,7 +26,7 @@ void BlendPixelRows(uint8_t* dst, const uint8_t* a, const uint8_t* b, uint32_t w
                     int alphaByte, int n);
 void UnpackRgb(uint8_t* const rgb[3], const uint8_t* src, const PixelFormat& format, int n);
 void UnpackAlpha(uint8_t* alpha, const uint8_t* src, const PixelFormat& format, int n);
-void UnpackIndexed(uint8_t* const rgb[3], const uint8_t* row, const int32_t* columns, uint32_t bits,
+void GatherIndexed(uint8_t* dst, const uint8_t* row, const int32_t* columns, uint32_t bits,
                    const uint8_t* palette, int n);
 void YuvToRgbByTable(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u, const uint8_t* v,
                      const YuvToRgbTable& table, int n);

@@ -722,14 +722,15 @@ constexpr auto TableUnpackRgb = ForLong<&RowOps::unpackRgb, UnpackRgb>::Run;
 constexpr auto TablePackRgb = ForLong<&RowOps::packRgb, PackRgb>::Run;
 
 template <int kIn, int kOut, bool kExchange>
-void RepackRun(uint8_t* dst, const uint8_t* src, int n) {
+void RepackRun(uint8_t* dst, const uint8_t* src, uint8_t keptAlpha, int n) {
+  const Bytes kept = SetBytes(keptAlpha);
   uint8_t* const dsts[] = {dst};
   ForRun<kOut>(
       dsts, n,
-      [](uint8_t* const* out, const uint8_t* in) {
+      [=](uint8_t* const* out, const uint8_t* in) {
         const PixelBytes p = LoadPixels<kIn>(in);
         StorePixels<kOut>(out[0], kExchange ? p.high : p.low, p.middle, kExchange ? p.low : p.high,
-                          p.alpha);
+                          p.alpha & kept);
       },
       Units{src, kIn});
 }
@@ -747,7 +748,7 @@ void RepackPixels(uint8_t* dst, const uint8_t* src, const PixelFormat& from, con
       constexpr int kOut = decltype(outSize)::value;
       const auto repack =
           in.blueFirst != out.blueFirst ? RepackRun<kIn, kOut, true> : RepackRun<kIn, kOut, false>;
-      repack(dst, src, n);
+      repack(dst, src, from.alphaByte >= 0 && to.alphaByte >= 0 ? 0xFF : 0, n);
     });
   });
 }
@@ -1634,7 +1635,7 @@ constexpr RowOps VectorRows(const char* name) noexcept {
           ForLong<&RowOps::blendPixelRows, BlendPixelRows, kQuads>::Run,
           TableUnpackRgb,
           ForLong<&RowOps::unpackAlpha, UnpackAlpha>::Run,
-          scalar::UnpackIndexed,
+          scalar::GatherIndexed,
           ForLong<&RowOps::yuvToRgbWide, YuvToRgbByWideSums>::Run,
           YuvToRgbCarry,
           TableYuvToPixels,

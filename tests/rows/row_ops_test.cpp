@@ -39,19 +39,31 @@ static_assert((kLongest - kLongestOfAll) % 13 == 0, "the longest is among them")
 
 constexpr PixelFormat kPixelFormats[] = {
     {2, {8, 8, 8}, {0, 8, 16}, -1, false},  // the last field lies beyond the pixel
-    {2, {5, 6, 5}, {11, 5, 0}, -1, false},    {2, {5, 6, 5}, {0, 5, 11}, -1, false},
-    {2, {5, 5, 5}, {10, 5, 0}, -1, false},    {2, {4, 4, 4}, {0, 4, 8}, -1, false},
-    {1, {3, 3, 2}, {5, 2, 0}, -1, false},     {3, {8, 8, 8}, {16, 8, 0}, -1, true},
-    {3, {8, 8, 8}, {0, 8, 16}, -1, true},     {3, {6, 6, 6}, {12, 6, 0}, -1, false},
-    {3, {6, 6, 6}, {0, 6, 12}, -1, false},    {3, {7, 8, 7}, {2, 9, 17}, -1, false},
-    {4, {8, 8, 8}, {16, 8, 0}, 3, true},      {4, {8, 8, 8}, {0, 8, 16}, 3, true},
-    {4, {8, 8, 8}, {24, 16, 8}, 0, true},     {4, {8, 8, 8}, {8, 16, 24}, 0, true},
-    {4, {10, 10, 10}, {20, 10, 0}, 2, false}, {4, {16, 0, 9}, {0, 16, 20}, 1, false},
+    {2, {5, 6, 5}, {11, 5, 0}, -1, false},
+    {2, {5, 6, 5}, {0, 5, 11}, -1, false},
+    {2, {5, 5, 5}, {10, 5, 0}, -1, false},
+    {2, {4, 4, 4}, {0, 4, 8}, -1, false},
+    {1, {3, 3, 2}, {5, 2, 0}, -1, false},
+    {3, {8, 8, 8}, {16, 8, 0}, -1, true},
+    {3, {8, 8, 8}, {0, 8, 16}, -1, true},
+    {3, {6, 6, 6}, {12, 6, 0}, -1, false},
+    {3, {6, 6, 6}, {0, 6, 12}, -1, false},
+    {3, {7, 8, 7}, {2, 9, 17}, -1, false},
+    {3, {8, 8, 8}, {0, 16, 8}, -1, true},
+    {3, {8, 8, 8}, {8, 16, 0}, -1, true},
+    {4, {8, 8, 8}, {16, 8, 0}, -1, true},
+    {3, {8, 8, 8}, {8, 8, 0}, -1, true},  // two of them share a byte
+    {4, {8, 8, 8}, {16, 8, 0}, 3, true},
+    {4, {8, 8, 8}, {0, 8, 16}, 3, true},
+    {4, {8, 8, 8}, {24, 16, 8}, 0, true},
+    {4, {8, 8, 8}, {8, 16, 24}, 0, true},
+    {4, {10, 10, 10}, {20, 10, 0}, 2, false},
+    {4, {16, 0, 9}, {0, 16, 20}, 1, false},
 };
 constexpr int kPixelFormatCount = int(std::size(kPixelFormats));
 
 // The four of them that have whole bytes and alpha.
-constexpr int kFirstWithAlpha = 11;
+constexpr int kFirstWithAlpha = 15;
 
 uint32_t Word(const uint8_t* pixel, int bytes) {
   uint32_t word = 0;
@@ -487,24 +499,22 @@ void UnpackAlpha(Trial* trial, const RowOps& ops, int n, int variant) {
   ops.unpackAlpha(dst.got, src, format, n);
 }
 
-void UnpackIndexed(Trial* trial, const RowOps& ops, int n, int variant) {
-  constexpr uint32_t kBits[] = {1, 4, 8};
-  const uint32_t bits = kBits[variant % 3];
+void GatherIndexed(Trial* trial, const RowOps& ops, int n, int variant) {
+  const uint32_t bits = 1u << (variant % 4);
   const int32_t width = trial->random().Between(1, 2 * n + 1);
   const uint8_t* const row = trial->Source((size_t(width) * bits + 7) / 8);
   const uint8_t* const palette = trial->Source(size_t{4} << bits);
-  const int32_t* const columns = trial->Source(DrawOffsets(trial, n, variant / 3, width));
-  Destinations dst(trial, n);
+  const int32_t* const columns = trial->Source(DrawOffsets(trial, n, variant / 4, width));
+  const auto dst = trial->Written(size_t(4) * size_t(n));
   for (ptrdiff_t i = 0; i < n; ++i) {
     uint32_t entry = 0;
     for (uint32_t bit = 0; bit < bits; ++bit) {  // numbered from the left, most significant first
       const uint32_t place = uint32_t(columns[i]) * bits + bit;
       entry = 2 * entry + ((row[place / 8] >> (7 - place % 8)) & 1);
     }
-    const uint8_t* const colour = palette + 4 * size_t{entry};  // B G R x
-    dst.Expect(i, {colour[2], colour[1], colour[0]});
+    std::copy_n(palette + 4 * size_t{entry}, 4, dst.expected + 4 * i);
   }
-  ops.unpackIndexed(dst.got, row, columns, bits, palette, n);
+  ops.gatherIndexed(dst.got, row, columns, bits, palette, n);
 }
 
 void YuvToRgbWide(Trial* trial, const RowOps& ops, int n, int variant) {
@@ -547,19 +557,19 @@ constexpr struct {
   int format;
 } kYuvToPixels[] = {
     {YuvToRgbForm::kWide, kAdjusted, 6},   {YuvToRgbForm::kWide, kAdjusted, 7},
-    {YuvToRgbForm::kWide, kAdjusted, 11},  {YuvToRgbForm::kWide, kAdjusted, 12},
-    {YuvToRgbForm::kWide, kAdjusted, 13},  {YuvToRgbForm::kWide, kAdjusted, 14},
+    {YuvToRgbForm::kWide, kAdjusted, 15},  {YuvToRgbForm::kWide, kAdjusted, 16},
+    {YuvToRgbForm::kWide, kAdjusted, 17},  {YuvToRgbForm::kWide, kAdjusted, 18},
     {YuvToRgbForm::kTable, 0, 6},          {YuvToRgbForm::kTable, 0, 7},
-    {YuvToRgbForm::kTable, 0, 11},         {YuvToRgbForm::kTable, 0, 12},
-    {YuvToRgbForm::kTable, 0, 13},         {YuvToRgbForm::kTable, 0, 14},
+    {YuvToRgbForm::kTable, 0, 15},         {YuvToRgbForm::kTable, 0, 16},
+    {YuvToRgbForm::kTable, 0, 17},         {YuvToRgbForm::kTable, 0, 18},
     {YuvToRgbForm::kTable, 6, 6},          {YuvToRgbForm::kTable, 6, 7},
-    {YuvToRgbForm::kTable, 6, 11},         {YuvToRgbForm::kTable, 6, 14},
+    {YuvToRgbForm::kTable, 6, 15},         {YuvToRgbForm::kTable, 6, 18},
     {YuvToRgbForm::kWholeLuma, 6, 6},      {YuvToRgbForm::kWholeLuma, 6, 7},
-    {YuvToRgbForm::kWholeLuma, 6, 11},     {YuvToRgbForm::kWholeLuma, 6, 12},
-    {YuvToRgbForm::kWholeLuma, 6, 13},     {YuvToRgbForm::kWholeLuma, 6, 14},
+    {YuvToRgbForm::kWholeLuma, 6, 15},     {YuvToRgbForm::kWholeLuma, 6, 16},
+    {YuvToRgbForm::kWholeLuma, 6, 17},     {YuvToRgbForm::kWholeLuma, 6, 18},
     {YuvToRgbForm::kSixBits, 6, 6},        {YuvToRgbForm::kSixBits, 6, 7},
-    {YuvToRgbForm::kSixBits, 6, 11},       {YuvToRgbForm::kSixBits, 6, 12},
-    {YuvToRgbForm::kSixBits, 6, 13},       {YuvToRgbForm::kSixBits, 6, 14},
+    {YuvToRgbForm::kSixBits, 6, 15},       {YuvToRgbForm::kSixBits, 6, 16},
+    {YuvToRgbForm::kSixBits, 6, 17},       {YuvToRgbForm::kSixBits, 6, 18},
     {YuvToRgbForm::kWide, kAdjusted16, 1}, {YuvToRgbForm::kWide, kAdjusted16, 2},
     {YuvToRgbForm::kTable, 2, 1},          {YuvToRgbForm::kTable, 2, 2},
     {YuvToRgbForm::kTable, 3, 1},          {YuvToRgbForm::kTable, 3, 2},
@@ -890,7 +900,7 @@ constexpr Operation kOperations[] = {
     {"BlendPixelRows", 5, BlendPixelRows},
     {"UnpackRgb", kPixelFormatCount, UnpackRgb},
     {"UnpackAlpha", kPixelFormatCount - kFirstWithAlpha, UnpackAlpha},
-    {"UnpackIndexed", 9, UnpackIndexed},
+    {"GatherIndexed", 12, GatherIndexed},
     {"YuvToRgbWide", kAllToRgbCount, YuvToRgbWide},
     {"YuvToRgbCarry", kAllToRgbCount, YuvToRgbCarry},
     {"YuvToPixels", kYuvToPixelsCount, YuvToPixels},
