@@ -51,7 +51,7 @@ constexpr Turn kTurns[] = {
 };
 
 struct Options {
-  int rounds = 5;
+  int rounds = 9;
   std::string jsonPath;
   std::string csvPath;
 };
@@ -97,19 +97,29 @@ class Pairs {
     }
   }
 
+  // Every round times every pair, so that a slow moment of the machine is not one pair's.
   Class Measure(const Scale& scale, const Turn& turn) const {
-    Class result = {scale.name, turn.name, {}};
     const bool swap = (turn.transform & MPP_SWAP_XY) != 0;
-    for (const PublicFormat& format : kPublicFormats) {
-      const Picture dst(InFullRange(format.code), swap ? scale.dst.Turned() : scale.dst);
-      FillWithNoise(dst.block[0].start, dst.ByteCount());
-      for (size_t i = 0; i < sources_.size(); ++i) {
-        const double time = Time(sources_[i], dst, scale, turn.transform);
-        if (time < 0) continue;
-        result.pairs.push_back(
-            {kPublicFormats[i].name, format.name, time / double(dst.size.Pixels())});
+    const Size size = swap ? scale.dst.Turned() : scale.dst;
+    Class result = {scale.name, turn.name, {}};
+    std::vector<std::vector<double>> times;
+    for (int round = 0; round < rounds_; ++round) {
+      size_t pair = 0;
+      for (const PublicFormat& format : kPublicFormats) {
+        const Picture dst(InFullRange(format.code), size);
+        FillWithNoise(dst.block[0].start, dst.ByteCount());
+        for (size_t i = 0; i < sources_.size(); ++i) {
+          const double time = Time(sources_[i], dst, scale, turn.transform);
+          if (time < 0) continue;
+          if (round == 0) {
+            result.pairs.push_back({kPublicFormats[i].name, format.name, 0});
+            times.emplace_back();
+          }
+          times[pair++].push_back(time / double(size.Pixels()));
+        }
       }
     }
+    for (size_t i = 0; i < times.size(); ++i) result.pairs[i].nanoseconds = Median(times[i]);
     std::sort(result.pairs.begin(), result.pairs.end(),
               [](const Pair& a, const Pair& b) { return a.nanoseconds > b.nanoseconds; });
     return result;
@@ -129,9 +139,7 @@ class Pairs {
     if (!engine.IsAccepted()) return -1;
     const auto run = [&] { engine.Run(src, dst); };
     const int repetitions = 1 + int(kSliceNanoseconds / TimePerCall(1, run));
-    std::vector<double> times(static_cast<size_t>(rounds_));
-    for (double& time : times) time = TimePerCall(repetitions, run);
-    return Median(times);
+    return TimePerCall(repetitions, run);
   }
 
   int rounds_;

@@ -219,6 +219,11 @@ const Case kCases[] = {
      [](const RowOps& ops, Runs* r) {
        ops.unpackAlpha(r->out[0].data(), r->pixels.data(), kRgba, kPixels);
      }},
+    {"gatherIndexed 4", kPixels,
+     [](const RowOps& ops, Runs* r) {
+       ops.gatherIndexed(r->out[0].data(), r->a.data(), r->scaled.data(), 4, r->palette.data(),
+                         kPixels);
+     }},
     {"gatherIndexed 8", kPixels,
      [](const RowOps& ops, Runs* r) {
        ops.gatherIndexed(r->out[0].data(), r->a.data(), r->scaled.data(), 8, r->palette.data(),

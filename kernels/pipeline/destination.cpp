@@ -321,9 +321,11 @@ bool Destination::AreGroups(int64_t lumaColumn, int lumaCount, int64_t chromaCol
                             int chromaCount) const {
   const PlaneLayout& layout = engine_.dstLayout;
   if (layout.isPacked == 0 || planes_[0].columnStep != layout.step[0] ||
-      exchange_ != LumaExchange::kNone || chromaCount <= 0) {
+      exchange_ == LumaExchange::kRows || chromaCount <= 0) {
     return false;
   }
+  // Luma is exchanged between columns of even and odd number.
+  if (exchange_ == LumaExchange::kColumns && (lumaColumn + job_.rect.left) % 2 != 0) return false;
   const uint8_t* const group = planes_[0].At(lumaColumn, 0) - layout.yOffset;
   if (planes_[1].At(chromaColumn, 0) != group + layout.uOffset ||
       planes_[2].At(chromaColumn, 0) != group + layout.vOffset) {
@@ -409,6 +411,11 @@ void Destination::WriteGroups(int32_t r, const uint8_t* y, const uint8_t* u, con
   }
   const bool uFirst = layout.uOffset < layout.vOffset;
   rows_.interleave(buffer_, uFirst ? u : v, uFirst ? v : u, chromaCount_);
+  if (exchange_ != LumaExchange::kNone) {
+    uint8_t* const exchanged = buffer_ + n_;
+    rows_.swapPairs(exchanged, y, n_ / 2);
+    y = exchanged;
+  }
   const bool lumaFirst = layout.yOffset == 0;
   rows_.interleave(group, lumaFirst ? y : buffer_, lumaFirst ? buffer_ : y, n_);
 }

@@ -829,8 +829,8 @@ class Pipeline {
   }
 
   void RgbToYuv(int32_t r) {
-    const bool fromPixels =
-        chromaOfSeconds_ && !destination_.exchangesLuma() && !source_.hasFields();
+    const bool fromPixels = chromaOfSeconds_ && !source_.hasFields() &&
+                            (!destination_.exchangesLuma() || destination_.writesGroups());
     const uint8_t* const pixels = fromPixels ? source_.Pixels(r) : nullptr;
     if (pixels != nullptr) return PixelsToYuv(r, pixels);
     const RgbRun run = source_.Rgb(r);

@@ -4,6 +4,7 @@
 #include <string.h>
 
 #include "kernels/rows/channels.h"
+#include "kernels/rows/indexed.h"
 #include "kernels/rows/transpose.h"
 
 static_assert(__BYTE_ORDER__ == __ORDER_LITTLE_ENDIAN__, "packed pixels are stored as words");
@@ -209,30 +210,9 @@ void UnpackAlpha(uint8_t* alpha, const uint8_t* src, const PixelFormat& format, 
   for (int i = 0; i < n; ++i) alpha[i] = src[i * format.bytes + format.alphaByte];
 }
 
-template <uint32_t kBits>
-void GatherEntries(uint8_t* dst, const uint8_t* row, const int32_t* columns, const uint8_t* palette,
-                   int n) {
-  constexpr uint32_t kPerByte = 8 / kBits;
-  for (int i = 0; i < n; ++i) {
-    const uint32_t column = uint32_t(columns[i]);
-    const uint32_t shift = kBits * (kPerByte - 1 - column % kPerByte);
-    const uint32_t entry = (uint32_t(row[column / kPerByte]) >> shift) & ((1u << kBits) - 1);
-    memcpy(dst + ptrdiff_t{4} * i, palette + size_t{4} * entry, 4);
-  }
-}
-
 void GatherIndexed(uint8_t* dst, const uint8_t* row, const int32_t* columns, uint32_t bits,
                    const uint8_t* palette, int n) {
-  switch (bits) {
-    case 1:
-      return GatherEntries<1>(dst, row, columns, palette, n);
-    case 2:
-      return GatherEntries<2>(dst, row, columns, palette, n);
-    case 4:
-      return GatherEntries<4>(dst, row, columns, palette, n);
-    default:
-      return GatherEntries<8>(dst, row, columns, palette, n);
-  }
+  GatherPaletteEntries(dst, row, columns, bits, palette, n);
 }
 
 void YuvToRgbByTable(uint8_t* const rgb[3], const uint8_t* y, const uint8_t* u, const uint8_t* v,

@@ -6,6 +6,7 @@
 #include <string.h>
 
 #include "kernels/rows/channels.h"
+#include "kernels/rows/indexed.h"
 
 namespace kestrel {
 namespace {
@@ -617,41 +618,42 @@ void UnpackFields(uint8_t* const rgb[3], const uint8_t* src, const PixelFormat& 
   });
 }
 
-// Adds levels to byte k of pixels, shifted right and then left, or left only.
-void AddLevels(BytePlanes* planes, uint32_t k, const uint8_t* levels, uint32_t right, uint32_t left,
-               int n) {
-  if (k >= 4) return;
-  uint8_t* const plane = planes->of[k];
-  uint8_t* const dsts[] = {plane};
+// What channels add to a byte of pixels: levels shifted right and then left.
+struct ByteOfFields {
+  ByteOfFields(const PixelFormat& format, const FieldShifts& shifts, int byte) {
+    for (int c = 0; c < 3; ++c) {
+      const int32_t narrowing = shifts.right[c] > 0 ? shifts.right[c] : 0;
+      // From this byte's lowest bit up to the field's.
+      const int32_t up = int32_t(format.position[c]) + narrowing - shifts.right[c] - 8 * byte;
+      right[c] = up < 0 ? uint32_t(narrowing - up < 8 ? narrowing - up : 8) : uint32_t(narrowing);
+      left[c] = up < 0 ? 0 : uint32_t(up < 8 ? up : 8);
+    }
+  }
+  uint32_t right[3], left[3];  // no more than 8
+};
+void PackByte(uint8_t* dst, const uint8_t* const rgb[3], int x, const ByteOfFields& fields,
+              uint8_t keep, uint8_t bits, int n) {
+  const Bytes kept = SetBytes(keep);
+  const Bytes fixed = SetBytes(bits);
+  const auto share = [=](int c, const uint8_t* in) {
+    return ShiftLeft(ShiftRightUnsigned(LoadBytes(in), fields.right[c]), fields.left[c]);
+  };
+  uint8_t* const dsts[] = {dst};
   ForRun<1>(
       dsts, n,
-      [=](uint8_t* const* out, const uint8_t* in, const uint8_t* inLevels) {
-        const Bytes level = ShiftLeft(ShiftRightUnsigned(LoadBytes(inLevels), right), left);
-        StoreBytes(out[0], LoadBytes(in) | level);
+      [=](uint8_t* const* out, const uint8_t* red, const uint8_t* green, const uint8_t* blue) {
+        const Bytes all = share(0, red) | share(1, green) | share(2, blue);
+        StoreBytes(out[0], (all & kept) | fixed);
       },
-      Units{plane, 1}, Units{levels, 1});
+      Units{rgb[0] + x, 1}, Units{rgb[1] + x, 1}, Units{rgb[2] + x, 1});
 }
 void PackFields(uint8_t* dst, const uint8_t* const rgb[3], const PixelFormat& format,
                 const FieldShifts& shifts, AlphaFill alpha, int n) {
-  BytePlanes planes(4);
+  BytePlanes planes(format.bytes);
   ForPieces(n, [&](int x, int count) {
-    memset(planes.of, 0, sizeof(planes.of));
-    for (int c = 0; c < 3; ++c) {
-      const int32_t right = shifts.right[c] > 0 ? shifts.right[c] : 0;
-      const uint32_t at = format.position[c] + uint32_t(right - shifts.right[c]);
-      const uint32_t left = at % 8;
-      AddLevels(&planes, at / 8, rgb[c] + x, uint32_t(right), left, count);
-      // What does not fit that byte.
-      if (uint32_t(right) < left) {
-        AddLevels(&planes, at / 8 + 1, rgb[c] + x, uint32_t(right) + 8 - left, 0, count);
-      }
-    }
-    for (int k = 0; k < 4; ++k) {
-      const uint8_t keep = uint8_t(alpha.keep >> (8 * k));
-      const uint8_t bits = uint8_t(alpha.bits >> (8 * k));
-      for (int i = 0; keep != 0xFF && i < count; ++i) {
-        planes.of[k][i] = uint8_t((planes.of[k][i] & keep) | bits);
-      }
+    for (int k = 0; k < format.bytes; ++k) {
+      PackByte(planes.of[k], rgb, x, ByteOfFields(format, shifts, k),
+               uint8_t(alpha.keep >> (8 * k)), uint8_t(alpha.bits >> (8 * k)), count);
     }
     WithBytes(format.bytes, [&](auto size) {
       constexpr int kPixel = decltype(size)::value;
@@ -1635,7 +1637,7 @@ constexpr RowOps VectorRows(const char* name) noexcept {
           ForLong<&RowOps::blendPixelRows, BlendPixelRows, kQuads>::Run,
           TableUnpackRgb,
           ForLong<&RowOps::unpackAlpha, UnpackAlpha>::Run,
-          scalar::GatherIndexed,
+          GatherPaletteEntries,
           ForLong<&RowOps::yuvToRgbWide, YuvToRgbByWideSums>::Run,
           YuvToRgbCarry,
           TableYuvToPixels,
