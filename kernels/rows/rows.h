@@ -120,8 +120,8 @@ struct PairPlan {
           second(plan.second == nullptr ? plan.first : plan.second),
           stride(plan.stride),
           apart(plan.second == nullptr ? plan.apart : 0) {}
-    int32_t First(int unit) const { return first[ptrdiff_t{unit} * stride]; }
-    int32_t Second(int unit) const { return second[ptrdiff_t{unit} * stride] + apart; }
+    int32_t First(int i) const { return first[ptrdiff_t{i} * stride]; }
+    int32_t Second(int i) const { return second[ptrdiff_t{i} * stride] + apart; }
     const int32_t* first;
     const int32_t* second;
     int stride;

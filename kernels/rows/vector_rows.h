@@ -204,23 +204,34 @@ inline Extent ExtentOf(const PairPlan& plan) {
 constexpr int kGroup = kWindow / 2;
 
 // Pairs that share a window: where it begins, from the lowest byte on, and where in it their bytes
-// are. No window reaches beyond the bytes that the run reads anyway, [lowest, end). False when
-// there is none.
+// are, in turn. No window reaches beyond the bytes that the run reads anyway, [lowest, end). False
+// when there is none.
 constexpr uint16_t kNoWindow = 0xFFFF;
-template <int kPairs>
-bool PlanWindow(const int32_t* offsets, const Extent& extent, uint16_t* window, uint8_t* at) {
-  int32_t first = offsets[0];
-  int32_t last = offsets[0];
-  for (int k = 0; k < 2 * kPairs; ++k) {
-    first = offsets[k] < first ? offsets[k] : first;
-    last = offsets[k] > last ? offsets[k] : last;
+template <int kShared>
+bool PlanWindow(const int32_t* firsts, const int32_t* seconds, const Extent& extent,
+                uint16_t* window, uint8_t* at) {
+  int32_t lowest = firsts[0];
+  int32_t highest = firsts[0];
+  for (int k = 0; k < kShared; ++k) {
+    const int32_t low = firsts[k] < seconds[k] ? firsts[k] : seconds[k];
+    const int32_t high = firsts[k] < seconds[k] ? seconds[k] : firsts[k];
+    lowest = low < lowest ? low : lowest;
+    highest = high > highest ? high : highest;
   }
-  if (first > extent.end - kWindow) first = extent.end - kWindow;
-  const int32_t start = first - extent.lowest;
-  const bool fits = start >= 0 && start < kNoWindow && last - first < kWindow;
+  if (lowest > extent.end - kWindow) lowest = extent.end - kWindow;
+  const int32_t start = lowest - extent.lowest;
+  const bool fits = start >= 0 && start < kNoWindow && highest - lowest < kWindow;
   *window = fits ? uint16_t(start) : kNoWindow;
-  for (int k = 0; k < 2 * kPairs; ++k) at[k] = uint8_t(fits ? offsets[k] - first : 0);
-  return fits;
+  if (!fits) {
+    memset(at, 0, 2 * kShared);
+    return false;
+  }
+  uint16_t both[kShared];
+  for (int k = 0; k < kShared; ++k) {
+    both[k] = uint16_t((firsts[k] - lowest) | (seconds[k] - lowest) << 8);
+  }
+  memcpy(at, both, sizeof(both));
+  return true;
 }
 
 // A plan's pairs in blocks of kPairs: first the windows of each group (with room for four), then
@@ -255,36 +266,59 @@ inline uint16_t NegativeWeight(uint16_t weight) {
   return BeginsWithSecond(weight) ? weight : uint16_t(-weight);
 }
 
-// Offsets of eight pairs from one on, in turn. Beyond the last pair that one again.
-inline void OffsetsOfEight(const PairPlan& plan, int first, int32_t* offsets) {
-  const bool isWhole = first + 8 <= plan.n;
-  const bool areBytes = isWhole && plan.unit == 1;
-  const int32_t* const from = plan.first + ptrdiff_t{first} * plan.stride;
-  if (areBytes && plan.stride == 2 && plan.second == plan.first + 1 && plan.weights == nullptr) {
-    memcpy(offsets, from, 16 * sizeof(*offsets));
-  } else if (areBytes && plan.stride == 1 && plan.second == nullptr && plan.weights == nullptr) {
-    for (int k = 0; k < 8; ++k) {
-      offsets[2 * k] = from[k];
-      offsets[2 * k + 1] = from[k] + plan.apart;
+// Offsets of a group of pairs from one on, as they are blended. Beyond the last pair that one
+// again.
+struct GroupOffsets {
+  int32_t first[kGroup], second[kGroup];
+};
+inline void ReadOffsets(const PairPlan& plan, int from, GroupOffsets* group) {
+  int32_t* const firsts = group->first;
+  int32_t* const seconds = group->second;
+  const PairPlan::Lists lists(plan);
+  const bool areBytes = from + kGroup <= plan.n && plan.unit == 1;
+  // (Strides that compilers know let them take several at once.)
+  if (areBytes && plan.stride == 1 && plan.weights == nullptr) {
+    for (int k = 0; k < kGroup; ++k) firsts[k] = lists.first[from + k];
+    for (int k = 0; k < kGroup; ++k) seconds[k] = lists.second[from + k] + lists.apart;
+  } else if (areBytes && plan.stride == 2 && plan.weights == nullptr) {
+    for (int k = 0; k < kGroup; ++k) firsts[k] = lists.first[2 * (from + k)];
+    for (int k = 0; k < kGroup; ++k) seconds[k] = lists.second[2 * (from + k)] + lists.apart;
+  } else if (areBytes && plan.stride == 1) {
+    for (int k = 0; k < kGroup; ++k) {
+      const int32_t a = lists.first[from + k];
+      const int32_t b = lists.second[from + k] + lists.apart;
+      const bool swap = BeginsWithSecond(plan.weights[from + k]);
+      firsts[k] = swap ? b : a;
+      seconds[k] = swap ? a : b;
     }
-  } else if (areBytes && plan.stride == 1 && plan.second != nullptr && plan.weights != nullptr) {
-    const int32_t* const other = plan.second + first;
-    for (int k = 0; k < 8; ++k) {
-      const bool swap = BeginsWithSecond(plan.weights[first + k]);
-      offsets[2 * k] = swap ? other[k] : from[k];
-      offsets[2 * k + 1] = swap ? from[k] : other[k];
+  } else if (from + kGroup <= plan.n && plan.unit == 4 && plan.weights != nullptr) {
+    for (int k = 0; k < kGroup; k += 4) {
+      const int unit = (from + k) / 4;
+      const int32_t a = lists.First(unit);
+      const int32_t b = lists.Second(unit);
+      const bool swap = BeginsWithSecond(plan.weights[unit]);
+      for (int byte = 0; byte < 4; ++byte) {
+        firsts[k + byte] = (swap ? b : a) + byte;
+        seconds[k + byte] = (swap ? a : b) + byte;
+      }
+      if (plan.keptByte < 0) continue;
+      firsts[k + plan.keptByte] = seconds[k + plan.keptByte] = a + plan.keptByte;
     }
   } else {
-    const PairPlan::Lists lists(plan);
-    for (int k = 0; k < 8; ++k) {
-      const int pair = first + k < plan.n ? first + k : plan.n - 1;
-      const int unit = pair / plan.unit;
-      const int byte = pair % plan.unit;
+    if (from >= plan.n) from = plan.n - 1;
+    int unit = from / plan.unit;
+    int byte = from % plan.unit;
+    for (int k = 0; k < kGroup; ++k) {
       const int32_t a = lists.First(unit) + byte;
       const int32_t b = byte == plan.keptByte ? a : lists.Second(unit) + byte;
       const bool swap = plan.weights != nullptr && BeginsWithSecond(plan.weights[unit]);
-      offsets[2 * k] = swap ? b : a;
-      offsets[2 * k + 1] = swap ? a : b;
+      firsts[k] = swap ? b : a;
+      seconds[k] = swap ? a : b;
+      if (from + k + 1 >= plan.n) continue;
+      if (++byte == plan.unit) {
+        byte = 0;
+        ++unit;
+      }
     }
   }
 }
@@ -298,16 +332,15 @@ bool PlanWindows(PairPlan* plan, const Extent& extent) {
   plan->hasWindows = true;
   for (int i = 0; i < BlocksOf(*plan) * kPairs; i += kGroup) {
     const int group = i % kPairs / kGroup;
-    int32_t offsets[2 * kGroup];
-    for (int k = 0; k < kGroup; k += 8) {
-      OffsetsOfEight(*plan, FirstPairOf(*plan, i / kPairs) + kGroup * group + k, offsets + 2 * k);
-    }
+    GroupOffsets offsets;
+    ReadOffsets(*plan, FirstPairOf(*plan, i / kPairs) + kGroup * group, &offsets);
     uint8_t* const block = plan->prepared + kBlockBytes * (i / kPairs);
     uint8_t at[2 * kGroup];
     for (int w = 0; w < kWindows; ++w) {
       uint16_t window;
-      const bool fits =
-          PlanWindow<kShared>(offsets + 2 * kShared * w, extent, &window, at + 2 * kShared * w);
+      const int pair = kShared * w;
+      const bool fits = PlanWindow<kShared>(offsets.first + pair, offsets.second + pair, extent,
+                                            &window, at + 2 * pair);
       memcpy(block + sizeof(window) * size_t(group * kWindows + w), &window, sizeof(window));
       if (!fits) plan->hasWindows = false;
     }
@@ -315,6 +348,25 @@ bool PlanWindows(PairPlan* plan, const Extent& extent) {
     SetShuffle<kShared>(block + kWindowBytes + 2 * kGroup * group, at);
   }
   return plan->hasWindows;
+}
+
+// Of a block's pairs; none beyond the last.
+void PlanWeights(uint16_t* blends, const PairPlan& plan, int from) {
+  const int n = plan.n - from < kPairs ? plan.n - from : kPairs;
+  if (plan.unit == 1) {
+    for (int i = 0; i < n; ++i) blends[i] = NegativeWeight(plan.weights[from + i]);
+  } else {
+    int unit = from / plan.unit;
+    int byte = from % plan.unit;
+    for (int i = 0; i < n; ++i) {
+      blends[i] = NegativeWeight(plan.weights[unit]);
+      if (++byte == plan.unit) {
+        byte = 0;
+        ++unit;
+      }
+    }
+  }
+  for (int i = n; i < kPairs; ++i) blends[i] = 0;
 }
 
 void PlanPairs(PairPlan* plan) {
@@ -328,13 +380,7 @@ void PlanPairs(PairPlan* plan) {
   }
   if (plan->weights == nullptr) return;
   for (int block = 0; block < BlocksOf(*plan); ++block) {
-    const int first = FirstPairOf(*plan, block);
-    const int n = plan->n - first < kPairs ? plan->n - first : kPairs;
-    uint16_t* const blends = plan->blends + kPairs * block;
-    for (int i = 0; i < n; ++i) {
-      blends[i] = NegativeWeight(plan->weights[(first + i) / plan->unit]);
-    }
-    for (int i = n; i < kPairs; ++i) blends[i] = 0;
+    PlanWeights(plan->blends + kPairs * block, *plan, FirstPairOf(*plan, block));
   }
 }
 
