@@ -13,10 +13,10 @@ namespace kestrel {
 // A packed RGB pixel: little-endian word of 1..4 bytes with a field for each of R, G, B.
 struct PixelFormat {
   int32_t bytes;
-  uint32_t size[3];  // bits of the field, 0..16
-  uint32_t position[3];
-  int32_t alphaByte;  // byte of the pixel that holds alpha; -1 when there is none
-  bool wholeBytes;    // each field is one whole byte of the pixel
+  uint32_t size[3];      // bits of the field, 0..16
+  uint32_t position[3];  // of its lowest bit; the field ends within 32 bits
+  int32_t alphaByte;     // byte of the pixel that holds alpha; -1 when there is none
+  bool wholeBytes;       // each field is one whole byte of the pixel
 };
 
 // How 8-bit (or already narrowed) channel values become fields: shifted right, or left if negative.

@@ -51,19 +51,21 @@ constexpr PixelFormat kPixelFormats[] = {
     {3, {7, 8, 7}, {2, 9, 17}, -1, false},
     {3, {8, 8, 8}, {0, 16, 8}, -1, true},
     {3, {8, 8, 8}, {8, 16, 0}, -1, true},
+    {3, {16, 7, 9}, {16, 9, 0}, -1, false},  // half of the first field lies beyond the pixel
     {4, {8, 8, 8}, {16, 8, 0}, -1, true},
     {3, {8, 8, 8}, {8, 8, 0}, -1, true},  // two of them share a byte
     {4, {8, 8, 8}, {16, 8, 0}, 3, true},
     {4, {8, 8, 8}, {0, 8, 16}, 3, true},
     {4, {8, 8, 8}, {24, 16, 8}, 0, true},
     {4, {8, 8, 8}, {8, 16, 24}, 0, true},
+    {4, {2, 15, 15}, {30, 15, 0}, 0, false},
     {4, {10, 10, 10}, {20, 10, 0}, 2, false},
     {4, {16, 0, 9}, {0, 16, 20}, 1, false},
 };
 constexpr int kPixelFormatCount = int(std::size(kPixelFormats));
 
 // The four of them that have whole bytes and alpha.
-constexpr int kFirstWithAlpha = 15;
+constexpr int kFirstWithAlpha = 16;
 
 uint32_t Word(const uint8_t* pixel, int bytes) {
   uint32_t word = 0;
@@ -557,19 +559,19 @@ constexpr struct {
   int format;
 } kYuvToPixels[] = {
     {YuvToRgbForm::kWide, kAdjusted, 6},   {YuvToRgbForm::kWide, kAdjusted, 7},
-    {YuvToRgbForm::kWide, kAdjusted, 15},  {YuvToRgbForm::kWide, kAdjusted, 16},
-    {YuvToRgbForm::kWide, kAdjusted, 17},  {YuvToRgbForm::kWide, kAdjusted, 18},
+    {YuvToRgbForm::kWide, kAdjusted, 16},  {YuvToRgbForm::kWide, kAdjusted, 17},
+    {YuvToRgbForm::kWide, kAdjusted, 18},  {YuvToRgbForm::kWide, kAdjusted, 19},
     {YuvToRgbForm::kTable, 0, 6},          {YuvToRgbForm::kTable, 0, 7},
-    {YuvToRgbForm::kTable, 0, 15},         {YuvToRgbForm::kTable, 0, 16},
-    {YuvToRgbForm::kTable, 0, 17},         {YuvToRgbForm::kTable, 0, 18},
+    {YuvToRgbForm::kTable, 0, 16},         {YuvToRgbForm::kTable, 0, 17},
+    {YuvToRgbForm::kTable, 0, 18},         {YuvToRgbForm::kTable, 0, 19},
     {YuvToRgbForm::kTable, 6, 6},          {YuvToRgbForm::kTable, 6, 7},
-    {YuvToRgbForm::kTable, 6, 15},         {YuvToRgbForm::kTable, 6, 18},
+    {YuvToRgbForm::kTable, 6, 16},         {YuvToRgbForm::kTable, 6, 19},
     {YuvToRgbForm::kWholeLuma, 6, 6},      {YuvToRgbForm::kWholeLuma, 6, 7},
-    {YuvToRgbForm::kWholeLuma, 6, 15},     {YuvToRgbForm::kWholeLuma, 6, 16},
-    {YuvToRgbForm::kWholeLuma, 6, 17},     {YuvToRgbForm::kWholeLuma, 6, 18},
+    {YuvToRgbForm::kWholeLuma, 6, 16},     {YuvToRgbForm::kWholeLuma, 6, 17},
+    {YuvToRgbForm::kWholeLuma, 6, 18},     {YuvToRgbForm::kWholeLuma, 6, 19},
     {YuvToRgbForm::kSixBits, 6, 6},        {YuvToRgbForm::kSixBits, 6, 7},
-    {YuvToRgbForm::kSixBits, 6, 15},       {YuvToRgbForm::kSixBits, 6, 16},
-    {YuvToRgbForm::kSixBits, 6, 17},       {YuvToRgbForm::kSixBits, 6, 18},
+    {YuvToRgbForm::kSixBits, 6, 16},       {YuvToRgbForm::kSixBits, 6, 17},
+    {YuvToRgbForm::kSixBits, 6, 18},       {YuvToRgbForm::kSixBits, 6, 19},
     {YuvToRgbForm::kWide, kAdjusted16, 1}, {YuvToRgbForm::kWide, kAdjusted16, 2},
     {YuvToRgbForm::kTable, 2, 1},          {YuvToRgbForm::kTable, 2, 2},
     {YuvToRgbForm::kTable, 3, 1},          {YuvToRgbForm::kTable, 3, 2},
