@@ -76,7 +76,7 @@ def operating_system():
 
 
 def instruction_sets():
-    known = ["ssse3", "avx2", "avx512bw", "avx512vbmi", "asimd", "neon"]
+    known = ["ssse3", "avx2", "avx512bw", "avx512vbmi", "avx512_vnni", "asimd", "neon"]
     flags = set(pathlib.Path("/proc/cpuinfo").read_text().split())
     return ", ".join(name for name in known if name in flags)
 

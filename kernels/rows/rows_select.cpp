@@ -17,7 +17,7 @@ constexpr uint32_t kLeaf1SystemSavesState = 1u << 27;
 constexpr uint32_t kLeaf1Avx = 1u << 28;
 constexpr uint32_t kLeaf7Avx2 = 1u << 5;
 constexpr uint32_t kLeaf7Avx512 = 1u << 16 | 1u << 17 | 1u << 30 | 1u << 31;  // F, DQ, BW and VL
-constexpr uint32_t kLeaf7Vbmi = 1u << 1;                                      // in ECX
+constexpr uint32_t kLeaf7VbmiAndVnni = 1u << 1 | 1u << 11;                    // in ECX
 constexpr uint32_t kStateOfSseAndAvx = 6;
 constexpr uint32_t kStateOfAvx512 = 0xE6;
 
@@ -40,7 +40,7 @@ CpuFeatures AskCpu() {
   __cpuid_count(7, 0, a, b, c, d);
   found.avx2 = (b & kLeaf7Avx2) != 0;
   found.avx512 = (state & kStateOfAvx512) == kStateOfAvx512 && (b & kLeaf7Avx512) == kLeaf7Avx512 &&
-                 (c & kLeaf7Vbmi) != 0;
+                 (c & kLeaf7VbmiAndVnni) == kLeaf7VbmiAndVnni;
   return found;
 }
 

@@ -131,11 +131,18 @@ class WeightedSum {
   }
   // Of words: the outer bytes in turn, and the middle one twice; 32 bits for each pixel.
   Register Sums(Register outer, Register middle) const {
+#ifdef __AVX512VNNI__
+    const Register start = kNegated ? Zero() : offset_;
+    const Register sum =
+        _mm512_dpwssd_epi32(_mm512_dpwssd_epi32(start, outer, outer_), middle, middle_);
+    return _mm512_srai_epi32(kNegated ? _mm512_sub_epi32(offset_, sum) : sum, 16);
+#else
     const Register sum = KESTREL_SIMD(add_epi32)(KESTREL_SIMD(madd_epi16)(outer, outer_),
                                                  KESTREL_SIMD(madd_epi16)(middle, middle_));
     return KESTREL_SIMD(srai_epi32)(
         kNegated ? KESTREL_SIMD(sub_epi32)(offset_, sum) : KESTREL_SIMD(add_epi32)(offset_, sum),
         16);
+#endif
   }
   KESTREL_INLINE Words Eight(Register outer, Register middle) const {
     const WordsPair o = Widen({outer});

@@ -55,7 +55,7 @@ TEST(InstructionSets, TheListHasEverySetOfTheCpu) {
 #if defined(__x86_64__)
   if (__builtin_cpu_supports("avx512f") && __builtin_cpu_supports("avx512dq") &&
       __builtin_cpu_supports("avx512bw") && __builtin_cpu_supports("avx512vl") &&
-      __builtin_cpu_supports("avx512vbmi")) {
+      __builtin_cpu_supports("avx512vbmi") && __builtin_cpu_supports("avx512vnni")) {
     expected.push_back(&kAvx512Rows);
   }
   if (__builtin_cpu_supports("avx2")) {
