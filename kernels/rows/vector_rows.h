@@ -226,11 +226,10 @@ bool PlanWindow(const int32_t* firsts, const int32_t* seconds, const Extent& ext
     memset(at, 0, 2 * kShared);
     return false;
   }
-  uint16_t both[kShared];
   for (int k = 0; k < kShared; ++k) {
-    both[k] = uint16_t((firsts[k] - lowest) | (seconds[k] - lowest) << 8);
+    const uint16_t both = uint16_t((firsts[k] - lowest) | (seconds[k] - lowest) << 8);
+    memcpy(at + 2 * k, &both, sizeof(both));
   }
-  memcpy(at, both, sizeof(both));
   return true;
 }
 
