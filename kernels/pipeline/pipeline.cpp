@@ -358,6 +358,14 @@ class Pipeline {
         if (hasLuma) rows_.readStrided(y, groups + from.yOffset, 2, luma.n);
         continue;
       }
+      if (hasLuma && destination_.chromaPairs() == 0) {
+        const auto start = [&](int plane) {
+          return destination_.writer(plane).Start(chroma.column, chromaRow.destination, chroma.n);
+        };
+        uint8_t* const components[2] = {start(pairs), start(3 - pairs)};
+        rows_.splitGroups(y, components, groups, lumaFirst, chroma.n);
+        continue;
+      }
       for (int i = 0; i < luma.n; i += kStrip) {
         const int n = luma.n - i < kStrip ? luma.n - i : kStrip;
         uint8_t* const samples = hasLuma ? y + i : luma_;

@@ -224,6 +224,10 @@ struct KestrelRowOps {
   void (*interleave)(uint8_t* dst, const uint8_t* a, const uint8_t* b, int n);
   void (*deinterleave)(uint8_t* a, uint8_t* b, const uint8_t* src, int n);
   void (*swapPairs)(uint8_t* dst, const uint8_t* src, int n);
+  // Groups of packed 4:2:2, luma and chroma in turn: two samples of luma and one of each component,
+  // the first one's and then the second one's.
+  void (*splitGroups)(uint8_t* luma, uint8_t* const chroma[2], const uint8_t* groups,
+                      bool lumaFirst, int n);
   // Unit i of row j of the source becomes unit j of row i of the destination; units of 1..4 bytes.
   void (*transpose)(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch,
                     int unit, int rows, int columns);

@@ -533,6 +533,20 @@ void SwapPairs(uint8_t* dst, const uint8_t* src, int n) {
   }
 }
 
+void SplitGroups(uint8_t* luma, uint8_t* const chroma[2], const uint8_t* groups, bool lumaFirst,
+                 int n) {
+  uint8_t* const first = chroma[0];
+  uint8_t* const second = chroma[1];
+  const uint8_t* const y = groups + (lumaFirst ? 0 : 1);
+  const uint8_t* const c = groups + (lumaFirst ? 1 : 0);
+  for (int i = 0; i < n; ++i) {
+    luma[2 * i] = y[4 * i];
+    luma[2 * i + 1] = y[4 * i + 2];
+    first[i] = c[4 * i];
+    second[i] = c[4 * i + 2];
+  }
+}
+
 // Vectors of 16 bytes as lanes of one unit each. Pairs: the low (high) halves of two, interleaved.
 using Lanes1 = uint8_t __attribute__((vector_size(16)));
 using Lanes2 = uint16_t __attribute__((vector_size(16)));
@@ -676,6 +690,7 @@ const RowOps kScalarRows = {"scalar",
                             scalar::Interleave,
                             scalar::Deinterleave,
                             scalar::SwapPairs,
+                            scalar::SplitGroups,
                             scalar::Transpose,
                             scalar::WriteStrided,
                             scalar::WritePixels};

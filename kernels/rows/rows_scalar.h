@@ -54,6 +54,8 @@ void PutAlpha(uint8_t* pixels, const uint8_t* alpha, const PixelFormat& format, 
 void Interleave(uint8_t* dst, const uint8_t* a, const uint8_t* b, int n);
 void Deinterleave(uint8_t* a, uint8_t* b, const uint8_t* src, int n);
 void SwapPairs(uint8_t* dst, const uint8_t* src, int n);
+void SplitGroups(uint8_t* luma, uint8_t* const chroma[2], const uint8_t* groups, bool lumaFirst,
+                 int n);
 void Transpose(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch, int unit,
                int rows, int columns);
 void WriteStrided(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int n);

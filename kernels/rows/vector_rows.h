@@ -1632,6 +1632,30 @@ void SwapPairs(uint8_t* dst, const uint8_t* src, int n) {
       Units{src, 1});
 }
 
+template <bool kLumaFirst>
+void SplitGroupsInOrder(uint8_t* luma, uint8_t* const chroma[2], const uint8_t* groups, int n) {
+  uint8_t* const first = chroma[0];
+  uint8_t* const second = chroma[1];
+  const auto split = [=](int i) {
+    const PixelBytes p = Load4(groups + ptrdiff_t{4} * i);
+    Store2(luma + ptrdiff_t{2} * i, kLumaFirst ? p.low : p.middle, kLumaFirst ? p.high : p.alpha);
+    StoreBytes(first + i, kLumaFirst ? p.middle : p.low);
+    StoreBytes(second + i, kLumaFirst ? p.alpha : p.high);
+  };
+  int i = UnitsToBoundary<2>(luma, n);
+  if (i != 0) split(0);
+  for (; i + kBytes <= n; i += kBytes) split(i);
+  if (i < n) split(n - kBytes);
+}
+void SplitGroups(uint8_t* luma, uint8_t* const chroma[2], const uint8_t* groups, bool lumaFirst,
+                 int n) {
+  if (lumaFirst) {
+    SplitGroupsInOrder<true>(luma, chroma, groups, n);
+  } else {
+    SplitGroupsInOrder<false>(luma, chroma, groups, n);
+  }
+}
+
 // n >= kBytes units downwards from the one at dst.
 template <int kUnit>
 void WriteReversed(uint8_t* dst, const uint8_t* src, int n) {
@@ -1697,6 +1721,7 @@ constexpr RowOps VectorRows(const char* name) noexcept {
           ForLong<&RowOps::interleave, Interleave>::Run,
           ForLong<&RowOps::deinterleave, Deinterleave>::Run,
           ForLong<&RowOps::swapPairs, SwapPairs, kBytes / 2>::Run,
+          ForLong<&RowOps::splitGroups, SplitGroups>::Run,
           Transpose,
           WriteStrided,
           WritePixels};

@@ -844,6 +844,24 @@ void SwapPairs(Trial* trial, const RowOps& ops, int n, int) {
 }
 
 // Long rows, then long columns, of units of each size; pitches of either sign, with gaps.
+// Variant 1: chroma comes first.
+void SplitGroups(Trial* trial, const RowOps& ops, int n, int variant) {
+  const bool lumaFirst = variant == 0;
+  const uint8_t* const src = trial->Source(size_t(4) * size_t(n));
+  const auto luma = trial->Written(size_t(2) * size_t(n));
+  const auto first = trial->Written(size_t(n));
+  const auto second = trial->Written(size_t(n));
+  for (ptrdiff_t i = 0; i < n; ++i) {
+    const uint8_t* const group = src + 4 * i;
+    luma.expected[2 * i] = group[lumaFirst ? 0 : 1];
+    luma.expected[2 * i + 1] = group[lumaFirst ? 2 : 3];
+    first.expected[i] = group[lumaFirst ? 1 : 0];
+    second.expected[i] = group[lumaFirst ? 3 : 2];
+  }
+  uint8_t* const chroma[2] = {first.got, second.got};
+  ops.splitGroups(luma.got, chroma, src, lumaFirst, n);
+}
+
 void Transpose(Trial* trial, const RowOps& ops, int n, int variant) {
   const int unit = variant % 4 + 1;
   const int other = trial->random().Between(0, 24);
@@ -917,6 +935,7 @@ constexpr Operation kOperations[] = {
     {"Interleave", 1, Interleave},
     {"Deinterleave", 1, Deinterleave},
     {"SwapPairs", 1, SwapPairs},
+    {"SplitGroups", 2, SplitGroups},
     {"Transpose", 8, Transpose},
     {"WriteStrided", 10, WriteStrided},
     {"WritePixels", 24, WritePixels},
