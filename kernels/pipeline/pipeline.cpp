@@ -1016,18 +1016,18 @@ class Pipeline {
   uint8_t *luma_ = nullptr, *u_ = nullptr, *v_ = nullptr;
   int32_t stripWidth_;
   ArrangedSamples arranged_;
-  bool clampedCarry_, dithers_;
-  bool keepsPixels_;  // RGB to RGB of the same format
-  bool readsPairs_;   // YUV to YUV from pairs of chroma, both components from the same pixel
   kestrel::YuvToRgb colour_ = {};
   Carry carry_ = {};
   FieldShifts carryShifts_ = {};
   int32_t mostRows_ = INT32_MAX;  // to convert at once
   int n_ = 0;
-  bool lumaDone_ = false, chromaDone_ = false;  // by CopyPlanes
   // From each column of the strip that decides chroma to the next; 0 when it varies.
   int uStep_ = 0, vStep_ = 0;
   bool chromaOfSeconds_ = false;  // every pixel, or the second of each two, decides
+  bool clampedCarry_, dithers_;
+  bool keepsPixels_;  // RGB to RGB of the same format
+  bool readsPairs_;   // YUV to YUV from pairs of chroma, both components from the same pixel
+  bool lumaDone_ = false, chromaDone_ = false;  // by CopyPlanes
   alignas(64) uint8_t stripMemory_[StripMemory::kSize];
 };
 
