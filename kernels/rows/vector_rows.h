@@ -562,7 +562,7 @@ inline uint8_t AlphaOf(AlphaFill alpha) {
 
 // ---- Packed pixels of any layout, by way of planes of their bytes
 struct BytePlanes {
-  static constexpr int kMost = 512;  // pixels
+  static constexpr int kMost = 256;  // pixels
   explicit BytePlanes(int bytes) {
     // A field may lie beyond the bytes of a pixel.
     for (int k = bytes; k < 4; ++k) memset(of[k], 0, sizeof(of[k]));
