@@ -162,7 +162,7 @@ struct KestrelRowOps {
   void (*planPairs)(kestrel::PairPlan* plan);
   // The first and second bytes of pairs in turn.
   void (*readPairs)(uint8_t* dst, const uint8_t* src, const kestrel::PairPlan& plan);
-  // Pair i blended by weights[i]: as blendColumns.
+  // Each pair blended by the weight of its unit: as blendColumns.
   void (*blendPairs)(uint8_t* dst, const uint8_t* src, const kestrel::PairPlan& plan);
   // a + floor((b - a) * weight / 65536): a weight for each column, or one for the whole row.
   void (*blendColumns)(uint8_t* dst, const uint8_t* a, const uint8_t* b, const uint16_t* weights,

@@ -199,8 +199,8 @@ inline Extent ExtentOf(const PairPlan& plan) {
           (a.end > b.end ? a.end : b.end) + plan.unit - 1};
 }
 
-// Pairs are taken in groups, from one, two or four windows. A vector takes a group's pairs, or
-// several vectors' lanes take as many groups'.
+// Pairs are taken in groups that fill a lane of 16 bytes, or with AVX-512 a whole vector; each from
+// one, two or four windows.
 constexpr int kGroup = kWindow / 2;
 
 // Pairs that share a window: where it begins, from the lowest byte on, and where in it their bytes
