@@ -213,11 +213,86 @@ struct Block24 {
   }
 };
 
-// The reference version of the other units is vectors already.
+#ifdef __AVX2__
+// Two squares of 16 bytes side by side: a vector has a row of each, and later a column of each.
+template <int kUnit>
+struct TwoSquares {
+  static constexpr int kRows = 16 / kUnit;
+  static constexpr int kColumns = 2 * kRows;
+  static void Write(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch) {
+    // Sixteen rows do not fit the registers: two halves of eight, joined column by column.
+    constexpr int kAtOnce = kRows < 8 ? kRows : 8;
+    __m256i upper[kAtOnce], lower[kAtOnce];
+    LoadPaired(upper, src, srcPitch);
+    if constexpr (kUnit == 1) LoadPaired(lower, src + kAtOnce * srcPitch, srcPitch);
+    for (int i = 0; i < kAtOnce; ++i) {
+      if constexpr (kUnit == 1) {
+        Store(dst, dstPitch, 2 * i, _mm256_unpacklo_epi64(upper[i], lower[i]));
+        Store(dst, dstPitch, 2 * i + 1, _mm256_unpackhi_epi64(upper[i], lower[i]));
+      } else {
+        Store(dst, dstPitch, i, upper[i]);
+      }
+    }
+  }
+
+ private:
+  template <int kCount>
+  KESTREL_INLINE static void LoadPaired(__m256i (&rows)[kCount], const uint8_t* src,
+                                        ptrdiff_t pitch) {
+    for (int i = 0; i < kCount; ++i) rows[i] = Load(src + i * pitch);
+    PairRows<(kCount == 8 ? 3 : 2)>(rows);
+  }
+  // Rows i and i + half, unit by unit in turn. After as many rounds as the number of a row has bits
+  // the units of a column lie side by side.
+  template <int kRounds, int kCount>
+  KESTREL_INLINE static void PairRows(__m256i (&rows)[kCount]) {
+    if constexpr (kRounds > 0) {
+      __m256i paired[kCount];
+      for (int i = 0; i < kCount / 2; ++i) {
+        const __m256i a = rows[i];
+        const __m256i b = rows[i + kCount / 2];
+        paired[2 * i] = kUnit == 1   ? _mm256_unpacklo_epi8(a, b)
+                        : kUnit == 2 ? _mm256_unpacklo_epi16(a, b)
+                                     : _mm256_unpacklo_epi32(a, b);
+        paired[2 * i + 1] = kUnit == 1   ? _mm256_unpackhi_epi8(a, b)
+                            : kUnit == 2 ? _mm256_unpackhi_epi16(a, b)
+                                         : _mm256_unpackhi_epi32(a, b);
+      }
+      PairRows<kRounds - 1>(paired);
+      for (int i = 0; i < kCount; ++i) rows[i] = paired[i];
+    }
+  }
+  KESTREL_INLINE static __m256i Load(const uint8_t* p) {
+    return _mm256_loadu_si256(reinterpret_cast<const __m256i*>(p));
+  }
+  KESTREL_INLINE static void Store(uint8_t* dst, ptrdiff_t pitch, int column, __m256i columns) {
+    Store16(dst + column * pitch, _mm256_castsi256_si128(columns));
+    Store16(dst + (column + kRows) * pitch, _mm256_extracti128_si256(columns, 1));
+  }
+};
+
+template <int kUnit>
+bool TransposeTwoSquares(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch,
+                         int rows, int columns) {
+  using Block = TwoSquares<kUnit>;
+  if (rows < Block::kRows || columns < Block::kColumns) return false;
+  TransposeBy<Block, kUnit>(dst, dstPitch, src, srcPitch, rows, columns);
+  return true;
+}
+#endif
+
+// (The reference version is vectors of 16 bytes already, but for pixels of three.)
 void Transpose(uint8_t* dst, ptrdiff_t dstPitch, const uint8_t* src, ptrdiff_t srcPitch, int unit,
                int rows, int columns) {
-  if (unit != 3) return scalar::Transpose(dst, dstPitch, src, srcPitch, unit, rows, columns);
-  TransposeBy<Block24, 3>(dst, dstPitch, src, srcPitch, rows, columns);
+  if (unit == 3) return TransposeBy<Block24, 3>(dst, dstPitch, src, srcPitch, rows, columns);
+#ifdef __AVX2__
+  const bool done = unit == 1 ? TransposeTwoSquares<1>(dst, dstPitch, src, srcPitch, rows, columns)
+                    : unit == 2
+                        ? TransposeTwoSquares<2>(dst, dstPitch, src, srcPitch, rows, columns)
+                        : TransposeTwoSquares<4>(dst, dstPitch, src, srcPitch, rows, columns);
+  if (done) return;
+#endif
+  scalar::Transpose(dst, dstPitch, src, srcPitch, unit, rows, columns);
 }
 
 }  // namespace

@@ -864,7 +864,7 @@ void SplitGroups(Trial* trial, const RowOps& ops, int n, int variant) {
 
 void Transpose(Trial* trial, const RowOps& ops, int n, int variant) {
   const int unit = variant % 4 + 1;
-  const int other = trial->random().Between(0, 24);
+  const int other = trial->random().Between(0, 40);
   const int columns = variant < 4 ? n : other;
   const int rows = variant < 4 ? other : n;
   const ptrdiff_t srcPitch = DrawPitch(trial, columns * unit);
