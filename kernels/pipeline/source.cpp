@@ -182,7 +182,7 @@ void Source::TakeMemory(StripMemory* memory, int columns) {
 
 void Source::SelectColumns(int32_t x, int n) {
   interpolates_ = false;
-  lines_[0].row = lines_[1].row = -1;
+  lines_[0].row = lines_[1].row = gatheredRow_ = -1;
   // Side by side: the first column says it all, and the strip may be of any width.
   if (palette_ == nullptr && !swappedLuma_ && columnPositions_.Advance(x, n)) {
     first_.SetAll(columnPositions_.At(x).first, n);
@@ -428,6 +428,7 @@ void Source::ReadChannels(uint8_t* const rgb[3], const uint8_t* row, const Sampl
   const uint8_t* pixels = row + columns.offset[0];
   if (!columns.contiguous) {
     Gather(packed_, row, columns);
+    gatheredRow_ = -1;
     pixels = packed_;
   }
   rows_.unpackRgb(rgb, pixels, pixels_, columns.n);
@@ -568,10 +569,13 @@ const uint8_t* Source::Pixels(int32_t r, uint8_t* into) {
     }
     return blended;
   }
-  const uint8_t* const row = RowToRead(0, SourceRow(r, 1), first_);
-  if (PixelsAreInPlace()) return row + first_.offset[0];
+  const int32_t row = SourceRow(r, 1);
+  if (into == nullptr && row == gatheredRow_) return packed_;
+  const uint8_t* const start = RowToRead(0, row, first_);
+  if (PixelsAreInPlace()) return start + first_.offset[0];
+  if (into == nullptr) gatheredRow_ = row;
   uint8_t* const gathered = into != nullptr ? into : packed_;
-  Gather(gathered, row, first_);
+  Gather(gathered, start, first_);
   return gathered;
 }
 

@@ -104,8 +104,7 @@ class Source {
   const uint8_t* ChromaPairs(int32_t r, uint8_t* into);
   RgbRun Rgb(int32_t r);
   // The strip's packed pixels. Null unless HasPixels: where they are blended and have fields within
-  // bytes. Not to be mixed with Rgb in a strip. What is not in place
-  // is made in `into` where that is given.
+  // bytes. What is not in place is made in `into` where that is given.
   const uint8_t* Pixels(int32_t r, uint8_t* into = nullptr);
   bool HasPixels(int32_t r) const;
   // How many of `most` rows from r on read what this one reads, if it blends nothing.
@@ -230,6 +229,7 @@ class Source {
   Line lines_[2];
   uint8_t* channels_[4] = {};  // of second taps, or those and alpha of pixels
   uint8_t* packed_ = nullptr;  // gathered pixels, or pairs of chroma samples
+  int32_t gatheredRow_ = -1;   // whose pixels `packed_` has for Pixels; -1: none's
   uint8_t* blended_[4] = {};   // channels, or packed pixels, in one piece
   uint8_t *u_ = nullptr, *v_ = nullptr;
 };
