@@ -14,9 +14,20 @@ namespace {
 // Of indices that are a byte each, the first one that of column `first`.
 inline void GatherEntries(uint8_t* dst, const uint8_t* indices, const int32_t* columns,
                           int32_t first, const uint8_t* palette, int n) {
-  for (int i = 0; i < n; ++i) {
-    memcpy(dst + ptrdiff_t{4} * i, palette + size_t{4} * indices[columns[i] - first], 4);
+  // As a number: an index of column 0 need not exist.
+  const uintptr_t start = reinterpret_cast<uintptr_t>(indices) - uintptr_t(first);
+  const auto put = [=](int i) {
+    const auto* const index = reinterpret_cast<const uint8_t*>(start + uintptr_t(columns[i]));
+    memcpy(dst + ptrdiff_t{4} * i, palette + size_t{4} * *index, 4);
+  };
+  int i = 0;
+  for (; i + 4 <= n; i += 4) {
+    put(i);
+    put(i + 1);
+    put(i + 2);
+    put(i + 3);
   }
+  for (; i < n; ++i) put(i);
 }
 
 // The indices of whole bytes of pixels, a byte each.
