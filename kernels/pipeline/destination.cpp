@@ -331,7 +331,7 @@ bool Destination::AreGroups(int64_t lumaColumn, int lumaCount, int64_t chromaCol
       planes_[2].At(chromaColumn, 0) != group + layout.vOffset) {
     return false;
   }
-  if (layout.step[0] == 3) return lumaCount == chromaCount;
+  if (layout.step[0] >= 3) return lumaCount == chromaCount;
   return layout.step[0] == 2 && lumaCount == 2 * chromaCount && layout.yOffset < 2 &&
          (layout.uOffset ^ layout.vOffset) == 2 && ((layout.uOffset ^ layout.yOffset) & 1) == 1;
 }
@@ -401,12 +401,14 @@ void Destination::WriteGroups(int32_t r, const uint8_t* y, const uint8_t* u, con
   const PlaneLayout& layout = engine_.dstLayout;
   uint8_t* const group =
       planes_[0].At(int64_t(x_) - job_.rect.left, int64_t(r) - job_.rect.top) - layout.yOffset;
-  if (layout.step[0] == 3) {
-    // Like pixels of three bytes.
+  if (layout.step[0] >= 3) {
+    // Like pixels of three bytes, which may lie a spare byte apart.
     const uint8_t* const channels[3] = {y, u, v};
     const PixelFormat format = {
         3, {8, 8, 8}, {8 * layout.yOffset, 8 * layout.uOffset, 8 * layout.vOffset}, -1, true};
-    rows_.packRgb(group, channels, format, {}, {~0u, 0}, n_);
+    uint8_t* const pixels = hasSpareByte() ? buffer_ : group;
+    rows_.packRgb(pixels, channels, format, {}, {~0u, 0}, n_);
+    if (pixels != group) rows_.writePixels(group, layout.step[0], pixels, 3, n_);
     return;
   }
   const bool uFirst = layout.uOffset < layout.vOffset;

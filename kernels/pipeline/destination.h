@@ -157,6 +157,8 @@ class Destination {
   };
   PlaneRun LumaRun() const;
   PlaneRun ChromaRun() const;
+  // Whether a group has a byte that is no sample and is never written.
+  bool hasSpareByte() const { return engine_.dstLayout.step[0] == 4; }
   // Where the first group of a row of packed 4:2:2 or 4:4:4 begins; null unless the runs are whole
   // groups.
   uint8_t* GroupsAt(const PlaneRun& luma, const PlaneRun& chroma, int32_t r) const;

@@ -256,7 +256,7 @@ class Pipeline {
     const bool unit = engine_.stepX == 0x10000 && engine_.stepY == 0x10000;
     if (!unit || engine_.pathKind != PATH_YUV_TO_YUV || job_.mapsLevels() ||
         engine_.srcLayout.code != engine_.dstLayout.code || job_.rect.left < 0 ||
-        engine_.swapXY != 0) {
+        engine_.swapXY != 0 || destination_.hasSpareByte()) {
       return false;
     }
     const PlaneRun luma = destination_.LumaRun();

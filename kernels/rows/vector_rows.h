@@ -1674,6 +1674,9 @@ void WritePixels(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int bytes, in
     memcpy(dst, src, size_t(n) * size_t(bytes));
     return;
   }
+#ifdef __AVX512VBMI__
+  if (bytes == 3 && step == 4) return WriteThreesInFours(dst, src, n);
+#endif
   if (step != -bytes || bytes == 3) return scalar::WritePixels(dst, step, src, bytes, n);
   if (n < kBytes) {
     return kIsNarrowest ? scalar::WritePixels(dst, step, src, bytes, n)

@@ -245,6 +245,25 @@ inline Words GatherWords(const uint8_t* src, const uint8_t* windows, int first,
   return {pairs};
 }
 
+// ---- Pixels that lie apart
+// Pixels of three bytes, four apart: the bytes between them are not written.
+constexpr Order ThreesInFours() {
+  Order order = {};
+  for (int i = 0; i < kBytes; ++i) order.of[i] = uint8_t(i / 4 * 3 + i % 4);
+  return order;
+}
+constexpr Order kThreesInFours = ThreesInFours();
+inline void WriteThreesInFours(uint8_t* dst, const uint8_t* src, int n) {
+  constexpr int kPixels = kBytes / 4;
+  for (int i = 0; i < n; i += kPixels) {
+    const int absent = n - i < kPixels ? kPixels - (n - i) : 0;
+    const __mmask64 read = ~uint64_t{0} >> (kPixels + 3 * absent);
+    const __mmask64 written = uint64_t{0x7777777777777777} >> (4 * absent);
+    const Register pixels = _mm512_maskz_loadu_epi8(read, src + ptrdiff_t{3} * i);
+    _mm512_mask_storeu_epi8(dst + ptrdiff_t{4} * i, written, Reorder(pixels, kThreesInFours));
+  }
+}
+
 // ---- Pixels of four bytes
 // Register i of kBytes pixels, and of the second ones of as many pairs, in an order that
 // NarrowedQuads knows to set right when each pixel has become a byte.

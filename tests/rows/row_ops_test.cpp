@@ -897,7 +897,7 @@ void WriteStrided(Trial* trial, const RowOps& ops, int n, int variant) {
 
 void WritePixels(Trial* trial, const RowOps& ops, int n, int variant) {
   const int bytes = variant % 4 + 1;
-  const ptrdiff_t steps[] = {bytes, -bytes, bytes + 3, -bytes - 5, 131, -144};
+  const ptrdiff_t steps[] = {bytes, -bytes, bytes + 1, bytes + 3, -bytes - 5, 131, -144};
   const ptrdiff_t step = steps[variant / 4];
   const uint8_t* const src = trial->Source(size_t(n) * size_t(bytes));
   const auto dst = trial->Written(Extent(n, step, bytes));
@@ -938,7 +938,7 @@ constexpr Operation kOperations[] = {
     {"SplitGroups", 2, SplitGroups},
     {"Transpose", 8, Transpose},
     {"WriteStrided", 10, WriteStrided},
-    {"WritePixels", 24, WritePixels},
+    {"WritePixels", 28, WritePixels},
 };
 
 // A new operation is a new pointer in the table, and needs its line above. Planning has none, one
