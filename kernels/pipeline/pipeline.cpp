@@ -468,15 +468,15 @@ class Pipeline {
   void ForBlocks(int plane, const Call& call) const {
     PlaneRow first = {0, 0}, last = {0, 0};
     int32_t top = job_.rect.top;
-    const int32_t bottom = job_.rect.bottom;
+    int32_t bottom = job_.rect.bottom;
     while (top < bottom && !LocateRow(plane, top, &first)) ++top;
     if (top == bottom) return;
+    while (!LocateRow(plane, bottom - 1, &last)) --bottom;
     // From one row to the next the source advances by one at most: when the ends are as far apart
     // on both sides, so is every row between them. (Rows above the image read one further down, and
     // with those the ends never are.)
     const bool sameRows = plane == 0 || engine_.srcSubsample[4] == engine_.dstSubsample[4];
-    if (sameRows && LocateRow(plane, bottom - 1, &last) &&
-        last.source - first.source == last.destination - first.destination) {
+    if (sameRows && last.source - first.source == last.destination - first.destination) {
       call(first, int(last.source - first.source) + 1);
       return;
     }
