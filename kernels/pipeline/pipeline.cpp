@@ -174,8 +174,10 @@ class Pipeline {
       const int n = destination_.chromaCount();
       uStep_ = CommonStep(destination_.uColumns(), n);
       vStep_ = CommonStep(destination_.vColumns(), n);
-      chromaOfSeconds_ = !job_.has(kPairChroma) && uStep_ >= 1 && uStep_ <= 2 &&
-                         (n == 0 || destination_.uColumns()[0] + 1 >= uStep_);
+      deciding_ = FindDeciding(destination_.uColumns(), n);
+      const int step = deciding_.step;
+      chromaOfSeconds_ = !job_.has(kPairChroma) && step >= 1 && step <= 2 &&
+                         (n == 0 || destination_.uColumns()[deciding_.first] + 1 >= step);
     }
   }
 
@@ -223,6 +225,21 @@ class Pipeline {
       if (columns[k] - columns[k - 1] != step) return 0;
     }
     return step;
+  }
+
+  // Columns that decide chroma, [first, first + n) of them with a common step. Before and after
+  // those one may be alone: a block that a picture of an odd width, or one that is mirrored, has
+  // half of.
+  struct Deciding {
+    int first, n, step;
+  };
+  static Deciding FindDeciding(const int32_t* columns, int n) {
+    const bool firstIsAlone = n > 1 && columns[0] == 0 && columns[1] == 2;
+    const bool lastIsAlone =
+        n > 2 && columns[n - 1] - columns[n - 2] == 1 && columns[n - 2] - columns[n - 3] == 2;
+    const int first = firstIsAlone ? 1 : 0;
+    const int count = n - first - (lastIsAlone ? 1 : 0);
+    return {first, count, CommonStep(columns + first, count)};
   }
 
   // Stored values at 1:1: planes whose samples correspond one to one on the two sides are copied,
@@ -871,8 +888,14 @@ class Pipeline {
     }
     const int n = destination_.chromaCount();
     if (n == 0 || !destination_.WritesU(r)) return;
-    const uint8_t* const first = pixels + ptrdiff_t{destination_.uColumns()[0]} * format.bytes;
-    PixelsToChroma(u_, v_, 1, first, uStep_, n);
+    const auto convert = [&](int i, int step, int count) {
+      const uint8_t* const from = pixels + ptrdiff_t{destination_.uColumns()[i]} * format.bytes;
+      PixelsToChroma(u_ + i, v_ + i, 1, from, step, count);
+    };
+    const int afterLast = deciding_.first + deciding_.n;
+    if (deciding_.first != 0) convert(0, 1, 1);
+    convert(deciding_.first, deciding_.step, deciding_.n);
+    if (afterLast < n) convert(afterLast, 1, 1);
     destination_.PutChroma(r, u_, v_);
   }
 
@@ -1023,6 +1046,7 @@ class Pipeline {
   int n_ = 0;
   // From each column of the strip that decides chroma to the next; 0 when it varies.
   int uStep_ = 0, vStep_ = 0;
+  Deciding deciding_ = {0, 0, 0};
   bool chromaOfSeconds_ = false;  // every pixel, or the second of each two, decides
   bool clampedCarry_, dithers_;
   bool keepsPixels_;  // RGB to RGB of the same format
