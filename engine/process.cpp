@@ -78,15 +78,21 @@ void DispatchBand(const PassEngine& engine, const MRECT& band) {
 }
 
 // Quarter turns are cut into bands, which show where remainders are carried, where chroma shares
-// samples across a border, and in what begins anew with every odd row. Whole bytes of RGB show none
-// of that: they may come as one piece, whose kernel knows best how to walk it.
+// samples across a border, and in what begins anew with every odd row. Whole bytes of RGB, and YUV
+// whose bands begin and end with a block of chroma, show none of that: they may come as one piece,
+// whose kernel knows best how to walk it.
 bool BandsShow(const PassEngine& engine, const MRECT& rect) {
   const EngineContext& c = *engine.context;
-  const uint32_t* bits = c.dstChannelSize;
-  const bool wholeBytes =
-      c.dstFormat.code == CODE_RGB && bits[0] == 8 && bits[1] == 8 && bits[2] == 8;
   const bool evenRows = (int64_t(rect.bottom) - rect.top) % 2 == 0;
-  return !wholeBytes || !evenRows || c.dither != 0 || rect.left < 0 || rect.top < 0;
+  if (!evenRows || rect.left < 0 || rect.top < 0) return true;
+  if (c.dstFormat.code != CODE_RGB) {
+    // (Upside down an odd number of rows begins within a block.)
+    const bool inPhase = c.mirrorY == 0 || (int64_t(c.dstRegion.top) + c.dstRegion.bottom) % 2 == 0;
+    return rect.top % 2 != 0 || !inPhase || c.dstSubsample[1] > 2 || c.dstSubsample[4] > 2;
+  }
+  const uint32_t* bits = c.dstChannelSize;
+  const bool wholeBytes = bits[0] == 8 && bits[1] == 8 && bits[2] == 8;
+  return !wholeBytes || c.dither != 0;
 }
 
 template <int kGrid>

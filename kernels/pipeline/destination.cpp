@@ -19,7 +19,7 @@ int32_t RoundUpToEven(int32_t value) {
 
 int PlaneWriter::Room(int64_t column, int64_t row, int n, int most) const {
   if (inPlace()) return most;
-  int room = tiles_ ? TileRows(n) : kTileSize / n;
+  int room = RunsOf(n);
   if (tiles_ && Fits(column, row, n)) room -= count_;
   return room < most ? room : most;
 }
@@ -147,11 +147,11 @@ Destination::Destination(const Job& job)
 }
 
 int Destination::BufferSize(int columns) const {
-  // Of up to four bytes. Those that are dithered are gathered in tiles whatever their order.
-  constexpr int kPixels = 4 * PlaneWriter::kTileSize;
-  static_assert(
-      ArrangedSamples::kTurnedSize >= kPixels && ArrangedSamples::kMirroredSize >= kPixels,
-      "arranged samples leave room for tiles");
+  // Of a run of up to four bytes for each column. (Pixels that are dithered are gathered in tiles
+  // whatever their order.)
+  constexpr int kRun = 4 * kWidestStrip;
+  static_assert(ArrangedSamples::kTurnedSize >= kRun && ArrangedSamples::kMirroredSize >= kRun,
+                "arranged samples leave room for a run");
   switch (order_) {
     case Order::kTurned:
     case Order::kTurnedBackwards:
@@ -159,7 +159,8 @@ int Destination::BufferSize(int columns) const {
     case Order::kMirrored:
       return ArrangedSamples::kMirroredSize;
     default:
-      if (!AllInPlace()) return kPixels;
+      if (tiles_) return kTileSize;
+      if (!AllInPlace()) return kRun;
       // Runs that are in place need none, unless one is copied to several rows.
       return engine_.stepY < 0x10000 && !hasChroma_ ? columns * writers_[0].unit() : 0;
   }
@@ -170,11 +171,15 @@ void Destination::TakeMemory(StripMemory* memory, int columns) {
     uColumns_ = vColumns_ = memory->Take<int32_t>(size_t(columns));
     if (uOfLastColumn_ != vOfLastColumn_) vColumns_ = memory->Take<int32_t>(size_t(columns));
   }
-  buffer_ = memory->Take<uint8_t>(size_t(BufferSize(columns)));
+  const int size = BufferSize(columns);
+  buffer_ = memory->Take<uint8_t>(size_t(size));
   if (buffer_ == nullptr) return;
-  // A plane of YUV takes a quarter of what pixels may take, chroma pairs two quarters.
-  const ptrdiff_t apart = AllInPlace() ? 0 : PlaneWriter::kTileSize;
-  for (int i = 0; i < 3; ++i) writers_[i].SetBuffer(buffer_ + i * apart);
+  if (!hasChroma_) return writers_[0].SetBuffer(buffer_, size);
+  // Half for luma, half for chroma.
+  const int quarter = size / 4;
+  writers_[0].SetBuffer(buffer_, 2 * quarter);
+  writers_[1].SetBuffer(buffer_ + 2 * quarter, (chromaPairs_ != 0 ? 2 : 1) * quarter);
+  writers_[2].SetBuffer(buffer_ + 3 * quarter, quarter);
 }
 
 // The kernel contract gives start addresses only; where they lie in the plane follows from the job

@@ -46,16 +46,14 @@ struct DestinationPlane {
 // transposed, so that both sides stream.
 class PlaneWriter {
  public:
-  static constexpr int kTileColumns = 64;
-  static constexpr int kTileRows = 32;
-
-  static constexpr int kTileSize = kTileColumns * kTileRows;  // units
-
   // The plane is not copied.
   PlaneWriter(const DestinationPlane& plane, int unit, bool tiles, const RowOps& rows)
       : plane_(plane), rows_(rows), unit_(unit), tiles_(tiles) {}
-  // For kTileSize units; or for a run that is copied, if runs are in place.
-  void SetBuffer(uint8_t* buffer) { buffer_ = buffer; }
+  // For the tile; or for a run at least that is not in place, or is copied.
+  void SetBuffer(uint8_t* buffer, int bytes) {
+    buffer_ = buffer;
+    bufferSize_ = bytes;
+  }
   bool tiles() const { return tiles_; }
   int unit() const { return unit_; }
   ptrdiff_t rowStep() const { return plane_.rowStep; }
@@ -65,11 +63,11 @@ class PlaneWriter {
   // Whether runs can join the tile as it stands.
   bool Fits(int64_t column, int64_t row, int n, int runs = 1) const {
     return count_ == 0 ||
-           (count_ + runs <= TileRows(n) && column == column_ && n == n_ && row == row_ + count_);
+           (count_ + runs <= RunsOf(n) && column == column_ && n == n_ && row == row_ + count_);
   }
 
-  // Runs of n units in a tile.
-  static int TileRows(int n) { return n > kTileColumns ? kTileSize / n : kTileRows; }
+  // How many runs of n units the buffer holds.
+  int RunsOf(int n) const { return bufferSize_ / (n * unit_); }
   // How many of `most` runs of n units one Start can be for.
   int Room(int64_t column, int64_t row, int n, int most) const;
   // Memory for some runs of n units; they are written by the Finish that follows. For `copies` of
@@ -98,6 +96,7 @@ class PlaneWriter {
   int unit_;
   bool tiles_;
   uint8_t* buffer_ = nullptr;
+  int bufferSize_ = 0;
   int64_t column_ = 0, row_ = 0;  // of the tile's first run, or of the run that was started
   int n_ = 0;
   int started_ = 0;  // runs
@@ -114,12 +113,19 @@ class Destination {
     int first, n;
   };
 
+  // Of samples or small pixels, which are turned in blocks: what is done for each row of a block
+  // costs as much as many pixels, and in the destination its columns are to fill cache lines.
+  static constexpr int kTileColumns = 192;
+  static constexpr int kTileRows = 64;
+  static constexpr int kTileSize = 2 * kTileColumns * kTileRows;  // bytes: with as many of chroma
+
   explicit Destination(const Job& job);
 
   // Loop columns that may be selected at once.
   int widestStrip() const {
     if (engine_.swapXY == 0) return kWidestStrip;
-    return order_ == Order::kWalk ? PlaneWriter::kTileColumns : ArrangedSamples::kTurnedColumns;
+    if (order_ != Order::kWalk) return ArrangedSamples::kTurnedColumns;
+    return writers_[0].unit() <= 2 ? kTileColumns : kTileColumns / 2;
   }
   // Before anything is selected: takes the memory for strips of some columns.
   void TakeMemory(StripMemory* memory, int columns);
@@ -250,7 +256,6 @@ class Destination {
   int firstPixel_ = 0, pixelEnd_ = 0;  // columns of the strip that are inside plane 0
   // Of all writers (planes of YUV share it), or of samples that are arranged.
   uint8_t* buffer_ = nullptr;
-  static_assert(PlaneWriter::kTileSize >= kWidestStrip, "a run fits into the buffer");
 };
 
 }  // namespace kestrel

@@ -102,10 +102,13 @@ class Pipeline {
     static_assert(kLeast >= ptrdiff_t{4} * kStrip, "as many pixels may be kept there");
     constexpr size_t kNarrow = kStrip;
     constexpr size_t kTurned = ArrangedSamples::kTurnedColumns;
+    constexpr size_t kTile = Destination::kTileColumns;
     // For a column no job takes more than 58 bytes besides, and none that turns YUV more than 32.
-    static_assert(StripMemory::kSize >= ArrangedSamples::kTurnedSize + kLeast + 32 * kTurned &&
-                      StripMemory::kSize >= ArrangedSamples::kMirroredSize + kLeast + 58 * kNarrow,
-                  "there is room for the narrowest strips");
+    static_assert(
+        StripMemory::kSize >= ArrangedSamples::kTurnedSize + kLeast + 32 * kTurned &&
+            StripMemory::kSize >= ArrangedSamples::kMirroredSize + kLeast + 58 * kNarrow &&
+            StripMemory::kSize >= Destination::kTileSize + kLeast + 58 * kTile,
+        "there is room for the narrowest strips");
     memory_ = memory->Take<uint8_t>(size_t(runs * run > kLeast ? runs * run : kLeast));
     if (memory_ == nullptr) return;
     for (int c = 0; c < 3; ++c) channels_[c] = memory_ + c * run;
@@ -197,7 +200,7 @@ class Pipeline {
                 : writer.inPlace() ? INT32_MAX
                 : destination_.pixelOrder() == PixelOrder::kMirrored
                     ? ArrangedSamples::kMirrored / stripWidth_
-                    : PlaneWriter::kTileSize / stripWidth_;
+                    : writer.RunsOf(stripWidth_);
     for (int32_t r = job_.rect.top; r < job_.rect.bottom;) {
       int rows = 0;
       for (int32_t x = job_.rect.left; x < job_.rect.right; x += stripWidth_) {

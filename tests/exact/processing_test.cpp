@@ -64,6 +64,7 @@ namespace {
 
 constexpr uint32_t kGrey = FORMAT_GRAY8;
 constexpr uint32_t kRgba = FORMAT_XBGR8888;
+constexpr uint32_t kRgb565 = FORMAT_RGB565;
 
 // ---- the chain ----
 
@@ -530,8 +531,9 @@ struct BandCase {
 
 TEST_F(OnePass, OfASwappedJobRunsInBands) {
   recorder.convert = false;
-  std::vector<uint8_t> big(128 * 256);
-  const Planes planes = {{big.data(), nullptr, nullptr}, {128, 0, 0}};
+  std::vector<uint8_t> big(256 * 256);
+  const Planes dst = {{big.data(), nullptr, nullptr}, {256, 0, 0}};
+  const Planes src = {{big.data(), nullptr, nullptr}, {128, 0, 0}};
   const BandCase rows[] = {
       {1, 0, {0, 0, 16, 100}, {{0, 32}, {32, 64}, {64, 96}, {96, 100}}},
       {1, 0, {0, 0, 16, 32}, {{0, 32}}},
@@ -553,17 +555,16 @@ TEST_F(OnePass, OfASwappedJobRunsInBands) {
   for (const BandCase& row : rows) {
     SCOPED_TRACE(testing::Message() << row.transform << " " << row.selector << " "
                                     << testing::PrintToString(row.rect));
-    const Engine engine({kGrey, 128, 128}, {kGrey, 128, 128},
+    const Engine engine({kRgb565, 128, 128}, {kGrey, 128, 128},
                         Param().Transform(row.transform).Band(row.selector));
     recorder.jobs.clear();
-    EXPECT_EQ(MPProcessRect(&engine.pass(), planes.plane, &row.rect, planes.pitch, planes.plane,
-                            planes.pitch),
+    EXPECT_EQ(MPProcessRect(&engine.pass(), dst.plane, &row.rect, dst.pitch, src.plane, src.pitch),
               KESTREL_OK);
     ASSERT_EQ(recorder.jobs.size(), row.rows.size());
     for (size_t i = 0; i < row.rows.size(); ++i) {
       MRECT band = {row.rect.left, row.rows[i][0], row.rect.right, row.rows[i][1]};
-      EXPECT_EQ(recorder.jobs[i].dst[0], big.data() + 128 * (row.transform == 6 ? 99 : band.top) +
-                                             (row.transform == 6 ? 15 : band.left));
+      EXPECT_EQ(recorder.jobs[i].dst[0], big.data() + 256 * (row.transform == 6 ? 99 : band.top) +
+                                             2 * (row.transform == 6 ? 15 : band.left));
       if (row.transform == 6) band = {112, 28, 128, 128};
       if ((row.transform & 1) != 0) MSwapRect(&band);
       EXPECT_EQ(recorder.jobs[i].rect, band);
@@ -571,10 +572,48 @@ TEST_F(OnePass, OfASwappedJobRunsInBands) {
   }
 }
 
+// What cannot differ is not cut: the kernel walks it as it likes.
+TEST_F(OnePass, OfASwappedJobIsCutOnlyWhereThatShows) {
+  recorder.convert = false;
+  std::vector<uint8_t> big(512 * 256);
+  const Planes dst = {{big.data(), big.data() + 1, big.data() + 2}, {512, 512, 512}};
+  const Planes src = {{big.data(), nullptr, nullptr}, {128, 0, 0}};
+  const struct {
+    uint32_t format, transform;
+    int32_t height, top, bottom;
+    size_t jobs;
+  } rows[] = {
+      {kGrey, 1, 100, 0, 100, 1},
+      {FORMAT_NV21, 3, 100, 0, 100, 1},
+      {FORMAT_YUYV, 5, 100, 2, 100, 1},
+      {FORMAT_I420, 7, 100, 0, 98, 1},
+      {kRgba, 7, 100, 0, 100, 1},
+      {FORMAT_NV21, 1, 100, 0, 99, 4},
+      {FORMAT_NV21, 1, 100, 1, 99, 4},
+      {FORMAT_NV21, 3, 101, 0, 100, 1},
+      {FORMAT_NV21, 5, 101, 0, 100, 4},
+      {FORMAT_I444 | 0x33, 1, 100, 0, 100, 4},
+      {FORMAT_I444 | 0x30, 1, 100, 0, 100, 4},
+      {kRgb565, 1, 100, 0, 100, 4},
+  };
+  for (const auto& row : rows) {
+    SCOPED_TRACE(testing::Message() << std::hex << row.format << std::dec << ", " << row.transform
+                                    << ", " << row.top << " to " << row.bottom);
+    const Engine engine({row.format, 128, row.height}, {kGrey, 128, 128},
+                        Param().Transform(row.transform));
+    const MRECT rect = {0, row.top, 16, row.bottom};
+    recorder.jobs.clear();
+    EXPECT_EQ(MPProcessRect(&engine.pass(), dst.plane, &rect, dst.pitch, src.plane, src.pitch),
+              KESTREL_OK);
+    EXPECT_EQ(recorder.jobs.size(), row.jobs);
+  }
+}
+
 TEST_F(OnePass, MirrorsEachBandInsideTheRegionAndThenTransposes) {
   recorder.convert = false;
-  std::vector<uint8_t> big(64 * 64);
-  const Planes planes = {{big.data(), nullptr, nullptr}, {64, 0, 0}};
+  std::vector<uint8_t> big(128 * 64);
+  const Planes dst = {{big.data(), nullptr, nullptr}, {128, 0, 0}};
+  const Planes src = {{big.data(), nullptr, nullptr}, {64, 0, 0}};
   // A region of 20 x 40 at (10, 20), drawn from row 22 to 58 in bands of 32 and 4 rows.
   const MRECT rect = {12, 22, 25, 58};
   const struct {
@@ -582,21 +621,21 @@ TEST_F(OnePass, MirrorsEachBandInsideTheRegionAndThenTransposes) {
     MRECT first, second;
     int32_t firstX, firstY, secondX, secondY;
     int32_t pitch;
-  } rows[] = {{1, {22, 12, 54, 25}, {54, 12, 58, 25}, 12, 22, 12, 54, 64},
-              {3, {22, 15, 54, 28}, {54, 15, 58, 28}, 24, 22, 24, 54, 64},
-              {5, {26, 12, 58, 25}, {22, 12, 26, 25}, 12, 53, 12, 57, -64},
-              {7, {26, 15, 58, 28}, {22, 15, 26, 28}, 24, 53, 24, 57, -64}};
+  } rows[] = {{1, {22, 12, 54, 25}, {54, 12, 58, 25}, 12, 22, 12, 54, 128},
+              {3, {22, 15, 54, 28}, {54, 15, 58, 28}, 24, 22, 24, 54, 128},
+              {5, {26, 12, 58, 25}, {22, 12, 26, 25}, 12, 53, 12, 57, -128},
+              {7, {26, 15, 58, 28}, {22, 15, 26, 28}, 24, 53, 24, 57, -128}};
   for (const auto& row : rows) {
     SCOPED_TRACE(row.transform);
-    const Engine engine({kGrey, 20, 40}, {kGrey, 40, 20},
+    const Engine engine({kRgb565, 20, 40}, {kGrey, 40, 20},
                         Param().Transform(row.transform).DstOrigin(10, 20));
     recorder.jobs.clear();
-    EXPECT_EQ(Process(engine, planes, planes, &rect), KESTREL_OK);
+    EXPECT_EQ(Process(engine, dst, src, &rect), KESTREL_OK);
     ASSERT_EQ(recorder.jobs.size(), 2u);
     EXPECT_EQ(recorder.jobs[0].rect, row.first);
     EXPECT_EQ(recorder.jobs[1].rect, row.second);
-    EXPECT_EQ(recorder.jobs[0].dst[0], big.data() + 64 * row.firstY + row.firstX);
-    EXPECT_EQ(recorder.jobs[1].dst[0], big.data() + 64 * row.secondY + row.secondX);
+    EXPECT_EQ(recorder.jobs[0].dst[0], big.data() + 128 * row.firstY + 2 * row.firstX);
+    EXPECT_EQ(recorder.jobs[1].dst[0], big.data() + 128 * row.secondY + 2 * row.secondX);
     for (const Job& job : recorder.jobs) {
       EXPECT_EQ(job.dstPitch[0], row.pitch);
       EXPECT_EQ(job.srcPitch[0], 64);
