@@ -78,9 +78,9 @@ void DispatchBand(const PassEngine& engine, const MRECT& band) {
 }
 
 // Quarter turns are cut into bands, which show where remainders are carried, where chroma shares
-// samples across a border, and in what begins anew with every odd row. Whole bytes of RGB, and YUV
-// whose bands begin and end with a block of chroma, show none of that: they may come as one piece,
-// whose kernel knows best how to walk it.
+// samples across a border, and in what begins anew with every odd row. Pixels that carry nothing,
+// and YUV whose bands begin and end with a block of chroma, show none of that: they may come as one
+// piece, whose kernel knows best how to walk it.
 bool BandsShow(const PassEngine& engine, const MRECT& rect) {
   const EngineContext& c = *engine.context;
   const bool evenRows = (int64_t(rect.bottom) - rect.top) % 2 == 0;
@@ -92,7 +92,9 @@ bool BandsShow(const PassEngine& engine, const MRECT& rect) {
   }
   const uint32_t* bits = c.dstChannelSize;
   const bool wholeBytes = bits[0] == 8 && bits[1] == 8 && bits[2] == 8;
-  return !wholeBytes || c.dither != 0;
+  // (At the same size some kernels always carry.)
+  const bool sameSize = c.stepX == 0x10000 && c.stepY == 0x10000;
+  return c.dither != 0 || (!wholeBytes && sameSize);
 }
 
 template <int kGrid>

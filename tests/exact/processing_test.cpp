@@ -580,26 +580,27 @@ TEST_F(OnePass, OfASwappedJobIsCutOnlyWhereThatShows) {
   const Planes src = {{big.data(), nullptr, nullptr}, {128, 0, 0}};
   const struct {
     uint32_t format, transform;
-    int32_t height, top, bottom;
+    int32_t height, top, bottom, sourceWidth;
     size_t jobs;
   } rows[] = {
-      {kGrey, 1, 100, 0, 100, 1},
-      {FORMAT_NV21, 3, 100, 0, 100, 1},
-      {FORMAT_YUYV, 5, 100, 2, 100, 1},
-      {FORMAT_I420, 7, 100, 0, 98, 1},
-      {kRgba, 7, 100, 0, 100, 1},
-      {FORMAT_NV21, 1, 100, 0, 99, 4},
-      {FORMAT_NV21, 1, 100, 1, 99, 4},
-      {FORMAT_NV21, 3, 101, 0, 100, 1},
-      {FORMAT_NV21, 5, 101, 0, 100, 4},
-      {FORMAT_I444 | 0x33, 1, 100, 0, 100, 4},
-      {FORMAT_I444 | 0x30, 1, 100, 0, 100, 4},
-      {kRgb565, 1, 100, 0, 100, 4},
+      {kGrey, 1, 100, 0, 100, 100, 1},
+      {FORMAT_NV21, 3, 100, 0, 100, 50, 1},
+      {FORMAT_YUYV, 5, 100, 2, 100, 100, 1},
+      {FORMAT_I420, 7, 100, 0, 98, 50, 1},
+      {kRgba, 7, 100, 0, 100, 100, 1},
+      {kRgb565, 7, 100, 0, 100, 50, 1},
+      {FORMAT_NV21, 1, 100, 0, 99, 100, 4},
+      {FORMAT_NV21, 1, 100, 1, 99, 100, 4},
+      {FORMAT_NV21, 3, 101, 0, 100, 100, 1},
+      {FORMAT_NV21, 5, 101, 0, 100, 100, 4},
+      {FORMAT_I444 | 0x33, 1, 100, 0, 100, 100, 4},
+      {FORMAT_I444 | 0x30, 1, 100, 0, 100, 100, 4},
+      {kRgb565, 1, 100, 0, 100, 100, 4},
   };
   for (const auto& row : rows) {
     SCOPED_TRACE(testing::Message() << std::hex << row.format << std::dec << ", " << row.transform
                                     << ", " << row.top << " to " << row.bottom);
-    const Engine engine({row.format, 128, row.height}, {kGrey, 128, 128},
+    const Engine engine({row.format, 128, row.height}, {kGrey, row.sourceWidth, 128},
                         Param().Transform(row.transform));
     const MRECT rect = {0, row.top, 16, row.bottom};
     recorder.jobs.clear();
