@@ -281,6 +281,10 @@ inline Bytes RunningSums(Bytes b) {
 inline Bytes LastByte(Bytes b) {
   return {vdupq_lane_u8(vget_high_u8(b.v), 7)};
 }
+inline Bytes Reversed(Bytes b) {
+  const uint8x16_t halves = vrev64q_u8(b.v);
+  return {vcombine_u8(vget_high_u8(halves), vget_low_u8(halves))};
+}
 // The last unit first.
 template <int kUnit>
 inline void StoreReversed(uint8_t* p, const uint8_t* src) {

@@ -1659,9 +1659,16 @@ void SplitGroups(uint8_t* luma, uint8_t* const chroma[2], const uint8_t* groups,
 // n >= kBytes units downwards from the one at dst.
 template <int kUnit>
 void WriteReversed(uint8_t* dst, const uint8_t* src, int n) {
-  constexpr int kUnits = kBytes / kUnit;
+  constexpr int kUnits = kUnit == 3 ? kBytes : kBytes / kUnit;
   const auto write = [=](int i) {
-    StoreReversed<kUnit>(dst - ptrdiff_t{i + kUnits - 1} * kUnit, src + i * kUnit);
+    uint8_t* const to = dst - ptrdiff_t{i + kUnits - 1} * kUnit;
+    const uint8_t* const from = src + ptrdiff_t{i} * kUnit;
+    if constexpr (kUnit == 3) {
+      const PixelBytes p = Load3(from);
+      Store3(to, Reversed(p.low), Reversed(p.middle), Reversed(p.high));
+    } else {
+      StoreReversed<kUnit>(to, from);
+    }
   };
   int i = UnitsToBoundary<kUnit>(dst + kUnit, n, true);
   if (i != 0) write(0);
@@ -1677,7 +1684,7 @@ void WritePixels(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int bytes, in
 #ifdef __AVX512VBMI__
   if (bytes == 3 && step == 4) return WriteThreesInFours(dst, src, n);
 #endif
-  if (step != -bytes || bytes == 3) return scalar::WritePixels(dst, step, src, bytes, n);
+  if (step != -bytes) return scalar::WritePixels(dst, step, src, bytes, n);
   if (n < kBytes) {
     return kIsNarrowest ? scalar::WritePixels(dst, step, src, bytes, n)
                         : kNarrower.writePixels(dst, step, src, bytes, n);
@@ -1686,6 +1693,8 @@ void WritePixels(uint8_t* dst, ptrdiff_t step, const uint8_t* src, int bytes, in
     WriteReversed<1>(dst, src, n);
   } else if (bytes == 2) {
     WriteReversed<2>(dst, src, n);
+  } else if (bytes == 3) {
+    WriteReversed<3>(dst, src, n);
   } else {
     WriteReversed<4>(dst, src, n);
   }

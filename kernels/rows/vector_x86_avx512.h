@@ -219,6 +219,9 @@ constexpr Order Reversed() {
 }
 template <int kUnit>
 constexpr Order kReversed = Reversed<kUnit>();
+inline Bytes Reversed(Bytes b) {
+  return {Reorder(b.v, kReversed<1>)};
+}
 // The last unit first.
 template <int kUnit>
 inline void StoreReversed(uint8_t* p, const uint8_t* src) {

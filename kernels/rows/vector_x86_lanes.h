@@ -170,6 +170,15 @@ inline Bytes LastByte(Bytes b) {
   return {last};
 #endif
 }
+inline Bytes Reversed(Bytes b) {
+  const Register v = KESTREL_SIMD(shuffle_epi8)(
+      b.v, Broadcast(_mm_setr_epi8(15, 14, 13, 12, 11, 10, 9, 8, 7, 6, 5, 4, 3, 2, 1, 0)));
+#ifdef __AVX2__
+  return {_mm256_permute4x64_epi64(v, 0x4E)};
+#else
+  return {v};
+#endif
+}
 // The last unit first.
 template <int kUnit>
 inline void StoreReversed(uint8_t* p, const uint8_t* src) {
