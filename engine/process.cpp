@@ -92,9 +92,10 @@ bool BandsShow(const PassEngine& engine, const MRECT& rect) {
   }
   const uint32_t* bits = c.dstChannelSize;
   const bool wholeBytes = bits[0] == 8 && bits[1] == 8 && bits[2] == 8;
-  // (At the same size some kernels always carry.)
-  const bool sameSize = c.stepX == 0x10000 && c.stepY == 0x10000;
-  return c.dither != 0 || (!wholeBytes && sameSize);
+  // At the same size some kernels for YUV always carry.
+  const bool mayCarry =
+      c.pathKind == PATH_YUV_TO_RGB && c.stepX == 0x10000 && c.stepY == 0x10000 && !wholeBytes;
+  return c.dither != 0 || mayCarry;
 }
 
 template <int kGrid>

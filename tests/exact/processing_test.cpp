@@ -577,30 +577,31 @@ TEST_F(OnePass, OfASwappedJobIsCutOnlyWhereThatShows) {
   recorder.convert = false;
   std::vector<uint8_t> big(512 * 256);
   const Planes dst = {{big.data(), big.data() + 1, big.data() + 2}, {512, 512, 512}};
-  const Planes src = {{big.data(), nullptr, nullptr}, {128, 0, 0}};
+  const Planes src = {{big.data(), nullptr, nullptr}, {512, 0, 0}};
   const struct {
-    uint32_t format, transform;
+    uint32_t format, source, transform;
     int32_t height, top, bottom, sourceWidth;
     size_t jobs;
   } rows[] = {
-      {kGrey, 1, 100, 0, 100, 100, 1},
-      {FORMAT_NV21, 3, 100, 0, 100, 50, 1},
-      {FORMAT_YUYV, 5, 100, 2, 100, 100, 1},
-      {FORMAT_I420, 7, 100, 0, 98, 50, 1},
-      {kRgba, 7, 100, 0, 100, 100, 1},
-      {kRgb565, 7, 100, 0, 100, 50, 1},
-      {FORMAT_NV21, 1, 100, 0, 99, 100, 4},
-      {FORMAT_NV21, 1, 100, 1, 99, 100, 4},
-      {FORMAT_NV21, 3, 101, 0, 100, 100, 1},
-      {FORMAT_NV21, 5, 101, 0, 100, 100, 4},
-      {FORMAT_I444 | 0x33, 1, 100, 0, 100, 100, 4},
-      {FORMAT_I444 | 0x30, 1, 100, 0, 100, 100, 4},
-      {kRgb565, 1, 100, 0, 100, 100, 4},
+      {kGrey, kGrey, 1, 100, 0, 100, 100, 1},
+      {FORMAT_NV21, kGrey, 3, 100, 0, 100, 50, 1},
+      {FORMAT_YUYV, kGrey, 5, 100, 2, 100, 100, 1},
+      {FORMAT_I420, kGrey, 7, 100, 0, 98, 50, 1},
+      {kRgba, kGrey, 7, 100, 0, 100, 100, 1},
+      {kRgb565, kGrey, 7, 100, 0, 100, 50, 1},
+      {FORMAT_NV21, kGrey, 1, 100, 0, 99, 100, 4},
+      {FORMAT_NV21, kGrey, 1, 100, 1, 99, 100, 4},
+      {FORMAT_NV21, kGrey, 3, 101, 0, 100, 100, 1},
+      {FORMAT_NV21, kGrey, 5, 101, 0, 100, 100, 4},
+      {FORMAT_I444 | 0x33, kGrey, 1, 100, 0, 100, 100, 4},
+      {FORMAT_I444 | 0x30, kGrey, 1, 100, 0, 100, 100, 4},
+      {kRgb565, kGrey, 1, 100, 0, 100, 100, 4},
+      {kRgb565, kRgba, 1, 100, 0, 100, 100, 1},
   };
   for (const auto& row : rows) {
     SCOPED_TRACE(testing::Message() << std::hex << row.format << std::dec << ", " << row.transform
                                     << ", " << row.top << " to " << row.bottom);
-    const Engine engine({row.format, 128, row.height}, {kGrey, row.sourceWidth, 128},
+    const Engine engine({row.format, 128, row.height}, {row.source, row.sourceWidth, 128},
                         Param().Transform(row.transform));
     const MRECT rect = {0, row.top, 16, row.bottom};
     recorder.jobs.clear();
