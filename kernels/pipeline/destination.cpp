@@ -176,10 +176,12 @@ void Destination::TakeMemory(StripMemory* memory, int columns) {
   if (buffer_ == nullptr) return;
   if (!hasChroma_) return writers_[0].SetBuffer(buffer_, size);
   // Half for luma, half for chroma.
+  const int half = size / 2;
   const int quarter = size / 4;
-  writers_[0].SetBuffer(buffer_, 2 * quarter);
-  writers_[1].SetBuffer(buffer_ + 2 * quarter, (chromaPairs_ != 0 ? 2 : 1) * quarter);
-  writers_[2].SetBuffer(buffer_ + 3 * quarter, quarter);
+  uint8_t* const chroma = buffer_ + half;
+  writers_[0].SetBuffer(buffer_, half);
+  writers_[1].SetBuffer(chroma, chromaPairs_ != 0 ? half : quarter);
+  writers_[2].SetBuffer(chroma + quarter, quarter);
 }
 
 // The kernel contract gives start addresses only; where they lie in the plane follows from the job

@@ -1,4 +1,4 @@
-// Row operations with AVX-512 (F, BW, DQ, VL and VBMI).
+// Row operations with AVX-512 (F, BW, DQ, VL, VBMI and VNNI).
 #include "kernels/rows/vector_x86.h"
 // The vectors come first: what follows is written in terms of them.
 #include "kernels/rows/vector_rows.h"
