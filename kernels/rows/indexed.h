@@ -42,6 +42,29 @@ void TakeIndicesApart(uint8_t* indices, const uint8_t* row, int bytes) {
   }
 }
 
+// In vectors.
+inline bool AreNeighbours(const int32_t* columns, int n) {
+  int32_t differences = 0;
+  for (int i = 0; i < n; ++i) differences |= (columns[i] - columns[0]) ^ i;
+  return differences == 0;
+}
+
+template <uint32_t kBits>
+void LookUp(uint8_t* dst, const uint8_t* indices, const uint8_t* palette, int n) {
+  if constexpr (kBits == 1) {
+    uint32_t entries[2];
+    memcpy(entries, palette, sizeof(entries));
+    for (int i = 0; i < n; ++i) {
+      const uint32_t entry = entries[0] ^ ((entries[0] ^ entries[1]) & (0u - indices[i]));
+      memcpy(dst + ptrdiff_t{4} * i, &entry, sizeof(entry));
+    }
+  } else {
+    for (int i = 0; i < n; ++i) {
+      memcpy(dst + ptrdiff_t{4} * i, palette + size_t{4} * indices[i], 4);
+    }
+  }
+}
+
 // Neighbours share bytes: those that lie between some pixels are taken apart before any is looked
 // up, if they are not many more than are wanted.
 template <uint32_t kBits>
@@ -53,6 +76,15 @@ void GatherSmallEntries(uint8_t* dst, const uint8_t* row, const int32_t* columns
   for (int x = 0; x < n;) {
     const int32_t* const some = columns + x;
     int count = n - x < kPiece ? n - x : kPiece;
+    uint8_t* const entries = dst + ptrdiff_t{4} * x;
+    if (AreNeighbours(some, count)) {
+      const int32_t before = some[0] % kPerByte;
+      TakeIndicesApart<kBits>(indices, row + some[0] / kPerByte,
+                              (before + count - 1) / kPerByte + 1);
+      LookUp<kBits>(entries, indices + before, palette, count);
+      x += count;
+      continue;
+    }
     int32_t first = some[0];
     int32_t last = some[0];
     for (int i = 0; i < count; ++i) {
@@ -67,7 +99,7 @@ void GatherSmallEntries(uint8_t* dst, const uint8_t* row, const int32_t* columns
       count = 1;
     }
     TakeIndicesApart<kBits>(indices, row + first / kPerByte, (last - first) / kPerByte + 1);
-    GatherEntries(dst + ptrdiff_t{4} * x, indices, some, first, palette, count);
+    GatherEntries(entries, indices, some, first, palette, count);
     x += count;
   }
 }

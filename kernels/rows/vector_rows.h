@@ -1578,25 +1578,46 @@ void MapLevels(uint8_t* dst, const uint8_t* src, const LevelMap& levels, int n) 
 }
 
 // ---- Order of bytes
-void ReadStrided(uint8_t* dst, const uint8_t* src, ptrdiff_t step, int n) {
-  int i = 0;
-  // A vector reads on to the sample after its last.
-  if (step == 2) {
-    for (; i + kBytes < n; i += kBytes) {
-      Bytes first, second;
-      Load2(src + 2 * i, &first, &second);
-      StoreBytes(dst + i, first);
-    }
-  } else if (step == 3) {
-    for (; i + kBytes < n; i += kBytes) {
-      StoreBytes(dst + i, Load3(src + 3 * i).low);
-    }
-  } else if (step == 4) {
-    for (; i + kBytes < n; i += kBytes) {
-      StoreBytes(dst + i, Load4(src + 4 * i).low);
-    }
+// Every kStep-th of some bytes, kBytes of them: the first of each group, or the last.
+template <int kStep, bool kLast>
+inline Bytes LoadEvery(const uint8_t* p) {
+  if constexpr (kStep == 2) {
+    Bytes first, second;
+    Load2(p, &first, &second);
+    return kLast ? second : first;
+  } else if constexpr (kStep == 3) {
+    const PixelBytes group = Load3(p);
+    return kLast ? group.high : group.low;
+  } else {
+    const PixelBytes group = Load4(p);
+    return kLast ? group.alpha : group.low;
   }
-  scalar::ReadStrided(dst + i, src + i * step, step, n - i);
+}
+
+// The last vector reaches back, and has the wanted bytes last, because what is behind the run must
+// not be read.
+template <int kStep>
+void ReadEvery(uint8_t* dst, const uint8_t* src, int n) {
+  if (n <= kBytes) return scalar::ReadStrided(dst, src, kStep, n);
+  int i = 0;
+  for (; i + kBytes < n; i += kBytes) {
+    StoreBytes(dst + i, LoadEvery<kStep, false>(src + kStep * i));
+  }
+  i = n - kBytes;
+  StoreBytes(dst + i, LoadEvery<kStep, true>(src + kStep * i - (kStep - 1)));
+}
+
+void ReadStrided(uint8_t* dst, const uint8_t* src, ptrdiff_t step, int n) {
+  switch (step) {
+    case 2:
+      return ReadEvery<2>(dst, src, n);
+    case 3:
+      return ReadEvery<3>(dst, src, n);
+    case 4:
+      return ReadEvery<4>(dst, src, n);
+    default:
+      return scalar::ReadStrided(dst, src, step, n);
+  }
 }
 
 void Interleave(uint8_t* dst, const uint8_t* a, const uint8_t* b, int n) {
